@@ -1,0 +1,122 @@
+// The template processor: expands one template into one output file, holding the borrowed
+// streams and design data, the token reader, the output state variables set by the template,
+// the conditional stack, the output column and the first error. Each handler family lives in a
+// file of its own; this header is their shared contract.
+#pragma once
+
+#include <cstdint>
+#include <cstdio>
+#include <memory>
+#include <string>
+#include <string_view>
+
+#include "data/port_record.h"
+#include "data/typed_lists.h"
+#include "engine/token_reader.h"
+
+class Forge {
+ public:
+  /// Case modes of m_Case.
+  enum CaseMode : uint32_t { SAMECASE = 0, INVCASE = 1, LOWCASE = 2, UPCASE = 3 };
+  /// Range placements of m_RangePosition.
+  enum RangePosition : uint32_t { AsPrefix = 0, AsPostfix = 1 };
+  /// Status values.
+  enum : uint32_t { kStatusOk = 0, kStatusTemplateError = 2 };
+  /// Deepest nesting of @IFHAS/@IFNHAS blocks.
+  static constexpr uint32_t kMaxConditionalDepth = 9;
+  /// m_Message keeps at most this many bytes.
+  static constexpr size_t kMessageCapacity = 255;
+
+  /// Borrows the streams and the data list; `debug` may be null (no tracing).
+  Forge(std::FILE* output, std::FILE* templateStream, std::FILE* debug, StbDataList* dataList);
+  ~Forge();
+  Forge(const Forge&) = delete;
+  Forge& operator=(const Forge&) = delete;
+
+  /// The status (0 or 2) and a copy of the message.
+  uint32_t getResult(std::string& message) const;
+  /// Records the first template error, prefixed with the reader's current line.
+  void reportError(std::string_view text);
+
+  // --- Main loop and dispatch (dispatch.cpp) ---
+  /// Expands the whole template. True when it ran to its end without a stop.
+  bool processTemplate();
+  /// Handles one token. `list` and `port` are present only while an @ITERATE@ body is replayed.
+  /// True means stop.
+  bool doToken(std::string_view token, TokList* list, PortRecord* port);
+
+  // --- Output writer (output_writer.cpp) ---
+  /// Writes `text`; drops newlines and tabs when `suppress`; wraps after the signal delimiter.
+  /// True when a write failed.
+  bool writeText(std::string_view text, bool suppress);
+  /// "%" + word + "%".
+  static std::string makeVariableToken(std::string_view word);
+  /// The mapped name while map is on and the port has one, else the declared name.
+  const std::string& displayName(const PortRecord& port) const;
+
+  // --- Scalar variables and case (scalar_variables.cpp) ---
+  bool writeScalarVariable(int index);
+  /// Converts `text` in place by m_Case and returns it.
+  std::string& applyCase(std::string& text) const;
+  static std::string& invertCase(std::string& text);
+
+  // --- @SET (set_directive.cpp) ---
+  bool doSet(std::string_view token);
+
+  // --- Conditionals (conditionals.cpp) ---
+  bool doIf(std::string_view token, bool isIfHas);
+  bool doEndIf();
+  bool addCondition(uint32_t value);
+  int compareSignalName(std::string_view name, std::string_view pattern) const;
+
+  // --- Signal mapping (signal_mapping.cpp) ---
+  bool doMapSignal(std::string_view token);
+
+  // --- Port lists and iteration (iteration.cpp) ---
+  /// The first (restart) or next port of `kind` (a port-list keyword index); null when done.
+  PortRecord* selectPort(int kind, bool restart);
+  /// Writes the delimited list of the ports of `kind`. `list` is the body being replayed, if
+  /// any (a port-list variable is an error there).
+  bool writePortList(int kind, TokList* list);
+  bool eatIterate();
+  bool doIterate(int kind, TokList* list);
+
+  // --- @ITERATOR@ and bus expansion (port_format.cpp) ---
+  std::unique_ptr<ExpansionList> expandBus(const PortRecord& port) const;
+  std::string formatPort(const PortRecord& port) const;
+
+  // --- @VHDL_TYPEDEC@ (vhdl_typedec.cpp) ---
+  bool doVhdlTypeDec(const PortRecord& port);
+
+  /// Writes one trace line when a trace stream exists. The format must be a literal.
+  void trace(const char* format, ...) const __attribute__((format(printf, 2, 3)));
+
+  // Fields, in the processor's documented order.
+  std::string m_Message = "No errors or warnings";
+  uint32_t m_Status = kStatusOk;
+  std::FILE* m_Output;
+  std::FILE* m_Template;
+  std::FILE* m_Debug;
+  StbDataList* m_DataList;
+  TokenReader m_Reader;
+  uint32_t m_ConditionalDepth = 0;
+  uint32_t m_Case = SAMECASE;
+  int32_t m_OutLineWidth = 32767;
+  std::string m_SigDelim = ", ";
+  std::string m_EolDelim = "\n";
+  std::string m_BusLeft = "_";
+  std::string m_BusRight = "_";
+  std::string m_VhdlBusType = "std_logic_vector";
+  std::string m_VhdlNetType = "std_logic";
+  bool m_ExpandBus = false;
+  bool m_ShowRange = false;
+  uint32_t m_RangePosition = AsPrefix;
+  bool m_SuppresNewLine = false;
+  bool m_Map = false;
+  bool m_CaseSensitiveIf = true;
+  uint32_t m_Conditions[11] = {0};
+  std::unique_ptr<ExpansionList> m_Expansion;
+  uint32_t m_Column = 0;
+
+  // --- Port selection and iteration state (owned by iteration.cpp) ---
+};

@@ -1,0 +1,178 @@
+// The support library: command-line parsing driven by the usage text, strings, file names and
+// files, time formatting, child processes and a message manager. The program reaches the host
+// system only through this header.
+#pragma once
+
+#include <cstdint>
+#include <cstdio>
+#include <ctime>
+#include <memory>
+#include <string>
+#include <string_view>
+#include <vector>
+
+namespace Host {
+
+/// An owned byte string (any byte, NUL included) with the operations the program needs.
+class StringBase {
+ public:
+  StringBase() = default;
+  StringBase(const char* text) : m_Text(text != nullptr ? text : "") {}  // NOLINT: implicit by design
+  StringBase(std::string_view text) : m_Text(text) {}                    // NOLINT
+  StringBase(std::string text) : m_Text(std::move(text)) {}              // NOLINT
+
+  StringBase& operator=(std::string_view text) {
+    m_Text.assign(text);
+    return *this;
+  }
+  StringBase& operator+=(std::string_view text) {
+    m_Text.append(text);
+    return *this;
+  }
+
+  const char* c_str() const { return m_Text.c_str(); }
+  const std::string& str() const { return m_Text; }
+  std::string_view view() const { return m_Text; }
+  size_t Length() const { return m_Text.size(); }
+  bool IsEmpty() const { return m_Text.empty(); }
+  /// Makes the string empty.
+  void Empty() { m_Text.clear(); }
+
+  /// Replaces the contents with printf-style formatted text. The format must be a literal.
+  void Format(const char* format, ...) __attribute__((format(printf, 2, 3)));
+
+  /// 0 when equal; negative or positive like strcmp otherwise. Mode 0 compares bytes exactly,
+  /// mode 1 ignores the case of ASCII letters.
+  int Compare(std::string_view other, int mode) const;
+
+  /// Replaces every occurrence of `from` (matched as Compare's `mode` says) by `to`, left to
+  /// right without rescanning replaced text. Returns the number of replacements.
+  int Replace(std::string_view from, std::string_view to, int mode);
+
+  /// Convert ASCII letters only; every other byte and the length stay.
+  void MakeUpper();
+  void MakeLower();
+
+ private:
+  std::string m_Text;
+};
+
+/// A path split into its parts (both '/' and '\\' separate components).
+class FileName {
+ public:
+  explicit FileName(std::string_view path) : m_Path(path) {}
+  /// The extension of the last component with its leading dot (".tcl"), or empty.
+  StringBase GetExtension() const;
+  /// The last path component.
+  StringBase GetTail() const;
+  /// Everything before the last component, without a trailing separator; empty if none.
+  StringBase GetDirectory() const;
+
+ private:
+  std::string m_Path;
+};
+
+class File {
+ public:
+  /// True when `path` names an existing regular file.
+  static bool isfile(const char* path);
+  /// Delete the named file; true on success.
+  static bool remove(const char* path);
+  /// Delete the named file even when it is read-only; true on success.
+  static bool remove_f(const char* path);
+  /// A name free for a new file in the system's temporary directory. Prefer createTemporary,
+  /// which cannot race with another process.
+  static StringBase tmpnam(const char* buffer);
+  /// Creates a new file exclusively, with an unpredictable name ending in `suffix`, in the
+  /// system's temporary directory ($TMPDIR or /tmp), and opens it for writing. Null on failure;
+  /// `name` receives the file's path on success.
+  static std::FILE* createTemporary(std::string_view suffix, std::string& name);
+  /// The directory holding the running executable; empty when it cannot be found.
+  static std::string executableDirectory();
+};
+
+/// Receives the output of a child process.
+class ChildOutput {
+ public:
+  virtual ~ChildOutput() = default;
+  /// One piece of the child's output (standard output and standard error). Returns true to
+  /// keep receiving.
+  virtual bool OnOutput(const char* text) = 0;
+  /// Called once when the child has ended.
+  virtual void OnEnd() {}
+};
+
+class Process {
+ public:
+  /// Runs `commandLine` without a shell: the line is split into words at blanks and tabs
+  /// (double quotes group a word), the first word is looked up on PATH. The child's standard
+  /// output and standard error go to `receiver`; returns after the child has ended. Returns 0
+  /// only for a normal exit with code 0; a program that cannot be started, or a child killed by
+  /// a signal, is a failure. `flags` and the three booleans are accepted for compatibility.
+  int RunNoWindow(const char* commandLine, std::unique_ptr<ChildOutput> receiver,
+                  unsigned flags, bool hideWindow, bool captureOutput, bool detach);
+};
+
+}  // namespace Host
+
+/// Time: the standard time, local-time and formatted-time functions.
+class UT_TIME {
+ public:
+  static std::time_t Time();
+  static std::tm LocalTime(std::time_t when);
+  /// Formats `when` into `buffer` (capacity `size`); returns the length written, 0 on failure.
+  static size_t StrFTime(char* buffer, size_t size, const char* format, const std::tm& when);
+};
+
+/// The message manager: texts go to standard error.
+class Host_MsgManData {
+ public:
+  static std::unique_ptr<Host_MsgManData> createObject(const char* module, const char* sourceFile,
+                                                       int line, const char* revision);
+  /// Writes `text` to standard error.
+  void issueError(const char* text);
+  /// Debug hook: writes nothing unless the environment variable PINFORGE_DEBUG_STUB is set.
+  static void debugStub(const char* text);
+
+ private:
+  Host_MsgManData() = default;
+  std::string m_Module;
+};
+
+/// One occurrence of a switch on the command line, with its arguments.
+class UT_CMDSWINFO {
+ public:
+  /// The argument with the 0-based `index`, or null past the last.
+  const char* getargtxt(uint16_t index) const;
+  size_t argumentCount() const { return m_Arguments.size(); }
+
+ private:
+  friend class UT_CMDARGS;
+  std::vector<std::string> m_Arguments;
+};
+
+/// The command-line parser. Its switch declarations are read from the usage text itself:
+/// "{...}" a group that may repeat, "[...]" optional, "<word>" one argument, "{<word>}" any
+/// number of arguments, "a|b" one argument (values are not enforced). An argument list ends at
+/// the next word that begins with "-". "-x" and "--x" name the same switch.
+class UT_CMDARGS {
+ public:
+  /// Parses `argv[1..argc-1]` against `usage`. On a malformed command line writes
+  /// "pinforge: <reason>" and "Usage: <usage>" to standard error (iserror()); on -h, -help,
+  /// --help or -? writes "Usage: <usage>" to standard output (gaveusage()).
+  UT_CMDARGS(int argc, char** argv, const char* usage, void* callback, int option);
+  ~UT_CMDARGS();
+
+  bool iserror() const { return m_Error; }
+  bool gaveusage() const { return m_GaveUsage; }
+  /// True when the switch (either spelling) was given.
+  bool findsw(const char* name) const;
+  /// The occurrence with the 0-based index, or null after the last.
+  const UT_CMDSWINFO* getsw(const char* name, uint16_t occurrence) const;
+
+ private:
+  struct Switch;
+  std::vector<Switch> m_Switches;
+  bool m_Error = false;
+  bool m_GaveUsage = false;
+};

@@ -1,0 +1,51 @@
+// The constant evaluators' value: integer, real, boolean or string. Integer arithmetic is
+// checked, so an overflowing bound is reported instead of wrapping into a wrong width.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <variant>
+
+namespace scan {
+
+class Value {
+ public:
+  Value() = default;
+  static Value integer(int64_t v) { return Value(v); }
+  static Value real(double v) { return Value(v); }
+  static Value boolean(bool v) { return Value(v); }
+  static Value string(std::string v) { return Value(std::move(v)); }
+
+  bool isNone() const { return m_Data.index() == 0; }
+  bool isInteger() const { return std::holds_alternative<int64_t>(m_Data); }
+  bool isReal() const { return std::holds_alternative<double>(m_Data); }
+  bool isBoolean() const { return std::holds_alternative<bool>(m_Data); }
+  bool isString() const { return std::holds_alternative<std::string>(m_Data); }
+
+  int64_t asInteger() const { return std::get<int64_t>(m_Data); }
+  double asReal() const { return std::get<double>(m_Data); }
+  bool asBoolean() const { return std::get<bool>(m_Data); }
+  const std::string& asString() const { return std::get<std::string>(m_Data); }
+
+  /// An integer, or a boolean as 0/1; nothing for reals, strings and none.
+  std::optional<int64_t> toInteger() const;
+  /// A real, or an integer widened; nothing otherwise.
+  std::optional<double> toReal() const;
+
+ private:
+  template <typename T>
+  explicit Value(T v) : m_Data(std::move(v)) {}
+  std::variant<std::monostate, int64_t, double, bool, std::string> m_Data;
+};
+
+/// Checked integer arithmetic: false on overflow (or division by zero), result untouched.
+bool checkedAdd(int64_t a, int64_t b, int64_t& result);
+bool checkedSub(int64_t a, int64_t b, int64_t& result);
+bool checkedMul(int64_t a, int64_t b, int64_t& result);
+bool checkedDiv(int64_t a, int64_t b, int64_t& result);
+bool checkedPow(int64_t base, int64_t exponent, int64_t& result);
+/// True when `v` fits a port bound (signed 32-bit).
+bool fitsBound(int64_t v);
+
+}  // namespace scan

@@ -1,0 +1,75 @@
+// The extractor keeps the registered files per library and hands them to the reader of the
+// run's language; lookups walk the libraries in search order.
+#include <algorithm>
+
+#include "platform/scan.h"
+#include "platform/scan/common/diagnostics.h"
+#include "platform/scan/language_reader.h"
+
+ScanPort::ScanPort(std::string name, std::string typeName, int direction, int sourceLine)
+    : m_Name(std::move(name)),
+      m_TypeName(std::move(typeName)),
+      m_Direction(direction),
+      m_SourceLine(sourceLine) {}
+
+void ScanPort::setRange(int32_t left, int32_t right, bool ascending) {
+  m_HasRange = true;
+  m_Left = left;
+  m_Right = right;
+  m_Ascending = ascending;
+}
+
+const ScanPort* ScanPortList::firstPort() const {
+  return m_Ports.empty() ? nullptr : m_Ports.data();
+}
+
+const ScanPort* ScanPortList::nextPort(const ScanPort* port) const {
+  if (port == nullptr) return nullptr;
+  const ScanPort* next = port + 1;
+  return next < m_Ports.data() + m_Ports.size() ? next : nullptr;
+}
+
+ScanExtractor::ScanExtractor() : m_Diagnostics(std::make_unique<scan::Diagnostics>(stderr)) {}
+
+ScanExtractor::~ScanExtractor() = default;
+
+void ScanExtractor::addDesignFile(const char* library, const char* file, Language) {
+  std::string name = library ? library : "work";
+  if (std::find(m_Libraries.begin(), m_Libraries.end(), name) == m_Libraries.end())
+    m_Libraries.push_back(name);
+  m_Files.push_back({name, file ? file : ""});
+}
+
+int ScanExtractor::Parse(Language language) {
+  // Files are read in command-line order across libraries: Verilog macros persist from
+  // file to file in that order.
+  m_Reader = language == Verilog ? scan::makeVerilogReader(*m_Diagnostics)
+                                 : scan::makeVhdlReader(*m_Diagnostics);
+  m_Reader->indexFiles(m_Files);
+  return static_cast<int>(m_Diagnostics->errorCount());
+}
+
+int ScanExtractor::findDesignUnit(const char* library, const char* unit, DesignUnitSearch search) {
+  m_UnitFound = false;
+  m_Ports.reset();
+  if (!m_Reader || unit == nullptr) return 1;
+  std::string wanted = library ? library : "work";
+  std::vector<std::string> order{wanted};
+  if (search == SearchAllLibraries)
+    for (const std::string& lib : m_Libraries)
+      if (lib != wanted) order.push_back(lib);
+  for (const std::string& lib : order) {
+    if (m_Reader->selectUnit(lib, unit)) {
+      m_UnitFound = true;
+      return 0;
+    }
+  }
+  return 1;
+}
+
+ScanPortList* ScanExtractor::getPorts() {
+  if (!m_Ports)
+    m_Ports = std::make_unique<ScanPortList>(m_UnitFound ? m_Reader->readPorts()
+                                                         : std::vector<ScanPort>{});
+  return m_Ports.get();
+}
