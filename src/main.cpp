@@ -1,0 +1,2 @@
+// TEMPORARY: replaced by the real entry point.
+int main() { return 1; }
