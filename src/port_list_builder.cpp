@@ -1,0 +1,102 @@
+// Turns the found unit's ports into the run's port records: direction letters, bounds, the
+// bit width of integer ranges (with a warning, since only symbols can use it) and, in debug
+// mode, one line per port on standard output.
+#include <algorithm>
+#include <bit>
+#include <cstdint>
+#include <cstdio>
+#include <string>
+#include <string_view>
+#include <utility>
+
+#include "design_flow.h"
+#include "run_context.h"
+
+namespace {
+
+constexpr int32_t kRangeNone = 0;
+constexpr int32_t kRangeTo = 1;
+constexpr int32_t kRangeDownto = 2;
+
+void resetScratch(RunContext& context) {
+  context.m_CurrentPortName.Empty();
+  context.m_CurrentPortType.Empty();
+  context.m_CurrentPortDir = -1;
+  context.m_CurrentLeft = -1;
+  context.m_CurrentRangeKind = kRangeNone;
+  context.m_CurrentRight = -1;
+}
+
+char directionLetter(int code) {
+  switch (code) {
+    case ScanPort::Input:
+      return 'I';
+    case ScanPort::Inout:
+      return 'B';
+    default:
+      return 'O';
+  }
+}
+
+/// Integer-like types whose range gives a value span rather than a bit range.
+bool isIntegerType(const Host::StringBase& type) {
+  for (std::string_view name : {"integer", "natural", "positive"})
+    if (type.Compare(name, 1) == 0) return true;
+  return false;
+}
+
+/// floor(log2(value)) for a positive value, exactly.
+int32_t floorLog2(int32_t value) {
+  return static_cast<int32_t>(std::bit_width(static_cast<uint32_t>(value))) - 1;
+}
+
+/// Replaces the scratch bounds of an integer range by the bits its largest value needs,
+/// written from the high bit down to 0 when the range falls.
+void applyIntegerRule(RunContext& context, const ScanPort& port) {
+  const int32_t largest = std::max(context.m_CurrentLeft, context.m_CurrentRight);
+  context.m_CurrentLeft = 0;
+  context.m_CurrentRight = largest > 0 ? floorLog2(largest) : 0;
+  if (port.isAscending() == 0) std::swap(context.m_CurrentLeft, context.m_CurrentRight);
+
+  std::string text = "WARNING: Module ";
+  text += context.m_ModuleName.view();
+  text += "(Line ";
+  text += std::to_string(port.sourceLine());
+  text += "): INTEGER RANGE is only supported for schematic symbol generation.";
+  context.reportMessage(text, RunContext::Severity::Warning);
+}
+
+void printDebugLine(const RunContext& context) {
+  std::printf("%s: %s %s", context.m_CurrentPortName.c_str(), "?",
+              context.m_CurrentPortType.c_str());
+  if (context.m_CurrentRangeKind != kRangeNone)
+    std::printf(" (%d %s %d)", context.m_CurrentLeft,
+                context.m_CurrentRangeKind == kRangeTo ? "TO" : "DOWNTO",
+                context.m_CurrentRight);
+  std::printf(";\n");
+}
+
+}  // namespace
+
+bool buildPortList(RunContext& context) {
+  resetScratch(context);
+  const ScanPortList* ports = context.m_Extractor.getPorts();
+  for (const ScanPort* port = ports != nullptr ? ports->firstPort() : nullptr; port != nullptr;
+       port = ports->nextPort(port)) {
+    context.m_CurrentPortName = std::string_view(port->name());
+    context.m_CurrentPortType = std::string_view(port->typeName());
+    const char letter = directionLetter(port->direction());
+    context.m_CurrentPortDir = letter;
+    if (port->hasRange()) {
+      port->getBounds(context.m_CurrentLeft, context.m_CurrentRight);
+      if (isIntegerType(context.m_CurrentPortType)) applyIntegerRule(context, *port);
+      context.m_CurrentRangeKind = port->isAscending() != 0 ? kRangeTo : kRangeDownto;
+    }
+    context.m_DesignData->appendOwned(new PortRecord(context.m_CurrentPortName.view(),
+                                                     context.m_CurrentLeft,
+                                                     context.m_CurrentRight, letter));
+    if (context.m_Debug) printDebugLine(context);
+    resetScratch(context);
+  }
+  return !context.hasErrors();
+}
