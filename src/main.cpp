@@ -1,2 +1,4 @@
-// TEMPORARY: replaced by the real entry point.
-int main() { return 1; }
+// Process entry of pinforge: one process performs one run.
+#include "front_end.h"
+
+int main(int argc, char** argv) { return runFrontEnd(argc, argv); }

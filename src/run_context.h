@@ -21,6 +21,8 @@ class RunContext {
   enum class Severity { Error, Warning };
 
   RunContext();
+  /// Closes every stream the context still holds. Code that closes one of them earlier (the
+  /// entry point closes the output and error streams) resets the field to null.
   ~RunContext();
   RunContext(const RunContext&) = delete;
   RunContext& operator=(const RunContext&) = delete;

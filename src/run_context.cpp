@@ -1,0 +1,99 @@
+// The run context's own operations: opening the run's files, registering design files,
+// reporting messages in the program's one format and the diagnostic dump.
+#include "run_context.h"
+
+#include <string>
+
+namespace {
+
+void closeIfOpen(std::FILE*& stream) {
+  if (stream != nullptr) std::fclose(stream);
+  stream = nullptr;
+}
+
+void writeText(std::FILE* stream, std::string_view text) {
+  std::fwrite(text.data(), 1, text.size(), stream);
+}
+
+void dumpLine(std::string_view label, std::string_view value) {
+  writeText(stdout, label);
+  writeText(stdout, value);
+  writeText(stdout, "\n");
+  std::fflush(stdout);
+}
+
+std::string_view openState(const std::FILE* stream) {
+  return stream != nullptr ? "Open" : "Not Open";
+}
+
+}  // namespace
+
+RunContext::RunContext() = default;
+
+RunContext::~RunContext() {
+  closeIfOpen(m_DebugStream);
+  closeIfOpen(m_InputStream);
+  closeIfOpen(m_TemplateStream);
+  closeIfOpen(m_OutputStream);
+  closeIfOpen(m_ErrorStream);
+}
+
+std::FILE* RunContext::openErrorFile(const char* name) {
+  m_ErrorFileName = std::string_view(name);
+  closeIfOpen(m_ErrorStream);
+  m_ErrorStream = std::fopen(name, "w");
+  return m_ErrorStream;
+}
+
+bool RunContext::openTemplateFile(const char* name) {
+  m_TemplateFileName = std::string_view(name);
+  closeIfOpen(m_TemplateStream);
+  m_TemplateStream = std::fopen(name, "r");
+  return m_TemplateStream != nullptr;
+}
+
+bool RunContext::openOutput(const char* name) {
+  m_OutputFileName = std::string_view(name);
+  // The extension starts after the first dot anywhere in the name, directory part included.
+  const std::string_view whole(name);
+  const size_t dot = whole.find('.');
+  m_OutputExt = dot == std::string_view::npos ? std::string_view() : whole.substr(dot + 1);
+  closeIfOpen(m_OutputStream);
+  m_OutputStream = std::fopen(name, "w");
+  return m_OutputStream != nullptr;
+}
+
+bool RunContext::registerDesignFile(const char* name) {
+  m_Extractor.addDesignFile(m_LibraryName.c_str(), name, m_Language);
+  m_InputFileName = std::string_view(name);
+  return Host::File::isfile(name);
+}
+
+void RunContext::reportMessage(std::string_view text, Severity severity) {
+  std::string line = "pinforge:";
+  line += text;
+  line += '\n';
+  if (severity == Severity::Error)
+    ++m_ErrorCount;
+  else
+    ++m_WarningCount;
+  m_ErrorText += line;
+  writeText(stdout, line);
+}
+
+void RunContext::dumpContext() const {
+  dumpLine("FpErr         ", openState(m_ErrorStream));
+  dumpLine("FpStb         ", openState(m_OutputStream));
+  dumpLine("FpTemplate    ", openState(m_TemplateStream));
+  dumpLine("FpInput       ", openState(m_InputStream));
+  dumpLine("FpDebug       ", openState(m_DebugStream));
+  dumpLine("Module        ", m_ModuleName.view());
+  dumpLine("Project       ", m_ProjectName.view());
+  dumpLine("Output Ext    ", m_OutputExt.view());
+  dumpLine("Output File   ", m_OutputFileName.view());
+  dumpLine("Library       ", m_LibraryName.view());
+  dumpLine("Input File    ", m_InputFileName.view());
+  dumpLine("Template File ", m_TemplateFileName.view());
+  dumpLine("Error File    ", m_ErrorFileName.view());
+  dumpLine("Date          ", m_Date.view());
+}
