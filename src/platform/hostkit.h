@@ -25,6 +25,12 @@ class StringBase {
     m_Text.assign(text);
     return *this;
   }
+  // Exact matches for the common argument types, which would otherwise be ambiguous between
+  // the string_view assignment and the implicit conversions to StringBase.
+  StringBase& operator=(const char* text) {
+    return *this = std::string_view(text != nullptr ? text : "");
+  }
+  StringBase& operator=(const std::string& text) { return *this = std::string_view(text); }
   StringBase& operator+=(std::string_view text) {
     m_Text.append(text);
     return *this;
@@ -151,10 +157,13 @@ class UT_CMDSWINFO {
   std::vector<std::string> m_Arguments;
 };
 
-/// The command-line parser. Its switch declarations are read from the usage text itself:
-/// "{...}" a group that may repeat, "[...]" optional, "<word>" one argument, "{<word>}" any
-/// number of arguments, "a|b" one argument (values are not enforced). An argument list ends at
-/// the next word that begins with "-". "-x" and "--x" name the same switch.
+/// The command-line parser. Its switch declarations are read from the usage text itself: the
+/// first word is the program's name; "{...}" a group that may repeat, "[...]" optional, "<word>"
+/// one argument, "[<word>]" an optional one, "{<word>}" any number of arguments, "a|b" one
+/// argument (values are not enforced). A switch outside every group must be given. An argument
+/// list ends at the next word that begins with "-". "-x" and "--x" name the same switch. Every
+/// command-line word must be a declared switch or an argument of the switch before it; a switch
+/// given more often than declared is accepted, and each occurrence is kept.
 class UT_CMDARGS {
  public:
   /// Parses `argv[1..argc-1]` against `usage`. On a malformed command line writes
@@ -172,6 +181,14 @@ class UT_CMDARGS {
 
  private:
   struct Switch;
+  void declare(std::string_view usage);
+  void match(int argc, char** argv);
+  const Switch* find(std::string_view name) const;
+  Switch* find(std::string_view name);
+  void fail(std::string_view reason);
+
+  std::string m_Usage;
+  std::string m_Program;
   std::vector<Switch> m_Switches;
   bool m_Error = false;
   bool m_GaveUsage = false;

@@ -1,0 +1,100 @@
+// String helper: comparison modes, replacement, ASCII-only case conversion and formatting,
+// including texts that hold NUL bytes.
+#include <gtest/gtest.h>
+
+#include <string>
+#include <string_view>
+
+#include "platform/hostkit.h"
+
+namespace {
+
+using namespace std::string_literals;
+
+int sign(int value) { return (value > 0) - (value < 0); }
+
+TEST(StringBase, Compare) {
+  const struct {
+    std::string left;
+    std::string right;
+    int mode;
+    int expected;
+  } cases[] = {
+      {"verilog", "verilog", 0, 0},   {"verilog", "VERILOG", 0, 1},
+      {"verilog", "VERILOG", 1, 0},   {"VeRiLoG", "verilog", 1, 0},
+      {"abc", "abd", 0, -1},          {"abd", "abc", 1, 1},
+      {"ab", "abc", 0, -1},           {"abc", "ab", 1, 1},
+      {"", "", 0, 0},                 {"", "a", 1, -1},
+      {"a\0b"s, "a\0c"s, 0, -1},      {"a\0b"s, "a"s, 0, 1},
+      {"\xe9", "\xc9", 1, 1},         {"\xff", "a", 0, 1},
+      {"[", "{", 1, -1},              {"@", "`", 1, -1},
+  };
+  for (const auto& c : cases) {
+    SCOPED_TRACE(c.left + " vs " + c.right + " mode " + std::to_string(c.mode));
+    EXPECT_EQ(sign(Host::StringBase(c.left).Compare(c.right, c.mode)), c.expected);
+  }
+}
+
+TEST(StringBase, Replace) {
+  const struct {
+    std::string text;
+    std::string from;
+    std::string to;
+    int mode;
+    std::string expected;
+    int count;
+  } cases[] = {
+      {"a.b.c", ".", "::", 0, "a::b::c", 2},
+      {"aaaa", "aa", "a", 0, "aa", 2},
+      {"abab", "ab", "abab", 0, "abababab", 2},
+      {"Bus BUS bus", "bus", "x", 0, "Bus BUS x", 1},
+      {"Bus BUS bus", "bus", "x", 1, "x x x", 3},
+      {"none", "zz", "y", 1, "none", 0},
+      {"keep", "", "y", 0, "keep", 0},
+      {"", "a", "b", 0, "", 0},
+      {"cut here", " here", "", 0, "cut", 1},
+      {"a\0b\0c"s, "\0"s, "-", 0, "a-b-c", 2},
+      {"tail", "il", "IL", 0, "taIL", 1},
+  };
+  for (const auto& c : cases) {
+    SCOPED_TRACE(c.text + " / " + c.from);
+    Host::StringBase text(c.text);
+    EXPECT_EQ(text.Replace(c.from, c.to, c.mode), c.count);
+    EXPECT_EQ(text.str(), c.expected);
+  }
+}
+
+TEST(StringBase, CaseConversionTouchesAsciiLettersOnly) {
+  const std::string mixed = "aZ09_\xe9\xc9\0@[`{~"s;
+  Host::StringBase upper(mixed);
+  upper.MakeUpper();
+  EXPECT_EQ(upper.str(), "AZ09_\xe9\xc9\0@[`{~"s);
+  Host::StringBase lower(mixed);
+  lower.MakeLower();
+  EXPECT_EQ(lower.str(), "az09_\xe9\xc9\0@[`{~"s);
+}
+
+TEST(StringBase, FormatReplacesContents) {
+  Host::StringBase text("old contents");
+  text.Format("%s:%d", "pinforge", 42);
+  EXPECT_EQ(text.str(), "pinforge:42");
+  const std::string big(5000, 'x');
+  text.Format("[%s]", big.c_str());
+  EXPECT_EQ(text.str(), "[" + big + "]");
+  text.Format("%s", "");
+  EXPECT_TRUE(text.IsEmpty());
+}
+
+TEST(StringBase, BuildingAndEmptying) {
+  Host::StringBase text(static_cast<const char*>(nullptr));
+  EXPECT_TRUE(text.IsEmpty());
+  text = "abc";
+  text += "\0d"s;
+  EXPECT_EQ(text.Length(), 5u);
+  EXPECT_EQ(text.view(), "abc\0d"s);
+  text.Empty();
+  EXPECT_TRUE(text.IsEmpty());
+  EXPECT_STREQ(text.c_str(), "");
+}
+
+}  // namespace
