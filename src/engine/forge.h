@@ -119,4 +119,15 @@ class Forge {
   uint32_t m_Column = 0;
 
   // --- Port selection and iteration state (owned by iteration.cpp) ---
+  /// The first (restart) or next port of `kind`, walking the data list with its own cursor and
+  /// never expanding buses (a bus's bits carry its name, so name searches find the same ports);
+  /// null when done. Used by the searches of @IFHAS/@IFNHAS and @MAPSIGNAL.
+  PortRecord* searchPort(int kind, bool restart);
+  /// The data-list element that selectPort handed out last (or whose bits it is handing out);
+  /// null before the first walk and after a walk ran off the end. Only port-list variables and
+  /// iterations move it, so searches inside an iteration body leave the iteration's position
+  /// and its current bit alone.
+  List_element* m_SelectedPort = nullptr;
+  /// True while an @ITERATE@ body is being replayed.
+  bool m_Iterating = false;
 };

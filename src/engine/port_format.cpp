@@ -1,9 +1,36 @@
-// TEMPORARY STUB - being replaced by the real handlers.
+// How one port is written (its name under map, its bit suffix or range, and the case mode) and
+// how a bus is split into single-bit records while expandbus is on.
+#include <string>
+
 #include "engine/forge.h"
 
-namespace {
-[[maybe_unused]] bool notYet(const char*) { return true; }
-}  // namespace
+std::unique_ptr<ExpansionList> Forge::expandBus(const PortRecord& port) const {
+  auto bits = std::make_unique<ExpansionList>();
+  const int32_t step = port.m_Left < port.m_Right ? 1 : -1;
+  // Test before stepping so that a bound at the edge of the 32-bit range cannot overflow.
+  for (int32_t index = port.m_Left;; index += step) {
+    auto* bit = new PortRecord(port.m_Name, index, index, port.m_Dir);
+    if (port.m_MappedName.has_value()) bit->setMappedName(*port.m_MappedName);
+    bits->appendOwned(bit);
+    if (index == port.m_Right) break;
+  }
+  return bits;
+}
 
-std::unique_ptr<ExpansionList> Forge::expandBus(const PortRecord&) const { return std::make_unique<ExpansionList>(); }
-std::string Forge::formatPort(const PortRecord& port) const { return port.m_Name; }
+std::string Forge::formatPort(const PortRecord& port) const {
+  std::string text = displayName(port);
+  if (m_ExpandBus && port.isBus() && port.m_Left == port.m_Right) {
+    text += m_BusLeft;
+    text += std::to_string(port.m_Left);
+    text += m_BusRight;
+  } else if (m_ShowRange && port.isBus()) {
+    std::string range = "[" + std::to_string(port.m_Left) + ":" + std::to_string(port.m_Right) + "]";
+    if (m_RangePosition == AsPostfix) {
+      text += range;
+    } else {
+      range += ' ';
+      text.insert(0, range);
+    }
+  }
+  return applyCase(text);
+}

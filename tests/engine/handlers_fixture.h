@@ -1,0 +1,80 @@
+// Runs one template through a processor over in-memory design data and captures what it wrote:
+// the output, the result status and message, and (on request) the trace lines.
+#pragma once
+
+#include <cstdint>
+#include <cstdio>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "engine/forge.h"
+
+namespace handlers_test {
+
+struct PortSpec {
+  const char* name;
+  int32_t left;
+  int32_t right;
+  char dir;
+};
+
+struct Run {
+  std::string output;
+  uint32_t status = 0;
+  std::string message;
+  bool completed = false;
+  std::string trace;
+};
+
+inline std::string readAll(std::FILE* file) {
+  std::fflush(file);
+  std::rewind(file);
+  std::string text;
+  char buffer[4096];
+  size_t got = 0;
+  while ((got = std::fread(buffer, 1, sizeof buffer, file)) > 0) text.append(buffer, got);
+  return text;
+}
+
+inline void fillPorts(StbDataList& data, const std::vector<PortSpec>& ports) {
+  for (const PortSpec& p : ports) data.appendOwned(new PortRecord(p.name, p.left, p.right, p.dir));
+}
+
+/// Expands `templateText` over `ports` with a fresh processor.
+inline Run runTemplate(std::string_view templateText, const std::vector<PortSpec>& ports,
+                       bool traced = false) {
+  StbDataList data("prj", "top", "out.vhd", "vhd", "pinforge", "", "title", "date");
+  fillPorts(data, ports);
+  std::FILE* in = std::tmpfile();
+  std::FILE* out = std::tmpfile();
+  std::FILE* debug = traced ? std::tmpfile() : nullptr;
+  std::fwrite(templateText.data(), 1, templateText.size(), in);
+  std::rewind(in);
+  Run run;
+  {
+    Forge forge(out, in, debug, &data);
+    run.completed = forge.processTemplate();
+    run.status = forge.getResult(run.message);
+  }
+  run.output = readAll(out);
+  if (debug != nullptr) {
+    run.trace = readAll(debug);
+    std::fclose(debug);
+  }
+  std::fclose(out);
+  std::fclose(in);
+  return run;
+}
+
+/// The message recorded for a template error on `line`.
+inline std::string errorAt(int line, std::string_view text) {
+  std::string message = "Error - Syntax error in template file line " + std::to_string(line) + "\n";
+  message += text;
+  message += '\n';
+  return message;
+}
+
+inline const std::string kNoError = "No errors or warnings";
+
+}  // namespace handlers_test
