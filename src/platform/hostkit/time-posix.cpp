@@ -1,0 +1,17 @@
+// Time: thin wrappers over the C library's clock, local-time conversion and formatting.
+#include <ctime>
+
+#include "platform/hostkit.h"
+
+std::time_t UT_TIME::Time() { return std::time(nullptr); }
+
+std::tm UT_TIME::LocalTime(std::time_t when) {
+  std::tm local{};
+  localtime_r(&when, &local);
+  return local;
+}
+
+size_t UT_TIME::StrFTime(char* buffer, size_t size, const char* format, const std::tm& when) {
+  if (buffer == nullptr || size == 0 || format == nullptr) return 0;
+  return std::strftime(buffer, size, format, &when);
+}
