@@ -1,0 +1,146 @@
+// The argument vector built from a command line or a response file: word splitting, the
+// argument limit and the messages of the two failures.
+#include "response_file.h"
+
+#include <gtest/gtest.h>
+
+#include <string>
+#include <vector>
+
+#include "support/scratch_dir.h"
+
+namespace {
+
+using pinforge_test::FilePtr;
+using pinforge_test::ScratchDir;
+
+struct Expansion {
+  bool failed = false;
+  std::vector<std::string> words;
+  std::string message;
+};
+
+Expansion expand(std::vector<std::string> args) {
+  std::vector<char*> argv;
+  for (std::string& arg : args) argv.push_back(arg.data());
+  argv.push_back(nullptr);
+  FilePtr messages(std::tmpfile());
+  Expansion result;
+  ArgumentVector expanded;
+  result.failed =
+      expandResponseFile(messages.get(), static_cast<int>(args.size()), argv.data(), expanded);
+  for (size_t i = 0; i < expanded.count(); ++i) result.words.push_back(expanded[i]);
+  std::rewind(messages.get());
+  int c;
+  while ((c = std::fgetc(messages.get())) != EOF) result.message.push_back(static_cast<char>(c));
+  return result;
+}
+
+std::vector<std::string> numberedWords(size_t count) {
+  std::vector<std::string> words;
+  for (size_t i = 0; i < count; ++i) words.push_back("w" + std::to_string(i));
+  return words;
+}
+
+std::string joined(const std::vector<std::string>& words, const std::string& separator) {
+  std::string text;
+  for (const std::string& word : words) text += (text.empty() ? "" : separator) + word;
+  return text;
+}
+
+const char kLimitMessage[] =
+    "FATAL ERROR: The number of command line arguments exceeds the max allowed (999).\n";
+
+TEST(ExpandResponseFile, CommandLineArgumentsAreCopiedBehindTheProgramName) {
+  const Expansion result = expand({"/opt/bin/some-other-name", "-lib", "work", "a b.vhd", ""});
+  EXPECT_FALSE(result.failed);
+  EXPECT_EQ(result.words, (std::vector<std::string>{"pinforge", "-lib", "work", "a b.vhd", ""}));
+  EXPECT_EQ(result.message, "");
+}
+
+TEST(ExpandResponseFile, OnlyTheFirstArgumentCanNameAResponseFile) {
+  const Expansion result = expand({"pinforge", "-module", "@top"});
+  EXPECT_FALSE(result.failed);
+  EXPECT_EQ(result.words, (std::vector<std::string>{"pinforge", "-module", "@top"}));
+}
+
+TEST(ExpandResponseFile, ResponseFileWordsAreSplitAtBlanksTabsAndNewlines) {
+  const std::string longWord(25000, 'x');
+  struct Case {
+    const char* what;
+    std::string content;
+    std::vector<std::string> words;
+  };
+  const std::vector<Case> cases = {
+      {"one line", "-lib work a.vhd -module top\n", {"-lib", "work", "a.vhd", "-module", "top"}},
+      {"several lines, runs of delimiters",
+       "  -lib\twork \t a.vhd\n\n\n-module   top  \n",
+       {"-lib", "work", "a.vhd", "-module", "top"}},
+      {"no final newline", "-o out.vhd", {"-o", "out.vhd"}},
+      {"CRLF line ends", "-lib work\r\na.vhd\r\n", {"-lib", "work", "a.vhd"}},
+      {"a carriage return inside a line stays", "a\rb\n", {"a\rb"}},
+      {"empty file", "", {}},
+      {"only delimiters", " \t\n\n \n", {}},
+      {"no quoting, comments or nesting",
+       "\"a b\" # c @inner.rsp\n",
+       {"\"a", "b\"", "#", "c", "@inner.rsp"}},
+      {"a word far longer than any line buffer",
+       "-module " + longWord + " -prj p\n",
+       {"-module", longWord, "-prj", "p"}},
+      {"a word across the 9999th character",
+       std::string(9990, ' ') + "abcdefghijklmnop\n",
+       {"abcdefghijklmnop"}},
+  };
+  for (const Case& test : cases) {
+    SCOPED_TRACE(test.what);
+    ScratchDir dir;
+    ASSERT_TRUE(dir.write("args.rsp", test.content));
+    const Expansion result = expand({"pinforge", "@" + dir.file("args.rsp"), "-ignored", "x"});
+    EXPECT_FALSE(result.failed);
+    std::vector<std::string> expected = {"pinforge"};
+    expected.insert(expected.end(), test.words.begin(), test.words.end());
+    EXPECT_EQ(result.words, expected);
+    EXPECT_EQ(result.message, "");
+  }
+}
+
+TEST(ExpandResponseFile, UnreadableResponseFileFailsWithItsName) {
+  ScratchDir dir;
+  const std::string missing = dir.file("missing.rsp");
+  for (const std::string& name : {missing, std::string()}) {
+    SCOPED_TRACE(name);
+    const Expansion result = expand({"pinforge", "@" + name});
+    EXPECT_TRUE(result.failed);
+    EXPECT_EQ(result.message, "FATAL ERROR: Unable to open response file " + name + "...\n");
+  }
+}
+
+TEST(ExpandResponseFile, AtMost997ArgumentsAreAccepted) {
+  struct Case {
+    size_t count;
+    bool fails;
+  };
+  for (const Case& test : {Case{996, false}, Case{997, false}, Case{998, true}, Case{1500, true}}) {
+    SCOPED_TRACE(test.count);
+    const std::vector<std::string> words = numberedWords(test.count);
+
+    std::vector<std::string> args = {"pinforge"};
+    args.insert(args.end(), words.begin(), words.end());
+    const Expansion direct = expand(args);
+
+    ScratchDir dir;
+    ASSERT_TRUE(dir.write("many.rsp", joined(words, " \n")));
+    const Expansion fromFile = expand({"pinforge", "@" + dir.file("many.rsp")});
+
+    for (const Expansion& result : {direct, fromFile}) {
+      EXPECT_EQ(result.failed, test.fails);
+      EXPECT_EQ(result.message, test.fails ? kLimitMessage : "");
+      if (!test.fails) {
+        ASSERT_EQ(result.words.size(), test.count + 1);
+        EXPECT_EQ(result.words.back(), words.back());
+      }
+    }
+  }
+}
+
+}  // namespace
