@@ -1,0 +1,13 @@
+library ieee;
+use ieee.std_logic_1164.all;
+
+entity top is
+  port (
+    clk   : in    std_logic;
+    data  : in    std_logic_vector(7 downto 0);
+    addr  : out   std_logic_vector(0 to 3);
+    pad   : inout std_logic;
+    ready : buffer std_logic;
+    level : out   integer
+  );
+end entity top;

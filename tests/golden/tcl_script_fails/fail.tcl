@@ -1,0 +1,2 @@
+puts stderr "no table today"
+exit 3
