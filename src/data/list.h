@@ -55,8 +55,8 @@ class List {
   virtual bool hasCurrent() const { return m_Current != nullptr; }
   /// True when the current element has no successor. Requires a current element.
   virtual bool atLast() const { return m_Current->m_Next == nullptr; }
-  /// A new, empty list of the base kind.
-  virtual List* newList() const { return new List; }
+  /// A new, empty list of the same kind; the bare base makes none and returns null.
+  virtual List* newList() const { return nullptr; }
 
   /// Links `element` (not null, unlinked) at the tail; the cursor is not touched.
   void append(List_element* element);

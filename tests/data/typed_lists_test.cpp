@@ -1,0 +1,126 @@
+// Typed lists and records: ownership of the carried objects, header values, port records and
+// the class names the typed lists report.
+#include "data/typed_lists.h"
+
+#include <gtest/gtest.h>
+
+#include <string>
+#include <vector>
+
+namespace {
+
+int g_Alive = 0;
+
+struct Counted {
+  Counted() { ++g_Alive; }
+  ~Counted() { --g_Alive; }
+  Counted(const Counted&) = delete;
+  Counted& operator=(const Counted&) = delete;
+};
+
+TEST(TypedLists, OwningListFreesEveryObjectEvenAfterANullOne) {
+  g_Alive = 0;
+  {
+    OwningObjectList<Counted> list;
+    list.appendOwned(new Counted);
+    list.appendObject(nullptr);
+    list.appendOwned(new Counted);
+    list.appendOwned(new Counted);
+    EXPECT_EQ(g_Alive, 3);
+    list.first();
+    list.next();  // a walk in progress does not change what is freed
+  }
+  EXPECT_EQ(g_Alive, 0);
+}
+
+TEST(TypedLists, EmptyOwningListFreesNothing) {
+  g_Alive = 0;
+  { OwningObjectList<Counted> list; }
+  EXPECT_EQ(g_Alive, 0);
+}
+
+TEST(TypedLists, LongOwningListIsFreedCompletely) {
+  g_Alive = 0;
+  {
+    OwningObjectList<Counted> list;
+    for (int i = 0; i < 200000; ++i) list.appendOwned(new Counted);
+    int walked = 0;
+    for (Counted* object = list.first(); object != nullptr; object = list.next()) ++walked;
+    EXPECT_EQ(walked, 200000);
+  }
+  EXPECT_EQ(g_Alive, 0);
+}
+
+TEST(TypedLists, ClassNameIsThatOfTheObjectList) {
+  StbDataList data("p", "m", "f", ".e", "t", "", "title", "date");
+  ExpansionList bits;
+  TokList tokens;
+  const List* lists[] = {&data, &bits, &tokens};
+  for (const List* list : lists) {
+    EXPECT_STREQ(list->className(), "Object_list");
+    List* made = list->newList();
+    ASSERT_NE(made, nullptr);
+    EXPECT_STREQ(made->className(), "Object_list");
+    delete made;
+  }
+}
+
+TEST(TypedLists, HeaderValuesAreCopiedAndNullBecomesEmpty) {
+  std::string project = "proj";
+  StbDataList data(project.c_str(), nullptr, "out.vhd", nullptr, "pinforge", nullptr, "out",
+                   nullptr);
+  project = "changed";
+  const std::vector<std::string> values = {data.m_Project, data.m_Module, data.m_FileName,
+                                           data.m_Ext,     data.m_Tool,   data.m_Ver,
+                                           data.m_Title,   data.m_Date};
+  EXPECT_EQ(values,
+            (std::vector<std::string>{"proj", "", "out.vhd", "", "pinforge", "", "out", ""}));
+  EXPECT_TRUE(data.isEmpty());
+  EXPECT_EQ(data.first(), nullptr);
+}
+
+TEST(TypedLists, PortsComeBackInAppendOrder) {
+  StbDataList data("p", "m", "f", "e", "t", "v", "ti", "d");
+  data.appendOwned(new PortRecord("clk", -1, -1, 'I'));
+  data.appendOwned(new PortRecord("q", 7, 0, 'O'));
+  data.appendOwned(new PortRecord("io", 0, 1, 'B'));
+  std::vector<std::string> names;
+  for (PortRecord* port = data.first(); port != nullptr; port = data.next())
+    names.push_back(port->m_Name);
+  EXPECT_EQ(names, (std::vector<std::string>{"clk", "q", "io"}));
+
+  TokList tokens;
+  tokens.appendOwned(new TokEntry("%iport%"));
+  tokens.appendOwned(new TokEntry(std::string("a\0b", 3)));
+  ASSERT_NE(tokens.first(), nullptr);
+  EXPECT_EQ(tokens.first()->m_Text, "%iport%");
+  EXPECT_EQ(tokens.next()->m_Text.size(), 3u);
+  EXPECT_EQ(tokens.next(), nullptr);
+}
+
+TEST(PortRecord, BoundsDirectionAndBus) {
+  const struct {
+    int32_t left;
+    int32_t right;
+    bool bus;
+  } cases[] = {{-1, -1, false}, {2, 0, true}, {0, 1, true}, {0, 0, true}, {-1, 5, false}};
+  for (const auto& c : cases) {
+    const PortRecord port("p", c.left, c.right, 'N');
+    EXPECT_EQ(port.isBus(), c.bus) << c.left << ":" << c.right;
+    EXPECT_EQ(port.m_Left, c.left);
+    EXPECT_EQ(port.m_Right, c.right);
+    EXPECT_EQ(port.m_Dir, 'N');
+  }
+}
+
+TEST(PortRecord, MappedNameIsReplacedWhole) {
+  PortRecord port("data", 3, 0, 'O');
+  EXPECT_FALSE(port.m_MappedName.has_value());
+  port.setMappedName("first_longer_name");
+  port.setMappedName("q");
+  ASSERT_TRUE(port.m_MappedName.has_value());
+  EXPECT_EQ(*port.m_MappedName, "q");
+  EXPECT_EQ(port.m_Name, "data");
+}
+
+}  // namespace
