@@ -18,19 +18,30 @@ std::unique_ptr<ExpansionList> Forge::expandBus(const PortRecord& port) const {
 }
 
 std::string Forge::formatPort(const PortRecord& port) const {
-  std::string text = displayName(port);
+  const std::string& name = displayName(port);
+  std::string text;
+  // Built by appending: gcc 12 at -O3 misreports the prepending string operators.
   if (m_ExpandBus && port.isBus() && port.m_Left == port.m_Right) {
+    text = name;
     text += m_BusLeft;
     text += std::to_string(port.m_Left);
     text += m_BusRight;
   } else if (m_ShowRange && port.isBus()) {
-    std::string range = "[" + std::to_string(port.m_Left) + ":" + std::to_string(port.m_Right) + "]";
+    std::string range = "[";
+    range += std::to_string(port.m_Left);
+    range += ':';
+    range += std::to_string(port.m_Right);
+    range += ']';
     if (m_RangePosition == AsPostfix) {
+      text = name;
       text += range;
     } else {
-      range += ' ';
-      text.insert(0, range);
+      text = range;
+      text += ' ';
+      text += name;
     }
+  } else {
+    text = name;
   }
   return applyCase(text);
 }
