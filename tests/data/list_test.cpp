@@ -1,5 +1,5 @@
 // List containers: the built-in cursor (first/next/hasCurrent/atLast), appends during a walk,
-// links, element order of destruction, class names and the printing hooks.
+// links, the order in which elements are deleted, and class names.
 #include "data/list.h"
 
 #include <gtest/gtest.h>
@@ -171,29 +171,6 @@ TEST(List, ClassNamesAndFactories) {
   EXPECT_EQ(copy->m_Next, nullptr);
   EXPECT_EQ(copy->m_Prev, nullptr);
   plain.append(copy);
-}
-
-TEST(List, PrintCurrentUsesTheElementsPrint) {
-  List list;
-  testing::internal::CaptureStdout();
-  list.printCurrent();
-  list.append(new List_element);
-  list.append(new Object_element(nullptr));
-  list.printCurrent();
-  list.m_Current = list.m_Head;
-  list.printCurrent();
-  list.m_Current = list.m_Head->m_Next;
-  list.printCurrent();
-  EXPECT_EQ(testing::internal::GetCapturedStdout(), "List element");
-}
-
-TEST(List, LongListAppendsWalksAndFreesIteratively) {
-  constexpr int kCount = 200000;
-  Object_list list;
-  for (int i = 0; i < kCount; ++i) list.appendObject(&g_Objects[i % 8]);
-  int walked = 0;
-  for (void* object = list.first(); object != nullptr; object = list.next()) ++walked;
-  EXPECT_EQ(walked, kCount);
 }
 
 }  // namespace

@@ -33,12 +33,6 @@ TEST(TypedLists, OwningListFreesEveryObjectEvenAfterANullOne) {
   EXPECT_EQ(g_Alive, 0);
 }
 
-TEST(TypedLists, EmptyOwningListFreesNothing) {
-  g_Alive = 0;
-  { OwningObjectList<Counted> list; }
-  EXPECT_EQ(g_Alive, 0);
-}
-
 TEST(TypedLists, LongOwningListIsFreedCompletely) {
   g_Alive = 0;
   {
