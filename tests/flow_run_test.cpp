@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include <cstdlib>
+#include <ostream>
 #include <string>
 #include <vector>
 
@@ -34,6 +35,8 @@ const TraceCase kCases[] = {
     {"DebugTclPathWritesTrace", "top", "t.tcl", true, false, true, 0, ""},
     {"UnwritableTraceIgnored", "top", "t.txt", true, true, false, 0, "top\n"},
 };
+
+void PrintTo(const TraceCase& c, std::ostream* os) { *os << c.name; }
 
 class TraceFileTest : public testing::TestWithParam<TraceCase> {};
 

@@ -2,6 +2,8 @@
 // case runner.
 #include "flow_support.h"
 
+#include <gtest/gtest.h>
+
 #include <fcntl.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
@@ -188,6 +190,11 @@ std::string describeDifference(std::string_view what, std::string_view expected,
   if (expected.size() + actual.size() < 4000)
     message << "--- expected ---\n" << expected << "\n--- actual ---\n" << actual << "\n";
   return message.str();
+}
+
+void expectSameText(std::string_view what, std::string_view expected, std::string_view actual) {
+  const std::string difference = describeDifference(what, expected, actual);
+  if (!difference.empty()) ADD_FAILURE() << difference;
 }
 
 }  // namespace flowtest

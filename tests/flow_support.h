@@ -57,5 +57,7 @@ bool onPath(std::string_view program);
 /// Empty when equal; otherwise a readable account of the first differing line.
 std::string describeDifference(std::string_view what, std::string_view expected,
                                std::string_view actual);
+/// Adds a test failure with describeDifference's account when the texts differ.
+void expectSameText(std::string_view what, std::string_view expected, std::string_view actual);
 
 }  // namespace flowtest

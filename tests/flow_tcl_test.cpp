@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 
 #include <cstdlib>
+#include <ostream>
 #include <string>
 #include <vector>
 
@@ -10,7 +11,6 @@
 
 namespace {
 
-using flowtest::describeDifference;
 
 constexpr const char* kFakeRunscr =
     "#!/bin/sh\n"
@@ -118,6 +118,8 @@ const TclCase kCases[] = {
      "", 0, true},
 };
 
+void PrintTo(const TclCase& c, std::ostream* os) { *os << c.name; }
+
 class TclDriverTest : public testing::TestWithParam<TclCase> {};
 
 TEST_P(TclDriverTest, WritesScriptAndJudgesShell) {
@@ -148,12 +150,12 @@ TEST_P(TclDriverTest, WritesScriptAndJudgesShell) {
   ASSERT_TRUE(run.started);
 
   EXPECT_EQ(run.status, c.expectedStatus);
-  EXPECT_EQ(describeDifference("stdout", c.expectedStdout, run.out), "");
-  EXPECT_EQ(describeDifference("stderr", c.expectedStderr, run.err), "");
+  flowtest::expectSameText("stdout", c.expectedStdout, run.out);
+  flowtest::expectSameText("stderr", c.expectedStderr, run.err);
   bool captured = false;
   const std::string script = flowtest::readFile(capture, &captured);
   ASSERT_TRUE(captured) << "the stand-in runscr was not run";
-  EXPECT_EQ(describeDifference("driver script", expectedScript(c), script), "");
+  flowtest::expectSameText("driver script", expectedScript(c), script);
 
   const std::string scriptName = flowtest::readFile(capture + ".name");
   EXPECT_TRUE(scriptName.starts_with(tmp + "/")) << scriptName;

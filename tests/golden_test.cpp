@@ -17,7 +17,6 @@
 namespace {
 
 namespace fs = std::filesystem;
-using flowtest::describeDifference;
 using flowtest::readFile;
 
 /// Files of a case directory that describe the case rather than take part in the run.
@@ -84,9 +83,7 @@ TEST_P(GoldenTest, MatchesExpectations) {
                                      std::pair{"expect.stderr", &run.err}}) {
     bool present = false;
     const std::string expected = readFile(caseDir / name, &present);
-    if (present) {
-      EXPECT_EQ(describeDifference(name, expected, *actual), "");
-    }
+    if (present) flowtest::expectSameText(name, expected, *actual);
   }
 
   std::error_code error;
@@ -98,9 +95,7 @@ TEST_P(GoldenTest, MatchesExpectations) {
     bool produced = false;
     const std::string actual = readFile(fs::path(work.path()) / relative, &produced);
     EXPECT_TRUE(produced) << relative << " was not produced";
-    if (produced) {
-      EXPECT_EQ(describeDifference(relative.string(), readFile(entry.path()), actual), "");
-    }
+    if (produced) flowtest::expectSameText(relative.string(), readFile(entry.path()), actual);
   }
 }
 
