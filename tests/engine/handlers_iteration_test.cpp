@@ -124,6 +124,10 @@ INSTANTIATE_TEST_SUITE_P(
         IterCase{"mapping_in_body_keeps_current_bit",
                  "@MAP@@EXPANDBUS@@ITERATE@%PORT%@MAPSIGNAL q TO r@@ITERATOR@@ENDITERATE@"
                  "|%port%", kSmallBus, "d_1_, d_0_, r|d_1_, d_0_, r", 0, ""},
+        // Bits already handed out keep the mapped name their bus had when it was expanded.
+        IterCase{"mapping_current_bus_reaches_next_expansion",
+                 "@MAP@@EXPANDBUS@@ITERATE@%IPORT%@MAPSIGNAL d TO e@@ITERATOR@@ENDITERATE@"
+                 "|%iport%", kSmallBus, "d_1_, d_0_|e_1_, e_0_", 0, ""},
         // Errors.
         IterCase{"nested_iterate", "@ITERATE@%PORT%a@ITERATE@%PORT%b@ENDITERATE@c", kAbc, "a, ",
                  1, "@ITERATE@ may not occur inside an @ITERATE@ body."},

@@ -1,7 +1,11 @@
 // Port-list variables, bus expansion and the text of one port.
 #include <gtest/gtest.h>
 
+#include <climits>
+#include <memory>
+
 #include "engine/handlers_fixture.h"
+#include "engine/keyword_table.h"
 
 namespace {
 
@@ -94,5 +98,83 @@ INSTANTIATE_TEST_SUITE_P(
                  "alpha, beta, \ngamma"},
         ListCase{"wrap_width_zero", "@SET OUTLINEWIDTH=0@%port%", kAbc, "a, \nb, \nc"}),
     [](const ::testing::TestParamInfo<ListCase>& info) { return std::string(info.param.name); });
+
+}  // namespace
+
+namespace {
+
+struct ExpandCase {
+  const char* name;
+  int32_t left;
+  int32_t right;
+  std::vector<int32_t> bits;
+};
+
+class ExpandBusTest : public ::testing::TestWithParam<ExpandCase> {};
+
+TEST_P(ExpandBusTest, BitsRunFromLeftToRightInclusive) {
+  const ExpandCase& c = GetParam();
+  StbDataList data(nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr);
+  Forge forge(nullptr, nullptr, nullptr, &data);
+  PortRecord bus("bus", c.left, c.right, 'B');
+  bus.setMappedName("m");
+  std::unique_ptr<ExpansionList> bits = forge.expandBus(bus);
+  std::vector<int32_t> seen;
+  for (PortRecord* bit = bits->first(); bit != nullptr; bit = bits->next()) {
+    EXPECT_EQ(bit->m_Name, "bus");
+    EXPECT_EQ(bit->m_Left, bit->m_Right);
+    EXPECT_EQ(bit->m_Dir, 'B');
+    EXPECT_EQ(bit->m_MappedName.value_or(""), "m");
+    seen.push_back(bit->m_Left);
+  }
+  EXPECT_EQ(seen, c.bits);
+}
+
+INSTANTIATE_TEST_SUITE_P(
+    Ranges, ExpandBusTest,
+    ::testing::Values(ExpandCase{"falling", 3, 0, {3, 2, 1, 0}},
+                      ExpandCase{"rising", 0, 2, {0, 1, 2}},
+                      ExpandCase{"one_bit", 5, 5, {5}},
+                      ExpandCase{"through_minus_one", 1, -2, {1, 0, -1, -2}},
+                      ExpandCase{"top_of_range", INT32_MAX - 1, INT32_MAX, {INT32_MAX - 1, INT32_MAX}},
+                      ExpandCase{"bottom_of_range", INT32_MIN + 1, INT32_MIN,
+                                 {INT32_MIN + 1, INT32_MIN}}),
+    [](const ::testing::TestParamInfo<ExpandCase>& info) { return std::string(info.param.name); });
+
+// The walk behind port lists and iterations, driven directly.
+TEST(SelectPort, WalksKindThenStaysExhausted) {
+  StbDataList data(nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr);
+  handlers_test::fillPorts(data, {{"a", -1, -1, 'O'}, {"d", 1, 0, 'I'}, {"e", -1, -1, 'I'}});
+  Forge forge(nullptr, nullptr, nullptr, &data);
+  forge.m_ExpandBus = true;
+  std::string seen;
+  for (PortRecord* p = forge.selectPort(kKwIPort, true); p != nullptr;
+       p = forge.selectPort(kKwIPort, false)) {
+    seen += p->m_Name + std::to_string(p->m_Left) + " ";
+    forge.m_ExpandBus = false;  // a bus already being handed out keeps coming as bits
+  }
+  EXPECT_EQ(seen, "d1 d0 e-1 ");
+  EXPECT_EQ(forge.selectPort(kKwIPort, false), nullptr);
+  EXPECT_EQ(forge.m_Expansion, nullptr);
+  EXPECT_EQ(forge.selectPort(kKwOPort, true)->m_Name, "a");
+  EXPECT_EQ(forge.selectPort(kKwNode, true), nullptr);
+  EXPECT_EQ(forge.selectPort(kKwModule, true), nullptr);
+}
+
+TEST(SelectPort, SearchesLeaveTheWalkAlone) {
+  StbDataList data(nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr);
+  handlers_test::fillPorts(data, {{"d", 1, 0, 'I'}, {"e", -1, -1, 'I'}});
+  Forge forge(nullptr, nullptr, nullptr, &data);
+  forge.m_ExpandBus = true;
+  PortRecord* bit = forge.selectPort(kKwPort, true);
+  ASSERT_NE(bit, nullptr);
+  EXPECT_EQ(forge.searchPort(kKwSignal, true)->m_Name, "d");
+  EXPECT_EQ(forge.searchPort(kKwSignal, false)->m_Name, "e");
+  EXPECT_EQ(forge.searchPort(kKwSignal, false), nullptr);
+  EXPECT_EQ(forge.searchPort(kKwSignal, false), nullptr);
+  EXPECT_EQ(bit->m_Left, 1);
+  EXPECT_EQ(forge.selectPort(kKwPort, false)->m_Left, 0);
+  EXPECT_EQ(forge.selectPort(kKwPort, false)->m_Name, "e");
+}
 
 }  // namespace
