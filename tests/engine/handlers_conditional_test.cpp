@@ -243,12 +243,4 @@ INSTANTIATE_TEST_SUITE_P(
                       NameCase{"Data", "dATA", false, true}, NameCase{"Da?a", "da?a", false, true},
                       NameCase{"a_b", "A_B", false, true}, NameCase{"a[b", "A{B", false, false}));
 
-TEST(SignalNameOrder, NonMatchKeepsComparisonSign) {
-  StbDataList data(nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr);
-  Forge forge(nullptr, nullptr, nullptr, &data);
-  EXPECT_LT(forge.compareSignalName("abc", "abd"), 0);
-  EXPECT_GT(forge.compareSignalName("abd", "abc"), 0);
-  EXPECT_LT(forge.compareSignalName("ab", "abc"), 0);
-}
-
 }  // namespace

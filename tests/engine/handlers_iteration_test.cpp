@@ -195,10 +195,4 @@ TEST(IterationTrace, RejectedIteratorIsTraced) {
   EXPECT_EQ(linesStartingWith(run.trace, "eatIterate()"), "eatIterate() Iterator=%module%\n");
 }
 
-TEST(IterationTrace, NoTraceStreamWritesNothingElsewhere) {
-  const handlers_test::Run run = runTemplate("@ITERATE@%PORT%@ITERATOR@@ENDITERATE@", kAbc);
-  EXPECT_EQ(run.output, "a, b, c");
-  EXPECT_TRUE(run.trace.empty());
-}
-
 }  // namespace

@@ -43,7 +43,6 @@ INSTANTIATE_TEST_SUITE_P(
     Lists, PortListTest,
     ::testing::Values(
         ListCase{"iport", "%iport%", kAbc, "a, b, c"},
-        ListCase{"upper_variable_word", "<%IPORT%>", kAbc, "<a, b, c>"},
         ListCase{"one_port_no_delimiter", "[%iport%]", {{"a", -1, -1, 'I'}}, "[a]"},
         ListCase{"no_port_of_kind", "x%oport%y", kAbc, "xy"},
         ListCase{"node_never_built", "%node%|%signal%", kAbc, "|a, b, c"},
