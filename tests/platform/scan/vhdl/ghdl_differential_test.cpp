@@ -1,0 +1,494 @@
+// Holds the VHDL reader against GHDL. For every fixture file GHDL analyses, GHDL's own parse
+// tree gives each entity's port names, modes, type marks and lines, and a generated
+// architecture of the entity, elaborated with the generic defaults, reports each port's
+// bounds; the extractor must agree on all of it.
+#include <gtest/gtest.h>
+
+#include <cstdlib>
+#include <filesystem>
+#include <iostream>
+#include <map>
+#include <regex>
+#include <set>
+#include <string>
+#include <vector>
+
+#include "platform/scan.h"
+#include "support/diff_tools.h"
+#include "support/ghdl_xml.h"
+
+namespace {
+
+using namespace difftest;
+
+// How a probe line asks GHDL about a port. GHDL's analyser decides: a line that does not
+// analyse is retried with the next kind, so no guess about the port's type is needed.
+enum class ProbeKind {
+  Array,   // integer-indexed array: 'left, 'right and 'ascending of the object
+  Scalar,  // scalar subtype: its bounds through 'image, whatever the type
+  Opaque,  // records and arrays with a non-integer index: nothing to compare but "no range"
+};
+
+struct GhdlBounds {
+  bool reported = false;
+  ProbeKind kind = ProbeKind::Opaque;
+  std::string left;
+  std::string right;
+  bool ascending = false;
+};
+
+struct ProbedEntity {
+  const GhdlEntity* entity;
+  std::vector<ProbeKind> kinds;
+  bool analysable = true;
+};
+
+const char* const kStd = "--std=08";
+const char* const kRelaxed = "-frelaxed";
+const char* const kProbeArchitecture = "pinforge_probe";
+
+bool isInteger(const std::string& image) {
+  static const std::regex integer("-?[0-9]+");
+  return std::regex_match(image, integer);
+}
+
+int modeCode(const std::string& mode) {
+  if (mode == "in") return ScanPort::Input;
+  if (mode == "out") return ScanPort::Output;
+  if (mode == "inout") return ScanPort::Inout;
+  if (mode == "buffer") return ScanPort::Buffer;
+  if (mode == "linkage") return ScanPort::Linkage;
+  return 0;
+}
+
+std::string withoutComments(const std::string& text) {
+  static const std::regex comment("--[^\n]*");
+  return std::regex_replace(text, comment, "");
+}
+
+// Declares a package of its own (not a package body or instantiation): such files are
+// analysed ahead of every fixture so fixtures can use packages from other files.
+bool declaresPackage(const std::string& text) {
+  static const std::regex package(R"((^|[^\w.])package\s+\w+\s+is\s+(?!new\b))",
+                                  std::regex::icase | std::regex::ECMAScript);
+  return std::regex_search(withoutComments(text), package);
+}
+
+// Library names from library clauses other than the predefined ones.
+std::set<std::string> namedLibraries(const std::string& text) {
+  static const std::regex clause(R"((^|[^\w.])library\s+([\w\s,]+);)", std::regex::icase);
+  static const std::regex name(R"(\w+)");
+  std::set<std::string> libraries;
+  const std::string code = withoutComments(text);
+  for (std::sregex_iterator it(code.begin(), code.end(), clause), end; it != end; ++it) {
+    const std::string names = (*it)[2].str();
+    for (std::sregex_iterator n(names.begin(), names.end(), name); n != end; ++n) {
+      const std::string library = lowerCase(n->str());
+      if (library != "ieee" && library != "std" && library != "work") libraries.insert(library);
+    }
+  }
+  return libraries;
+}
+
+std::string probeLine(size_t index, const std::string& port, ProbeKind kind) {
+  const std::string head = "    report \"P|" + std::to_string(index) + "|";
+  switch (kind) {
+    case ProbeKind::Array:
+      return head + "A|\" & integer'image(" + port + "'left) & \"|\" & integer'image(" + port +
+             "'right) & \"|\" & boolean'image(" + port + "'ascending);\n";
+    case ProbeKind::Scalar: {
+      // No 'ascending here: GHDL 2.0 crashes on it for a subtype that depends on generics.
+      const std::string type = port + "'subtype";
+      return head + "S|\" & " + type + "'image(" + type + "'left) & \"|\" & " + type + "'image(" +
+             type + "'right);\n";
+    }
+    case ProbeKind::Opaque:
+      break;
+  }
+  return head + "N\";\n";
+}
+
+// Reads "P|index|kind|left|right|ascending" lines out of a probe run.
+std::vector<GhdlBounds> parseReports(const std::string& output, size_t portCount) {
+  std::vector<GhdlBounds> bounds(portCount);
+  static const std::regex report(R"(\(report note\): P\|(\d+)\|([ASN])(?:\|([^|\n]*)\|([^|\n]*)(?:\|(true|false))?)?)");
+  for (std::sregex_iterator it(output.begin(), output.end(), report), end; it != end; ++it) {
+    const size_t index = std::strtoul((*it)[1].str().c_str(), nullptr, 10);
+    if (index >= portCount) continue;
+    GhdlBounds& b = bounds[index];
+    b.reported = true;
+    const char kind = (*it)[2].str()[0];
+    b.kind = kind == 'A' ? ProbeKind::Array : kind == 'S' ? ProbeKind::Scalar : ProbeKind::Opaque;
+    b.left = (*it)[3].str();
+    b.right = (*it)[4].str();
+    b.ascending = (*it)[5].str() == "true";
+    if (b.kind == ProbeKind::Scalar && isInteger(b.left) && isInteger(b.right))
+      b.ascending = std::atoll(b.left.c_str()) <= std::atoll(b.right.c_str());
+  }
+  return bounds;
+}
+
+// The design units a file declares, as keys that clash exactly when GHDL would see one unit
+// defined twice.
+std::set<std::string> unitKeys(const std::string& text) {
+  static const std::regex unit(
+      R"((^|[^\w.])(entity|package\s+body|package|configuration|context)\s+(\w+|\\[^\\]+\\)\s+(is|of)\b)",
+      std::regex::icase);
+  static const std::regex architecture(R"((^|[^\w.])architecture\s+(\w+)\s+of\s+(\w+)\s+is\b)",
+                                       std::regex::icase);
+  static const std::regex blanks(R"(\s+)");
+  std::set<std::string> keys;
+  const std::string code = withoutComments(text);
+  for (std::sregex_iterator it(code.begin(), code.end(), unit), end; it != end; ++it)
+    keys.insert(std::regex_replace(lowerCase((*it)[2].str()), blanks, " ") + " " +
+                lowerCase((*it)[3].str()));
+  for (std::sregex_iterator it(code.begin(), code.end(), architecture), end; it != end; ++it)
+    keys.insert("architecture " + lowerCase((*it)[2].str()) + " of " + lowerCase((*it)[3].str()));
+  return keys;
+}
+
+struct FixtureState {
+  std::string workdir;  ///< private copy of the shared libraries with the fixture analysed
+  std::string rejection;  ///< why GHDL does not analyse the fixture; empty when it does
+  bool isPackageFile = false;
+  bool declaresEntity = false;
+  bool dumped = false;  ///< `entities` came from a batched dump
+  std::vector<GhdlEntity> entities;
+};
+
+class GhdlDifferential : public ::testing::TestWithParam<std::string> {
+ public:
+  // All the per-directory work happens once: the shared package libraries, the analysis of
+  // each fixture in its own library copy, and GHDL's parse-tree dumps. A dump repeats the
+  // IEEE packages it depends on, so fixtures are dumped in as few batches as possible.
+  static void SetUpTestSuite() {
+    s_Ghdl = findTool("ghdl");
+    if (s_Ghdl.empty()) return;
+    s_Root = std::make_unique<ScratchDir>();
+    if (s_Root->path().empty()) return;
+    s_Shared = s_Root->path() + "/shared";
+    std::error_code error;
+    std::filesystem::create_directories(s_Shared, error);
+    std::map<std::string, std::set<std::string>> keysOfFile;
+    std::set<std::string> libraries{"work"};
+    for (const std::string& file : fixtureFiles("vhdl", {".vhd", ".vhdl"})) {
+      std::string text;
+      if (!readFile(file, text)) continue;
+      FixtureState& state = s_Fixtures[file];
+      state.isPackageFile = declaresPackage(text);
+      keysOfFile[file] = unitKeys(text);
+      for (const std::string& key : keysOfFile[file])
+        if (key.rfind("entity ", 0) == 0) state.declaresEntity = true;
+      const std::set<std::string> named = namedLibraries(text);
+      libraries.insert(named.begin(), named.end());
+    }
+    analysePackageFiles(libraries);
+    std::vector<std::vector<std::string>> batches;
+    std::vector<std::set<std::string>> batchKeys;
+    for (auto& [file, state] : s_Fixtures) {
+      state.workdir = copyOfShared(fixtureTestName(file));
+      const ToolRun analysis = ghdl({"-a", file}, state.workdir);
+      if (analysis.status != 0) state.rejection = firstErrorLine(analysis.output);
+      if (!state.rejection.empty() || state.isPackageFile || !state.declaresEntity) continue;
+      size_t batch = 0;
+      while (batch < batches.size() && !disjoint(batchKeys[batch], keysOfFile[file])) ++batch;
+      if (batch == batches.size()) {
+        batches.emplace_back();
+        batchKeys.emplace_back();
+      }
+      batches[batch].push_back(file);
+      batchKeys[batch].insert(keysOfFile[file].begin(), keysOfFile[file].end());
+    }
+    for (size_t b = 0; b < batches.size(); ++b) {
+      std::vector<std::string> args{"--file-to-xml"};
+      args.insert(args.end(), batches[b].begin(), batches[b].end());
+      const ToolRun dump = ghdl(args, copyOfShared("dump" + std::to_string(b)));
+      if (dump.status != 0) continue;  // each file is then dumped on its own
+      for (const std::string& file : batches[b])
+        s_Fixtures[file].dumped = readGhdlEntities(dump.output, file, s_Fixtures[file].entities);
+    }
+  }
+
+  static void TearDownTestSuite() {
+    s_Root.reset();
+    s_PackageFiles.clear();
+    s_Fixtures.clear();
+  }
+
+ protected:
+  static ToolRun ghdl(std::vector<std::string> args, const std::string& workdir) {
+    args.insert(args.begin() + 1, {kStd, kRelaxed, "--workdir=" + workdir, "-P" + workdir});
+    args.insert(args.begin(), s_Ghdl);
+    return runTool(args);
+  }
+
+  static bool disjoint(const std::set<std::string>& a, const std::set<std::string>& b) {
+    for (const std::string& key : b)
+      if (a.count(key) != 0) return false;
+    return true;
+  }
+
+  // Analyses every fixture that declares a package into the shared directory, once into
+  // "work" and once into each library some fixture names. Files are retried while any
+  // succeeds, so packages that use each other need no particular file order.
+  static void analysePackageFiles(const std::set<std::string>& libraries) {
+    std::vector<std::string> candidates;
+    for (const auto& [file, state] : s_Fixtures)
+      if (state.isPackageFile) candidates.push_back(file);
+    for (const std::string& library : libraries) {
+      std::vector<std::string> pending = candidates;
+      bool progress = true;
+      while (progress && !pending.empty()) {
+        progress = false;
+        for (auto it = pending.begin(); it != pending.end();) {
+          const ToolRun run = runTool({s_Ghdl, "-a", kStd, kRelaxed, "--workdir=" + s_Shared,
+                                       "--work=" + library, *it});
+          if (run.status != 0) {
+            ++it;
+            continue;
+          }
+          if (library == "work") s_PackageFiles.push_back(*it);
+          it = pending.erase(it);
+          progress = true;
+        }
+      }
+    }
+  }
+
+  // A copy of the shared libraries, so units of the same name in different fixtures never
+  // meet.
+  static std::string copyOfShared(const std::string& name) {
+    const std::string dir = s_Root->path() + "/" + name;
+    std::error_code error;
+    std::filesystem::create_directories(dir, error);
+    for (const auto& entry : std::filesystem::directory_iterator(s_Shared, error))
+      std::filesystem::copy_file(entry.path(), dir + "/" + entry.path().filename().string(),
+                                 std::filesystem::copy_options::overwrite_existing, error);
+    return dir;
+  }
+
+  // Builds a probe architecture for each entity and analyses them together, downgrading the
+  // probe kind of every line GHDL rejects until the file analyses. An entity whose probe
+  // still fails outside its port lines is left out.
+  bool analyseProbes(const std::string& workdir, std::vector<ProbedEntity>& probes) {
+    const std::string path = workdir + "/pinforge_probe.vhd";
+    // Every round changes something, so this ends; the bound only guards against surprises.
+    for (int round = 0; round < 64; ++round) {
+      std::string text;
+      int line = 1;
+      std::map<int, std::pair<size_t, size_t>> portOfLine;
+      std::vector<std::pair<int, int>> linesOfEntity(probes.size(), {0, -1});
+      for (size_t e = 0; e < probes.size(); ++e) {
+        ProbedEntity& probe = probes[e];
+        if (!probe.analysable) continue;
+        linesOfEntity[e].first = line;
+        text += std::string("architecture ") + kProbeArchitecture + " of " + probe.entity->name +
+                " is\nbegin\n  process\n  begin\n";
+        line += 4;
+        for (size_t p = 0; p < probe.kinds.size(); ++p) {
+          text += probeLine(p, probe.entity->ports[p].name, probe.kinds[p]);
+          portOfLine[line++] = {e, p};
+        }
+        text += "    wait;\n  end process;\nend architecture;\n";
+        line += 3;
+        linesOfEntity[e].second = line - 1;
+      }
+      if (!writeFile(path, text)) return false;
+      const ToolRun run = ghdl({"-a", path}, workdir);
+      if (run.status == 0) return true;
+
+      static const std::regex error(R"((?:^|\n)[^\n]*pinforge_probe\.vhd:(\d+):\d+:)");
+      bool changed = false;
+      std::set<int> handled;
+      for (std::sregex_iterator it(run.output.begin(), run.output.end(), error), end; it != end;
+           ++it) {
+        const int errorLine = std::atoi((*it)[1].str().c_str());
+        if (!handled.insert(errorLine).second) continue;  // one step per line and round
+        const auto port = portOfLine.find(errorLine);
+        if (port != portOfLine.end()) {
+          ProbeKind& kind = probes[port->second.first].kinds[port->second.second];
+          if (kind == ProbeKind::Opaque) continue;
+          kind = kind == ProbeKind::Array ? ProbeKind::Scalar : ProbeKind::Opaque;
+          changed = true;
+          continue;
+        }
+        for (size_t e = 0; e < probes.size(); ++e) {
+          if (probes[e].analysable && errorLine >= linesOfEntity[e].first &&
+              errorLine <= linesOfEntity[e].second) {
+            std::cout << "  note: GHDL cannot analyse a probe of entity " << probes[e].entity->name
+                      << ", left out: " << firstErrorLine(run.output) << "\n";
+            probes[e].analysable = false;
+            changed = true;
+          }
+        }
+      }
+      if (!changed) {
+        ADD_FAILURE() << "the probe architectures do not analyse:\n" << run.output;
+        return false;
+      }
+    }
+    return false;
+  }
+
+  void comparePorts(const std::string& file, const GhdlEntity& entity,
+                    const std::vector<GhdlBounds>& bounds, const ScanPortList& ours) {
+    std::map<std::string, const ScanPort*> oursByName;
+    std::string oursOrder;
+    for (const ScanPort* port = ours.firstPort(); port != nullptr; port = ours.nextPort(port)) {
+      oursByName.emplace(lowerCase(port->name()), port);
+      oursOrder += lowerCase(port->name()) + " ";
+    }
+    std::string ghdlOrder;
+    const std::string where = file + ": entity " + entity.name + ": port ";
+    for (size_t i = 0; i < entity.ports.size(); ++i) {
+      const GhdlPort& theirs = entity.ports[i];
+      ghdlOrder += lowerCase(theirs.name) + " ";
+      const auto found = oursByName.find(lowerCase(theirs.name));
+      if (found == oursByName.end()) {
+        ADD_FAILURE() << where << theirs.name << ": missing in ours (GHDL line " << theirs.line
+                      << ")";
+        continue;
+      }
+      comparePort(where + theirs.name, theirs, bounds[i], *found->second);
+      oursByName.erase(found);
+    }
+    for (const auto& [name, port] : oursByName)
+      ADD_FAILURE() << where << port->name() << ": ours only (line " << port->sourceLine()
+                    << "), GHDL has no such port";
+    if (oursByName.empty() && ours.size() == entity.ports.size() && oursOrder != ghdlOrder)
+      ADD_FAILURE() << file << ": entity " << entity.name << ": port order: ours " << oursOrder
+                    << "; GHDL " << ghdlOrder;
+  }
+
+  void comparePort(const std::string& where, const GhdlPort& theirs, const GhdlBounds& bounds,
+                   const ScanPort& ours) {
+    if (ours.direction() != modeCode(theirs.mode))
+      ADD_FAILURE() << where << ": direction: ours " << ours.direction() << ", GHDL "
+                    << theirs.mode << " (" << modeCode(theirs.mode) << ")";
+    if (!theirs.typeMark.empty() && lowerCase(ours.typeName()) != lowerCase(theirs.typeMark))
+      ADD_FAILURE() << where << ": type: ours \"" << ours.typeName() << "\", GHDL \""
+                    << theirs.typeMark << "\"";
+    // A declaration that lists several names may be reported at any of their lines.
+    if (ours.sourceLine() < theirs.firstLineOfList || ours.sourceLine() > theirs.line)
+      ADD_FAILURE() << where << ": line: ours " << ours.sourceLine() << ", GHDL "
+                    << theirs.firstLineOfList
+                    << (theirs.firstLineOfList != theirs.line ? ".." + std::to_string(theirs.line)
+                                                              : std::string());
+    compareRange(where, theirs, bounds, ours);
+  }
+
+  void compareRange(const std::string& where, const GhdlPort& theirs, const GhdlBounds& bounds,
+                    const ScanPort& ours) {
+    if (!bounds.reported) {
+      ADD_FAILURE() << where << ": GHDL's probe reported nothing for this port";
+      return;
+    }
+    const std::string oursRange = describeRange(ours);
+    const bool integerBounds =
+        bounds.kind != ProbeKind::Opaque && isInteger(bounds.left) && isInteger(bounds.right);
+    std::string theirRange = "no range";
+    if (integerBounds)
+      theirRange = bounds.left + (bounds.ascending ? " to " : " downto ") + bounds.right;
+    if (oursRange == theirRange) return;
+    // A scalar type mark without a constraint of its own (integer, natural, a named integer
+    // subtype) need not be reported as a range; one that is must have GHDL's bounds.
+    if (bounds.kind == ProbeKind::Scalar && !theirs.constrained && !ours.hasRange()) return;
+    // A scalar probe cannot tell "5 to 5" from "5 downto 5".
+    if (bounds.kind == ProbeKind::Scalar && integerBounds && bounds.left == bounds.right &&
+        oursRange == bounds.left + " downto " + bounds.right)
+      return;
+    ADD_FAILURE() << where << ": range: ours " << oursRange << ", GHDL " << theirRange
+                  << (bounds.kind == ProbeKind::Array    ? " (array)"
+                      : bounds.kind == ProbeKind::Scalar ? " (scalar)"
+                                                         : " (record or enumeration-indexed)");
+  }
+
+  static std::string describeRange(const ScanPort& port) {
+    if (!port.hasRange()) return "no range";
+    int32_t left = 0;
+    int32_t right = 0;
+    port.getBounds(left, right);
+    return std::to_string(left) + (port.isAscending() ? " to " : " downto ") +
+           std::to_string(right);
+  }
+
+  static std::string s_Ghdl;
+  static std::unique_ptr<ScratchDir> s_Root;
+  static std::string s_Shared;
+  static std::vector<std::string> s_PackageFiles;
+  static std::map<std::string, FixtureState> s_Fixtures;
+};
+
+std::string GhdlDifferential::s_Ghdl;
+std::unique_ptr<ScratchDir> GhdlDifferential::s_Root;
+std::string GhdlDifferential::s_Shared;
+std::vector<std::string> GhdlDifferential::s_PackageFiles;
+std::map<std::string, FixtureState> GhdlDifferential::s_Fixtures;
+
+TEST_P(GhdlDifferential, PortsMatchGhdl) {
+  if (s_Ghdl.empty()) GTEST_SKIP() << "ghdl is not installed";
+  ASSERT_TRUE(s_Root && !s_Root->path().empty()) << "no scratch directory";
+  const std::string& file = GetParam();
+  FixtureState& state = s_Fixtures[file];
+  if (!state.rejection.empty()) GTEST_SKIP() << "GHDL rejects " << file << ": " << state.rejection;
+  if (!state.declaresEntity) GTEST_SKIP() << file << " declares no entity";
+  if (!state.dumped) {
+    const ToolRun dump = ghdl({"--file-to-xml", file}, state.workdir);
+    ASSERT_EQ(dump.status, 0) << "ghdl --file-to-xml failed: " << firstErrorLine(dump.output);
+    ASSERT_TRUE(readGhdlEntities(dump.output, file, state.entities)) << "unreadable GHDL dump";
+  }
+  const std::vector<GhdlEntity>& entities = state.entities;
+  const std::string& workdir = state.workdir;
+  if (entities.empty()) GTEST_SKIP() << file << " declares no entity GHDL sees";
+
+  std::vector<ProbedEntity> probes;
+  for (const GhdlEntity& entity : entities) {
+    if (!entity.genericsWithoutDefault.empty()) {
+      std::cout << "  note: " << file << ": entity " << entity.name << " left out: generic "
+                << entity.genericsWithoutDefault.front() << " has no default\n";
+      continue;
+    }
+    probes.push_back({&entity, std::vector<ProbeKind>(entity.ports.size(), ProbeKind::Array)});
+  }
+  if (probes.empty()) GTEST_SKIP() << "every entity of " << file << " needs generic values";
+  if (!analyseProbes(workdir, probes)) return;
+
+  ScanExtractor extractor;
+  extractor.addDesignFile("work", file.c_str(), ScanExtractor::Vhdl);
+  for (const std::string& package : s_PackageFiles)
+    if (package != file) extractor.addDesignFile("work", package.c_str(), ScanExtractor::Vhdl);
+  extractor.Parse(ScanExtractor::Vhdl);
+
+  int compared = 0;
+  for (const ProbedEntity& probe : probes) {
+    if (!probe.analysable) continue;
+    const GhdlEntity& entity = *probe.entity;
+    const ToolRun run = ghdl({"-r", entity.name, kProbeArchitecture}, workdir);
+    if (run.status != 0) {
+      std::cout << "  note: " << file << ": entity " << entity.name
+                << " left out, GHDL cannot elaborate it as top: " << firstErrorLine(run.output)
+                << "\n";
+      continue;
+    }
+    if (extractor.findDesignUnit("work", entity.name.c_str(),
+                                 ScanExtractor::SearchAllLibraries) != 0) {
+      ADD_FAILURE() << file << ": entity " << entity.name << " (line " << entity.line
+                    << "): not found by ours";
+      continue;
+    }
+    comparePorts(file, entity, parseReports(run.output, entity.ports.size()),
+                 *extractor.getPorts());
+    ++compared;
+  }
+  if (compared == 0) GTEST_SKIP() << "GHDL elaborates no entity of " << file;
+}
+
+std::string testName(const ::testing::TestParamInfo<std::string>& info) {
+  return fixtureTestName(info.param);
+}
+
+INSTANTIATE_TEST_SUITE_P(Fixtures, GhdlDifferential,
+                         ::testing::ValuesIn(fixtureFiles("vhdl", {".vhd", ".vhdl"})), testName);
+GTEST_ALLOW_UNINSTANTIATED_PARAMETERIZED_TEST(GhdlDifferential);
+
+}  // namespace
