@@ -1,8 +1,10 @@
 // Builds the run's argument vector from the command line or from a response file.
 #include "response_file.h"
 
+#include <filesystem>
 #include <memory>
 #include <string_view>
+#include <system_error>
 
 namespace {
 
@@ -42,7 +44,11 @@ bool readLine(std::FILE* file, std::string& line) {
 }
 
 bool readResponseFile(std::FILE* messageStream, const char* name, ArgumentVector& expanded) {
-  std::unique_ptr<std::FILE, FileCloser> file(std::fopen(name, "r"));
+  // Some systems open a directory for reading; it is no more a response file there than where
+  // the open fails.
+  std::error_code error;
+  std::unique_ptr<std::FILE, FileCloser> file(
+      std::filesystem::is_directory(name, error) ? nullptr : std::fopen(name, "r"));
   if (!file) {
     std::fprintf(messageStream, "FATAL ERROR: Unable to open response file %s...\n", name);
     return false;

@@ -2,7 +2,9 @@
 // reporting messages in the program's one format and the diagnostic dump.
 #include "run_context.h"
 
+#include <filesystem>
 #include <string>
+#include <system_error>
 
 namespace {
 
@@ -48,7 +50,9 @@ std::FILE* RunContext::openErrorFile(const char* name) {
 bool RunContext::openTemplateFile(const char* name) {
   m_TemplateFileName = std::string_view(name);
   closeIfOpen(m_TemplateStream);
-  m_TemplateStream = std::fopen(name, "r");
+  // Some systems open a directory for reading; it can never be read as a template.
+  std::error_code error;
+  if (!std::filesystem::is_directory(name, error)) m_TemplateStream = std::fopen(name, "r");
   return m_TemplateStream != nullptr;
 }
 
