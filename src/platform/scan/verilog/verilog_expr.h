@@ -1,0 +1,97 @@
+// Constant expressions, data types and constant functions of the Verilog reader, kept as
+// small owned trees so they outlive the token stream they were read from.
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <vector>
+
+namespace scan {
+class SourceBuffer;
+}
+
+namespace scan::verilog {
+
+struct Expr;
+using ExprPtr = std::shared_ptr<const Expr>;
+
+struct Expr {
+  enum class Kind {
+    Number,     ///< integer literal; `unknown` when it holds x or z bits
+    Real,
+    String,
+    Name,       ///< `name`, or `scope::name` when `scope` is set
+    Unary,      ///< op args[0]
+    Binary,     ///< args[0] op args[1]
+    Ternary,    ///< args[0] ? args[1] : args[2]
+    Call,       ///< name(args), a constant function
+    System,     ///< $name(args)
+    Concat,     ///< {args}
+    Replicate,  ///< {args[0]{args[1..]}}
+    Select,     ///< args[0][args[1]] or args[0][args[1]:args[2]]
+    TypeName,   ///< a data type used as an argument ($bits(logic [3:0]))
+  };
+  Kind kind = Kind::Number;
+  std::string op;     ///< operator, or "+:"/"-:"/":" for selects
+  std::string name;   ///< names, functions, system functions
+  std::string scope;  ///< package of a scoped name
+  int64_t integer = 0;
+  double real = 0;
+  int width = 0;  ///< literal size in bits; 0 when unsized
+  bool unknown = false;
+  std::vector<ExprPtr> args;
+  std::shared_ptr<const struct TypeSpec> type;  ///< for TypeName
+  const SourceBuffer* source = nullptr;
+  size_t offset = 0;
+};
+
+struct Dimension {
+  ExprPtr left;
+  ExprPtr right;  ///< null for a size-only dimension [N]
+};
+
+struct TypeSpec {
+  enum class Base {
+    Implicit,   ///< no data type: a single bit (wire, input a)
+    Bit,        ///< logic, reg, bit
+    Atom,       ///< integer, int, byte, ... (atomWidth bits)
+    Real,       ///< real, string, event, ... : no bits to speak of
+    Named,      ///< a typedef, type parameter or interface: `name` (`scope`::name)
+    Struct,     ///< packed struct or union of `members`
+    Enum,       ///< enum over `members[0]` (or int)
+  };
+  Base base = Base::Implicit;
+  std::string written;  ///< the type name as written, for reporting
+  std::string name;
+  std::string scope;
+  std::string modport;  ///< set for an interface port (`intf.modport` or `interface`)
+  bool isInterface = false;
+  int atomWidth = 0;
+  bool isUnion = false;
+  std::vector<Dimension> packed;
+  std::vector<TypeSpec> members;
+};
+
+/// One statement of a constant function.
+struct Stmt {
+  enum class Kind { Block, Assign, If, For, While, Repeat, Return, Case, Declare, Nothing };
+  Kind kind = Kind::Nothing;
+  std::string target;  ///< assigned or declared variable
+  std::string op;      ///< "=", "+=", ... for Assign
+  ExprPtr value;       ///< right-hand side, condition, count or returned value
+  std::vector<Stmt> body;     ///< block statements; If: then, else; loops: init, step, body
+  std::vector<std::vector<ExprPtr>> labels;  ///< Case: one label list per body statement
+  bool hasDefault = false;  ///< Case: the last body statement is the default
+};
+
+struct Function {
+  std::string name;
+  std::vector<std::string> inputs;
+  std::vector<Stmt> body;
+  bool supported = true;  ///< false when the body uses a construct the interpreter lacks
+  const SourceBuffer* source = nullptr;
+  size_t offset = 0;
+};
+
+}  // namespace scan::verilog

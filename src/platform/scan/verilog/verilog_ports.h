@@ -1,0 +1,48 @@
+// Turns a parsed unit into the extractor's ports: evaluates every range, flattens packed
+// dimensions and applies the reporting rules below.
+//
+// Reporting rules:
+// - One packed dimension over single bits is reported as written: [0:7] ascending, [7:0]
+//   descending; equal bounds ([0:0], [3:3]) count as descending.
+// - Several packed dimensions, packed structs, enums and typedefs of them are flattened to
+//   [total-1:0]; atom types (int, byte, ...) report [width-1:0], except `integer`, which
+//   reports no range (its callers read an integer range as a value range).
+// - Unpacked dimensions are ignored: `logic [7:0] m [4]` reports [7:0].
+// - Non-ANSI headers keep the header's order. `.p(x)` is port p with x's declaration;
+//   `.p(x[3:0])` has x's direction and the range of the select; `.p({a, b})` is one port p as
+//   wide as its members together, with the first member's direction. An unnamed
+//   concatenation `{a, b}` reports each member as a port of its own.
+#pragma once
+
+#include <vector>
+
+#include "platform/scan.h"
+#include "platform/scan/verilog/verilog_eval.h"
+#include "platform/scan/verilog/verilog_index.h"
+#include "platform/scan/verilog/verilog_unit.h"
+
+namespace scan {
+class Diagnostics;
+}
+
+namespace scan::verilog {
+
+class LineCounter;
+
+std::vector<ScanPort> buildPorts(UnitModel& model, Evaluator& evaluator,
+                                 const DesignIndex& index, Diagnostics& diagnostics,
+                                 LineCounter& lines);
+
+/// Line numbers of offsets, counted forward from the last question so that the ports of a
+/// unit at the end of a large file cost one pass over it.
+class LineCounter {
+ public:
+  size_t lineOf(const SourceBuffer& source, size_t offset);
+
+ private:
+  const SourceBuffer* m_Source = nullptr;
+  size_t m_Offset = 0;
+  size_t m_Line = 1;
+};
+
+}  // namespace scan::verilog

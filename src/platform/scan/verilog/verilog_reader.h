@@ -1,0 +1,44 @@
+// The Verilog/SystemVerilog reader behind the extractor: the index pass over all files as one
+// compilation unit, then the selected unit's header parse and range evaluation on demand.
+#pragma once
+
+#include <memory>
+#include <string>
+#include <unordered_map>
+#include <vector>
+
+#include "platform/scan/language_reader.h"
+#include "platform/scan/verilog/verilog_index.h"
+#include "platform/scan/verilog/verilog_macros.h"
+#include "platform/scan/verilog/verilog_scope.h"
+#include "platform/scan/verilog/verilog_sources.h"
+
+namespace scan::verilog {
+
+class VerilogReader final : public LanguageReader, private ScopeProvider {
+ public:
+  explicit VerilogReader(Diagnostics& diagnostics);
+  ~VerilogReader() override;
+
+  void indexFiles(const std::vector<DesignFileEntry>& files) override;
+  /// Indexes in-memory text as the next file of the compilation unit (fuzzing, tests).
+  void indexText(std::string path, std::string text, const std::string& library);
+  bool selectUnit(std::string_view library, std::string_view unit) override;
+  std::vector<ScanPort> readPorts() override;
+
+ private:
+  Scope* package(const std::string& name) override;
+  Scope* compilationUnit() override;
+  void prepare(std::vector<std::string> designDirectories);
+
+  Diagnostics& m_Diagnostics;
+  MacroTable m_Macros;
+  std::unique_ptr<SourceStore> m_Sources;
+  std::unique_ptr<DesignIndex> m_Index;
+  std::vector<std::string> m_Libraries;
+  std::unordered_map<std::string, std::unique_ptr<Scope>> m_Packages;
+  std::unique_ptr<Scope> m_CompilationUnit;
+  const UnitRecord* m_Selected = nullptr;
+};
+
+}  // namespace scan::verilog

@@ -1,0 +1,44 @@
+// The named things a constant expression can refer to: parameters, types and functions of a
+// unit, a package or the compilation-unit scope, with the packages each scope imports.
+#pragma once
+
+#include <memory>
+#include <optional>
+#include <string>
+#include <unordered_map>
+#include <vector>
+
+#include "platform/scan/common/value.h"
+#include "platform/scan/verilog/verilog_expr.h"
+
+namespace scan::verilog {
+
+struct Parameter {
+  ExprPtr value;                      ///< null when the declaration gives no default
+  std::shared_ptr<TypeSpec> type;     ///< the declared type, when one is written
+  bool isType = false;                ///< a `parameter type`
+  std::shared_ptr<TypeSpec> typeValue;
+  // Evaluation state: the value once known, and a mark that catches circular definitions.
+  std::optional<Value> cached;
+  bool busy = false;
+};
+
+struct Scope {
+  std::string name;
+  bool isCompilationUnit = false;
+  std::unordered_map<std::string, Parameter> parameters;
+  std::unordered_map<std::string, std::shared_ptr<TypeSpec>> typedefs;
+  std::unordered_map<std::string, std::shared_ptr<Function>> functions;
+  std::vector<std::string> wildcardImports;               ///< import pkg::*
+  std::unordered_map<std::string, std::string> namedImports;  ///< name -> package
+};
+
+/// Finds package scopes (parsed on first use) and the compilation-unit scope.
+class ScopeProvider {
+ public:
+  virtual ~ScopeProvider() = default;
+  virtual Scope* package(const std::string& name) = 0;
+  virtual Scope* compilationUnit() = 0;
+};
+
+}  // namespace scan::verilog
