@@ -108,7 +108,7 @@ TEST(List, AppendLinksBothWays) {
   auto* a = new Object_element(&g_Objects[0]);
   auto* b = new Object_element(&g_Objects[1]);
   auto* c = new Object_element(&g_Objects[2]);
-  a->m_Next = c;  // stale links of the element are overwritten
+  c->m_Next = a;  // stale links of an appended element are overwritten
   list.append(a);
   list.append(b);
   list.append(c);

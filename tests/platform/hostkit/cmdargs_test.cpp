@@ -97,6 +97,8 @@ TEST(CmdArgs, Grammar) {
       {kUsage, {"-prj", "p", "-", "q"}, "unknown switch -", {}},
       {kUsage, {"-module", "m", "-bogus", "-h"}, "unknown switch -bogus", {}},
       {kSmall, {"-in", "f"}, nullptr, {{"-in", {{"f"}}}, {"-x", {}}}},
+      // A closed group ends its switch: later argument declarations do not extend it.
+      {"tool [-o <f>] {<extra>}", {"-o", "a", "b"}, "argument b does not belong to any switch", {}},
       {kSmall, {"-v"}, "missing switch -in", {}},
       {kSmall, {"-in", "f", "-range", "1"}, "switch -range needs an argument <high>", {}},
       {kSmall,
