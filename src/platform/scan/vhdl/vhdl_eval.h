@@ -1,0 +1,116 @@
+// Constant evaluation of VHDL bounds: expressions over generics, package constants, types'
+// attributes, predefined and math_real functions, and user functions run by a small
+// interpreter with a step limit. Failures are values, with a reason for the message.
+#pragma once
+
+#include <cstdint>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "platform/scan/vhdl/vhdl_design.h"
+
+namespace scan::vhdl {
+
+struct RangeValue {
+  int64_t left = 0;
+  int64_t right = 0;
+  bool ascending = false;
+  int64_t low() const { return ascending ? left : right; }
+  int64_t high() const { return ascending ? right : left; }
+  /// Number of elements; 0 for a null range.
+  int64_t length() const;
+};
+
+/// The running state of one user function call.
+struct Frame {
+  UnitScope* unit = nullptr;
+  const FunctionBody* function = nullptr;
+  std::vector<Value> parameters;
+  std::vector<Value> locals;
+  std::vector<std::pair<std::string, Value>> loopVariables;
+};
+
+/// Where names are looked up: a unit's declarations and uses, and a call's frame.
+struct EvalContext {
+  UnitScope* unit = nullptr;
+  Frame* frame = nullptr;
+};
+
+class Evaluator {
+ public:
+  /// Steps one top-level evaluation may take inside user functions.
+  static constexpr uint64_t kStepLimit = 1000000;
+
+  explicit Evaluator(Design& design) : m_Design(design) {}
+
+  /// Evaluates `expr` of `context.unit`'s arena. False with reason() set on failure.
+  bool value(const EvalContext& context, ExprId expr, Value& out);
+  /// Evaluates a discrete range: `a to b`, `x'range`, or a type name.
+  bool range(const EvalContext& context, ExprId expr, RangeValue& out);
+
+  enum class Shape { Scalar, Array, Unconstrained, Unknown, Failed };
+  /// What a port of this subtype is: a scalar, an array with `out` as its (first) index
+  /// range, an unconstrained array, or of a type nobody declared. On Failed, `failed` is the
+  /// range expression that could not be evaluated and reason() says why.
+  Shape portShape(const EvalContext& context, const SubtypeIndication& subtype, RangeValue& out,
+                  const Expr*& failed);
+
+  /// Why the last evaluation failed.
+  const std::string& reason() const { return m_Reason; }
+  /// True when the last failure was the step limit.
+  bool stepLimitHit() const { return m_StepLimitHit; }
+
+ private:
+  struct Found {
+    UnitScope* unit = nullptr;
+    Decl* decl = nullptr;
+    Value* local = nullptr;
+    const Decl* localDecl = nullptr;
+    explicit operator bool() const { return decl != nullptr || local != nullptr; }
+  };
+  static constexpr size_t kAnyArity = static_cast<size_t>(-1);
+
+  bool failWith(std::string reason);
+  bool eval(const EvalContext& c, ExprId id, Value& out);
+  bool evalName(const EvalContext& c, const Expr& e, Value& out);
+  bool evalCall(const EvalContext& c, const Expr& e, Value& out);
+  bool evalAttribute(const EvalContext& c, const Expr& e, Value& out);
+  bool evalUnary(const EvalContext& c, const Expr& e, Value& out);
+  bool evalBinary(const EvalContext& c, const Expr& e, Value& out);
+  bool evalRange(const EvalContext& c, ExprId id, RangeValue& out);
+  bool constantValue(UnitScope* unit, Decl& decl, Value& out);
+  bool foundValue(const Found& f, std::string_view name, Value& out);
+
+  Found lookup(const EvalContext& c, const std::string& key, size_t arity);
+  Found pick(UnitScope* unit, const std::string& key, size_t arity);
+  Found resolve(const EvalContext& c, const Expr& nameExpr, size_t arity);
+  Found resolveMark(const EvalContext& c, const std::vector<std::string_view>& typeMark);
+
+  bool typeRange(const EvalContext& c, const std::vector<std::string_view>& typeMark,
+                 RangeValue& out);
+  bool declRange(UnitScope* unit, Decl& decl, RangeValue& out);
+  bool subtypeRange(const EvalContext& c, const SubtypeIndication& s, RangeValue& out);
+  bool prefixRange(const EvalContext& c, const Expr& prefix, RangeValue& out);
+  Shape shapeOfDecl(UnitScope* unit, const Decl& decl, RangeValue& out, const Expr*& failed,
+                    int depth);
+
+  bool callBuiltin(std::string_view name, const std::vector<Value>& args, Value& out, bool& known);
+  bool callFunction(UnitScope* unit, Decl& decl, const std::vector<Value>& args, Value& out);
+  enum class Flow { Normal, Return, Exit, Next, Failed };
+  Flow execute(const EvalContext& c, const std::vector<int32_t>& list, Value& result,
+               std::string_view& label);
+  Flow executeOne(const EvalContext& c, const Stmt& s, Value& result, std::string_view& label);
+  Flow loopBody(const EvalContext& c, const Stmt& s, Value& result, std::string_view& label,
+                bool& stop);
+  bool step();
+
+  Design& m_Design;
+  std::string m_Reason;
+  int m_Depth = 0;
+  int m_Calls = 0;
+  uint64_t m_Steps = 0;
+  bool m_StepLimitHit = false;
+};
+
+}  // namespace scan::vhdl
