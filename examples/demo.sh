@@ -23,8 +23,12 @@ mkdir -p "$out"
 run() {
   template=$1
   output=$2
-  "$pinforge" -lib work examples/uart/uart_pkg.vhd examples/uart/uart_tx.vhd \
-    -module uart_tx -prj uart_demo -template "templates/$template" -o "$out/$output"
+  if ! log=$("$pinforge" -lib work examples/uart/uart_pkg.vhd examples/uart/uart_tx.vhd \
+      -module uart_tx -prj uart_demo -template "templates/$template" -o "$out/$output"); then
+    printf '%s\n' "$log" >&2
+    echo "demo: $template failed" >&2
+    exit 1
+  fi
   echo "  $template -> $out/$output"
 }
 

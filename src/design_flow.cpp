@@ -18,7 +18,7 @@ namespace {
 std::string titleOf(const Host::StringBase& outputFileName) {
   std::string title = Host::FileName(outputFileName.view()).GetTail().str();
   for (std::string_view suffix : {std::string_view(".v"), std::string_view(".vhd")}) {
-    if (title.size() >= suffix.size() && title.ends_with(suffix)) {
+    if (title.ends_with(suffix)) {
       title.resize(title.size() - suffix.size());
       break;
     }
