@@ -113,8 +113,10 @@ class Process {
   /// Runs `commandLine` without a shell: the line is split into words at blanks and tabs
   /// (double quotes group a word), the first word is looked up on PATH. The child's standard
   /// output and standard error go to `receiver`; returns after the child has ended. Returns 0
-  /// only for a normal exit with code 0; a program that cannot be started, or a child killed by
-  /// a signal, is a failure. `flags` and the three booleans are accepted for compatibility.
+  /// only for a normal exit with code 0; otherwise the child's exit code, 128 plus the number
+  /// of the signal that killed it, or -1 when it could not be started (not found, for one).
+  /// Standard input is /dev/null; a NUL byte in the output ends a piece and is not passed on.
+  /// `flags` and the three booleans are accepted for compatibility.
   int RunNoWindow(const char* commandLine, std::unique_ptr<ChildOutput> receiver,
                   unsigned flags, bool hideWindow, bool captureOutput, bool detach);
 };
@@ -167,8 +169,10 @@ class UT_CMDSWINFO {
 class UT_CMDARGS {
  public:
   /// Parses `argv[1..argc-1]` against `usage`. On a malformed command line writes
-  /// "pinforge: <reason>" and "Usage: <usage>" to standard error (iserror()); on -h, -help,
-  /// --help or -? writes "Usage: <usage>" to standard output (gaveusage()).
+  /// "<program>: <reason>" (the program named by the usage text's first word) and
+  /// "Usage: <usage>" to standard error (iserror()); on -h, -help, --help or -?, unless the
+  /// usage declares them, writes "Usage: <usage>" to standard output (gaveusage()). Parsing
+  /// stops at the first of these. `callback` and `option` are accepted for compatibility.
   UT_CMDARGS(int argc, char** argv, const char* usage, void* callback, int option);
   ~UT_CMDARGS();
 
