@@ -146,4 +146,24 @@ TEST_F(CliOptions, DebugModeWithCompleteInputsPrintsNoDump) {
             {notFoundLine("top") + completedWithErrors(), "", 1});
 }
 
+TEST_F(CliOptions, SuccessfulRunKeepsItsOutputAndNamesItsLanguage) {
+  ASSERT_TRUE(m_Dir.write("top.vhd", "entity top is\n  port (a : in bit);\nend entity top;\n"));
+  ASSERT_TRUE(m_Dir.write("top.v", "module top(input a);\nendmodule\n"));
+  struct Case {
+    std::vector<std::string> design;
+    const char* language;
+  };
+  for (const Case& test : {Case{{"-lib", "work", "top.vhd"}, "vhdl"},
+                           Case{{"-lang", "Verilog", "-lib", "work", "top.v"}, "verilog"}}) {
+    SCOPED_TRACE(test.language);
+    const std::vector<std::string> args = {"-module",       "top", "-prj",    "demo", "-template",
+                                           "tpl.txt",       "-o",  "out.txt", "-err", "run.log",
+                                           "-deleteonerror"};
+    expectRun(run(plus(test.design, args)),
+              {std::string("forge(") + test.language + ") completed successfully.\n", "", 0});
+    EXPECT_EQ(m_Dir.read("out.txt"), "top\n");
+    EXPECT_EQ(m_Dir.read("run.log"), "");
+  }
+}
+
 }  // namespace
