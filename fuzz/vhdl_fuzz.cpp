@@ -1,0 +1,24 @@
+// libFuzzer entry for the VHDL reader: index arbitrary bytes, then read the ports of every
+// entity found, so the index, the header parser, the evaluator and the interpreter all see
+// the input.
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <vector>
+
+#include "platform/scan/common/diagnostics.h"
+#include "platform/scan/common/source_buffer.h"
+#include "platform/scan/vhdl/vhdl_reader.h"
+
+extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
+  scan::Diagnostics diagnostics(nullptr);
+  scan::vhdl::VhdlReader reader(diagnostics);
+  std::string text(reinterpret_cast<const char*>(data), size);
+  reader.indexSource(scan::SourceBuffer::fromText("fuzz.vhd", std::move(text)), "work");
+  std::vector<std::string> entities;
+  for (const scan::vhdl::UnitRecord& unit : reader.index().units())
+    if (unit.kind == scan::vhdl::UnitKind::Entity) entities.push_back(unit.name);
+  for (const std::string& name : entities)
+    if (reader.selectUnit("work", name)) reader.readPorts();
+  return 0;
+}

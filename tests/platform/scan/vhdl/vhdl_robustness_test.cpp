@@ -1,0 +1,164 @@
+// Hostile and broken input: the reader must finish, report what it can and never crash,
+// recurse without bound or run forever.
+#include <gtest/gtest.h>
+
+#include <functional>
+#include <random>
+#include <string>
+
+#include "platform/scan/common/diagnostics.h"
+#include "platform/scan/common/source_buffer.h"
+#include "platform/scan/vhdl/vhdl_reader.h"
+
+namespace {
+
+struct Outcome {
+  bool found = false;
+  std::vector<ScanPort> ports;
+  size_t errors = 0;
+  size_t warnings = 0;
+};
+
+Outcome read(const std::string& text, const std::string& unit) {
+  scan::Diagnostics diagnostics(nullptr);
+  scan::vhdl::VhdlReader reader(diagnostics);
+  reader.indexSource(scan::SourceBuffer::fromText("t.vhd", text), "work");
+  Outcome o;
+  o.found = reader.selectUnit("work", unit);
+  if (o.found) o.ports = reader.readPorts();
+  o.errors = diagnostics.errorCount();
+  o.warnings = diagnostics.warningCount();
+  return o;
+}
+
+std::string repeat(const std::string& s, size_t n) {
+  std::string out;
+  out.reserve(s.size() * n);
+  for (size_t i = 0; i < n; ++i) out += s;
+  return out;
+}
+
+const char* kPackage =
+    "package p is\n"
+    "  constant SELF : integer := SELF + 1;\n"
+    "  function forever(n : integer) return integer;\n"
+    "  function count(n : integer) return integer;\n"
+    "end package;\n"
+    "package body p is\n"
+    "  function forever(n : integer) return integer is\n"
+    "  begin\n"
+    "    return forever(n + 1);\n"
+    "  end function;\n"
+    "  function count(n : integer) return integer is\n"
+    "    variable total : integer := 0;\n"
+    "  begin\n"
+    "    for i in 0 to n loop total := total + 1; end loop;\n"
+    "    return total;\n"
+    "  end function;\n"
+    "end package body;\n"
+    "use work.p.all;\n";
+
+struct HostileCase {
+  const char* label;
+  std::function<std::string()> text;
+  const char* unit;
+  bool found;
+  size_t ports;
+  size_t errors;       ///< exact error count
+  size_t rangedPorts;  ///< ports that still got a range
+};
+
+const HostileCase kCases[] = {
+    {"nested_parentheses_in_a_bound",
+     [] {
+       return "entity e is port (a : in bit_vector(" + repeat("(", 100000) + "1" +
+              repeat(")", 100000) + " downto 0)); end;";
+     },
+     "e", true, 1, 1, 0},
+    {"nested_parentheses_in_a_body",
+     [] {
+       return "entity e is port (a : in bit); end;\narchitecture a of e is begin x <= " +
+              repeat("(", 100000) + "1" + repeat(")", 100000) + "; end;";
+     },
+     "e", true, 1, 0, 0},
+    {"operator_chain",
+     [] { return "entity e is port (a : in bit_vector(" + repeat("1+", 100000) + "1 downto 0)); end;"; },
+     "e", true, 1, 1, 0},
+    {"huge_identifier",
+     [] {
+       return "entity " + std::string(4 << 20, 'n') + " is port (" + std::string(1 << 20, 'p') +
+              " : in bit_vector(1 downto 0)); end;\nentity e is port (b : in bit); end;";
+     },
+     "e", true, 1, 0, 0},
+    {"self_recursive_function_and_constant",
+     [] {
+       return std::string(kPackage) +
+              "entity e is port (a : in bit_vector(forever(1) downto 0);\n"
+              "  b : in bit_vector(SELF downto 0); c : in bit_vector(count(9) downto 0)); end;";
+     },
+     "e", true, 3, 0, 1},
+    {"loop_over_the_whole_integer_range",
+     [] {
+       return std::string(kPackage) +
+              "entity e is port (a : in bit_vector(count(integer'high - 1) downto 0)); end;";
+     },
+     "e", true, 1, 0, 0},
+    {"unterminated_block_comment",
+     [] { return "entity e is port (a : in bit); end;\n/* entity f is end;"; },
+     "e", true, 1, 1, 0},
+    {"unterminated_string_resumes_on_next_line",
+     [] { return "entity e is generic (S : string := \"abc\n); port (a : in bit); end;\nentity f is port (b : out bit); end;"; },
+     "f", true, 1, 1, 0},
+    {"header_cut_short", [] { return std::string("entity e is port (a : in bit_vector(7 downto"); }, "e",
+     true, 1, 1, 0},
+};
+
+class Hostile : public testing::TestWithParam<HostileCase> {};
+
+TEST_P(Hostile, FinishesWithDiagnostics) {
+  const HostileCase& c = GetParam();
+  Outcome o = read(c.text(), c.unit);
+  EXPECT_EQ(o.found, c.found);
+  EXPECT_EQ(o.ports.size(), c.ports);
+  EXPECT_EQ(o.errors, c.errors);
+  size_t ranged = 0;
+  for (const ScanPort& p : o.ports) ranged += p.hasRange() ? 1 : 0;
+  EXPECT_EQ(ranged, c.rangedPorts);
+}
+
+INSTANTIATE_TEST_SUITE_P(Vhdl, Hostile, testing::ValuesIn(kCases),
+                         [](const testing::TestParamInfo<HostileCase>& info) {
+                           return std::string(info.param.label);
+                         });
+
+const char* kSample =
+    "library ieee; use ieee.std_logic_1164.all;\n"
+    "package k is constant W : natural := 4; subtype t is bit_vector(W-1 downto 0);\n"
+    "function f(x : natural) return natural; end package;\n"
+    "package body k is function f(x : natural) return natural is variable r : natural := 0;\n"
+    "begin while r < x loop r := r + 1; end loop; return r; end function; end package body;\n"
+    "use work.k.all;\n"
+    "entity s is generic (G : natural := f(3)); port (a : in t; b : out bit_vector(G downto 0);\n"
+    "  c : inout std_logic_vector(a'range); d : buffer integer range 0 to W); end entity s;\n";
+
+TEST(VhdlRobustness, EveryPrefixOfAFileIsRead) {
+  std::string full = kSample;
+  Outcome whole = read(full, "s");
+  ASSERT_EQ(whole.ports.size(), 4u);
+  EXPECT_EQ(whole.errors, 0u);
+  for (size_t n = 0; n < full.size(); ++n) read(full.substr(0, n), "s");
+}
+
+TEST(VhdlRobustness, BinaryJunkIsSurvived) {
+  std::mt19937 random(12345);
+  for (int round = 0; round < 20; ++round) {
+    std::string junk(64 << 10, '\0');
+    for (char& c : junk) c = static_cast<char>(random() & 0xff);
+    // Splice real text in so the parser gets past the index now and then.
+    junk.insert(junk.size() / 2, kSample);
+    Outcome o = read(junk, "s");
+    EXPECT_LE(o.ports.size(), 4u);
+  }
+}
+
+}  // namespace
