@@ -79,10 +79,18 @@ inline ToolRun runTool(const std::vector<std::string>& argv, unsigned timeoutSec
   return run;
 }
 
+/// `text` in lower case (ASCII only: identifiers are compared, not prose).
+inline std::string lowerCase(std::string_view text) {
+  std::string lower(text);
+  for (char& c : lower)
+    if (c >= 'A' && c <= 'Z') c = static_cast<char>(c - 'A' + 'a');
+  return lower;
+}
+
 /// The first line of a tool's output that mentions an error, else its first line: enough to
 /// say why a fixture was skipped without flooding the log.
 inline std::string firstErrorLine(const std::string& output) {
-  size_t pos = output.find("rror");
+  size_t pos = lowerCase(output).find("error");
   pos = pos == std::string::npos ? 0 : output.rfind('\n', pos);
   pos = pos == std::string::npos ? 0 : pos + (output[pos] == '\n' ? 1 : 0);
   return output.substr(pos, output.find('\n', pos) - pos);
@@ -163,14 +171,6 @@ inline std::string fixtureTestName(const std::string& path) {
   for (char& c : name)
     if (!((c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9'))) c = '_';
   return name;
-}
-
-/// `text` in lower case (ASCII only: identifiers are compared, not prose).
-inline std::string lowerCase(std::string_view text) {
-  std::string lower(text);
-  for (char& c : lower)
-    if (c >= 'A' && c <= 'Z') c = static_cast<char>(c - 'A' + 'a');
-  return lower;
 }
 
 }  // namespace difftest
