@@ -129,8 +129,9 @@ int runFrontEnd(int argc, char** argv) {
     runDesignFlow(context);
   }
 
-  finishRun(context, parser, fatal || context.hasErrors());
+  const bool errors = fatal || context.hasErrors();
+  finishRun(context, parser, errors);
   if (messageStream == context.m_ErrorStream) context.m_ErrorStream = nullptr;
   std::fclose(messageStream);
-  return fatal || context.hasErrors() ? 1 : 0;
+  return errors ? 1 : 0;
 }
