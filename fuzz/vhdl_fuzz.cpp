@@ -18,7 +18,11 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   std::vector<std::string> entities;
   for (const scan::vhdl::UnitRecord& unit : reader.index().units())
     if (unit.kind == scan::vhdl::UnitKind::Entity) entities.push_back(unit.name);
-  for (const std::string& name : entities)
-    if (reader.selectUnit("work", name)) reader.readPorts();
+  for (const std::string& name : entities) {
+    if (!reader.selectUnit("work", name)) continue;
+    ScanPortList ports(reader.readPorts());
+    for (const ScanPort* p = ports.firstPort(); p != nullptr; p = ports.nextPort(p))
+      if (p->name() == nullptr || p->typeName() == nullptr) __builtin_trap();
+  }
   return 0;
 }

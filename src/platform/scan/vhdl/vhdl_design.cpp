@@ -7,13 +7,6 @@
 #include "platform/scan/vhdl/vhdl_parser.h"
 
 namespace scan::vhdl {
-namespace {
-
-// Context declarations may reference other contexts; a cycle stops here.
-constexpr int kMaxContextDepth = 16;
-
-}  // namespace
-
 const std::vector<size_t>* UnitScope::find(const std::string& key) const {
   auto it = byKey.find(key);
   return it == byKey.end() ? nullptr : &it->second;
@@ -29,21 +22,28 @@ bool Design::isLibraryName(std::string_view name) const {
   return std::find(libs.begin(), libs.end(), name) != libs.end();
 }
 
-void Design::expandUses(UnitScope& scope, const std::vector<UseClause>& uses, int depth) {
-  for (const UseClause& use : uses) {
-    if (!use.context) {
-      scope.uses.push_back(use);
+// Each context declaration is expanded once per unit, which also ends reference cycles; the
+// clauses it holds join the end of the work list, so no nesting depth is needed.
+void Design::expandUses(UnitScope& scope, const std::vector<UseClause>& uses) {
+  std::vector<UseClause> work = uses;
+  std::vector<const UnitRecord*> expanded;
+  for (size_t next = 0; next < work.size(); ++next) {
+    if (!work[next].context) {
+      scope.uses.push_back(work[next]);
       continue;
     }
-    if (depth >= kMaxContextDepth || use.names.size() < 2) continue;
-    std::string library = use.names[0] == "work" ? scope.record->library : use.names[0];
-    const UnitRecord* context = m_Index.find(UnitKind::Context, library, use.names[1]);
+    std::vector<std::string> names = work[next].names;
+    if (names.size() < 2) continue;
+    std::string library = names[0] == "work" ? scope.record->library : names[0];
+    const UnitRecord* context = m_Index.find(UnitKind::Context, library, names[1]);
     for (size_t i = 0; context == nullptr && i < m_Index.libraries().size(); ++i)
-      context = m_Index.find(UnitKind::Context, m_Index.libraries()[i], use.names[1]);
-    if (context == nullptr) continue;
+      context = m_Index.find(UnitKind::Context, m_Index.libraries()[i], names[1]);
+    if (context == nullptr ||
+        std::find(expanded.begin(), expanded.end(), context) != expanded.end())
+      continue;
+    expanded.push_back(context);
     // A context declaration holds nothing but clauses, so the index pass recorded them as
     // the clauses of whatever follows; read them again here.
-    std::vector<UseClause> inner;
     const SourceBuffer& source = m_Index.source(*context);
     Lexer lexer(source.text(), context->offset);
     Token t = lexer.next();
@@ -61,9 +61,8 @@ void Design::expandUses(UnitScope& scope, const std::vector<UseClause>& uses, in
         if (!t.is('.')) break;
         t = lexer.next();
       }
-      inner.push_back(std::move(clause));
+      work.push_back(std::move(clause));
     }
-    expandUses(scope, inner, depth + 1);
   }
 }
 
@@ -82,7 +81,7 @@ UnitScope* Design::parse(const UnitRecord& record) {
     parser.parsePackage(scope->decls);
   }
   scope->indexDecls();
-  expandUses(*scope, record.uses, 0);
+  expandUses(*scope, record.uses);
   UnitScope* raw = scope.get();
   m_Scopes.emplace(&record, std::move(scope));
   return raw;

@@ -51,7 +51,7 @@ class Design {
 
  private:
   UnitScope* parse(const UnitRecord& record);
-  void expandUses(UnitScope& scope, const std::vector<UseClause>& uses, int depth);
+  void expandUses(UnitScope& scope, const std::vector<UseClause>& uses);
 
   DesignIndex& m_Index;
   Diagnostics& m_Diagnostics;
