@@ -64,6 +64,7 @@ struct TclCase {
   std::string expectedStderr;
   int expectedStatus;
   bool scriptKept;
+  bool tmpMissing;  // $TMPDIR names no directory, so no script can be created
 };
 
 std::string expectedScript(const TclCase& c) {
@@ -87,11 +88,11 @@ const std::string kLongLine = std::string(250, 'x') + " end";
 
 const TclCase kCases[] = {
     {"TwoPorts", kTwoPorts, "puts done\n", {}, "demo", "", 0, kTwoPortLists, "demo", kSuccess,
-     "", 0, false},
+     "", 0, false, false},
     {"NoPorts", kNoPorts, "puts done\n", {}, "demo", "", 0,
      "set PortName [ list  ]\nset LeftRange [ list  ]\nset RightRange [ list  ]\n"
      "set PortDir [ list  ]\nset TotalPorts 0\n",
-     "demo", kSuccess, "", 0, false},
+     "demo", kSuccess, "", 0, false, false},
     {"DirectionsAndIntegerRule", kMixed, "", {}, "demo", "", 0,
      "set PortName [ list  \"a\" \"b\" \"c\" \"d\" \"n\" ]\n"
      "set LeftRange [ list  -1 0 -1 -1 9 ]\n"
@@ -102,20 +103,24 @@ const TclCase kCases[] = {
      "pinforge:WARNING: Module top(Line 8): INTEGER RANGE is only supported for schematic "
      "symbol generation.\n" +
          std::string(kSuccess),
-     "", 0, false},
+     "", 0, false, false},
     {"TclSpecialsEscaped", kTwoPorts, "", {}, "p\"$[x]\\q", "", 0, kTwoPortLists,
-     "p\\\"\\$\\[x\\]\\\\q", kSuccess, "", 0, false},
+     "p\\\"\\$\\[x\\]\\\\q", kSuccess, "", 0, false, false},
     {"LongTemplateLineCopiedWhole", kTwoPorts, "# " + kLongLine + "\nputs [string length x]",
-     {}, "demo", "", 0, kTwoPortLists, "demo", kSuccess, "", 0, false},
+     {}, "demo", "", 0, kTwoPortLists, "demo", kSuccess, "", 0, false, false},
     {"TemplateBytesKept", kTwoPorts, std::string("a\tb\r\n\x01\xff end\n"), {}, "demo", "", 0,
-     kTwoPortLists, "demo", kSuccess, "", 0, false},
+     kTwoPortLists, "demo", kSuccess, "", 0, false, false},
     {"ShellOutputHiddenOnSuccess", kTwoPorts, "", {}, "demo", "chatter", 0, kTwoPortLists,
-     "demo", kSuccess, "", 0, false},
+     "demo", kSuccess, "", 0, false, false},
     {"FailureShowsShellOutput", kTwoPorts, "error x\n", {}, "demo", "invalid command name", 4,
-     kTwoPortLists, "demo", kInvokeFailed, "invalid command name\n", 1, true},
+     kTwoPortLists, "demo", kInvokeFailed, "invalid command name\n", 1, true, false},
     {"DebugKeepsScript", kTwoPorts, "", {"--a"}, "demo", "", 0, kTwoPortLists, "demo",
      "In0: ? std_logic;\nInBus: ? std_logic_vector (2 DOWNTO 0);\n" + std::string(kSuccess),
-     "", 0, true},
+     "", 0, true, false},
+    {"ScriptCannotBeCreated", kTwoPorts, "", {}, "demo", "", 0, "", "",
+     "Template file = \n" + std::string(kSuccess),
+     "ERROR: ProjectMgmt(pinforge) - Unable to open temporary tcl template file\n", 0, false,
+     true},
 };
 
 void PrintTo(const TclCase& c, std::ostream* os) { *os << c.name; }
@@ -143,7 +148,7 @@ TEST_P(TclDriverTest, WritesScriptAndJudgesShell) {
   const flowtest::RunResult run = flowtest::runProgram(
       flowtest::pinforgeBinary(), args, work,
       {{"PATH", bin + ":" + (path != nullptr ? path : "/usr/bin:/bin")},
-       {"TMPDIR", tmp},
+       {"TMPDIR", c.tmpMissing ? tmp + "/missing" : tmp},
        {"FAKE_CAPTURE", capture},
        {"FAKE_SAY", c.fakeSay},
        {"FAKE_STATUS", std::to_string(c.fakeStatus)}});
@@ -154,7 +159,8 @@ TEST_P(TclDriverTest, WritesScriptAndJudgesShell) {
   flowtest::expectSameText("stderr", c.expectedStderr, run.err);
   bool captured = false;
   const std::string script = flowtest::readFile(capture, &captured);
-  ASSERT_TRUE(captured) << "the stand-in runscr was not run";
+  ASSERT_EQ(captured, !c.tmpMissing) << "whether the stand-in runscr ran";
+  if (c.tmpMissing) return;
   flowtest::expectSameText("driver script", expectedScript(c), script);
 
   const std::string scriptName = flowtest::readFile(capture + ".name");
