@@ -16,16 +16,26 @@ std::optional<double> Value::toReal() const {
   return std::nullopt;
 }
 
+// The builtins store the wrapped value even on overflow; the result is written only on success.
 bool checkedAdd(int64_t a, int64_t b, int64_t& result) {
-  return !__builtin_add_overflow(a, b, &result);
+  int64_t r = 0;
+  if (__builtin_add_overflow(a, b, &r)) return false;
+  result = r;
+  return true;
 }
 
 bool checkedSub(int64_t a, int64_t b, int64_t& result) {
-  return !__builtin_sub_overflow(a, b, &result);
+  int64_t r = 0;
+  if (__builtin_sub_overflow(a, b, &r)) return false;
+  result = r;
+  return true;
 }
 
 bool checkedMul(int64_t a, int64_t b, int64_t& result) {
-  return !__builtin_mul_overflow(a, b, &result);
+  int64_t r = 0;
+  if (__builtin_mul_overflow(a, b, &r)) return false;
+  result = r;
+  return true;
 }
 
 bool checkedDiv(int64_t a, int64_t b, int64_t& result) {
