@@ -1,5 +1,5 @@
 #!/bin/sh
-# Runs every template in templates/ on the UART example and says where the results are.
+# Runs every template in templates/ on the two example designs and says where the results are.
 # Usage: sh examples/demo.sh <pinforge-binary> [output-directory]   (default: build/demo)
 set -eu
 
@@ -19,26 +19,36 @@ fi
 cd "$(dirname "$0")/.."
 out=${2:-build/demo}
 mkdir -p "$out"
+if command -v tclsh >/dev/null 2>&1; then have_tcl=yes; else have_tcl=no; fi
 
+# run <module> <template> <output> <design files...>
 run() {
-  template=$1
-  output=$2
-  if ! log=$("$pinforge" -lib work examples/uart/uart_pkg.vhd examples/uart/uart_tx.vhd \
-      -module uart_tx -prj uart_demo -template "templates/$template" -o "$out/$output"); then
+  module=$1 template=$2 output=$3
+  shift 3
+  if ! log=$("$pinforge" -lib work "$@" -module "$module" -prj pinforge_demo \
+      -template "templates/$template" -o "$out/$output"); then
     printf '%s\n' "$log" >&2
-    echo "demo: $template failed" >&2
+    echo "demo: $template on $module failed" >&2
     exit 1
   fi
   echo "  $template -> $out/$output"
 }
 
-echo "pinforge demo: entity uart_tx from examples/uart/"
-run vhdl_component.tmpl uart_tx_component.vhd
-run vhdl_instance.tmpl uart_tx_instance.vhd
-run pins.txt.tmpl uart_tx_pins.txt
-if command -v tclsh >/dev/null 2>&1; then
-  run port_table.tcl uart_tx_ports.txt
-else
-  echo "  port_table.tcl skipped: tclsh is not installed (Debian package tcl)"
-fi
+# every_template <module> <design files...>
+every_template() {
+  module=$1
+  shift
+  echo "$module ($*):"
+  run "$module" vhdl_component.tmpl "${module}_component.vhd" "$@"
+  run "$module" vhdl_instance.tmpl "${module}_instance.vhd" "$@"
+  run "$module" pins.txt.tmpl "${module}_pins.txt" "$@"
+  if [ "$have_tcl" = yes ]; then
+    run "$module" port_table.tcl "${module}_ports.txt" "$@"
+  else
+    echo "  port_table.tcl skipped: tclsh is not installed (Debian package tcl)"
+  fi
+}
+
+every_template uart_tx examples/uart/uart_pkg.vhd examples/uart/uart_tx.vhd
+every_template gpio_bank examples/gpio/gpio_bank.vhd
 echo "Outputs are in $(cd "$out" && pwd)"
