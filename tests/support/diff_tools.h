@@ -41,9 +41,11 @@ struct ToolRun {
   std::string output;  ///< standard output and standard error, interleaved
 };
 
-/// Runs `argv` (argv[0] a full path) with standard input from /dev/null. A tool that hangs is
-/// killed after `timeoutSeconds` so a broken installation cannot stall the suite.
-inline ToolRun runTool(const std::vector<std::string>& argv, unsigned timeoutSeconds = 120) {
+/// Runs `argv` (argv[0] a full path) with standard input from /dev/null, in `workDir` when
+/// one is given. A tool that hangs is killed after `timeoutSeconds` so a broken installation
+/// cannot stall the suite.
+inline ToolRun runTool(const std::vector<std::string>& argv, const std::string& workDir = "",
+                       unsigned timeoutSeconds = 120) {
   ToolRun run;
   std::vector<char*> args;
   for (const std::string& arg : argv) args.push_back(const_cast<char*>(arg.c_str()));
@@ -53,7 +55,8 @@ inline ToolRun runTool(const std::vector<std::string>& argv, unsigned timeoutSec
   const pid_t pid = fork();
   if (pid == 0) {
     const int devNull = open("/dev/null", O_RDONLY);
-    if (devNull < 0 || dup2(devNull, 0) < 0 || dup2(pipeFds[1], 1) < 0 || dup2(pipeFds[1], 2) < 0)
+    if (devNull < 0 || dup2(devNull, 0) < 0 || dup2(pipeFds[1], 1) < 0 ||
+        dup2(pipeFds[1], 2) < 0 || (!workDir.empty() && chdir(workDir.c_str()) != 0))
       _exit(127);
     alarm(timeoutSeconds);
     execv(args[0], args.data());

@@ -5,32 +5,42 @@
 #include <cstdlib>
 #include <string>
 #include <string_view>
-#include <utility>
 #include <vector>
 
 namespace difftest {
+
+struct JsonMember;
 
 struct JsonValue {
   enum Kind { Null, Bool, Number, String, Array, Object } kind = Null;
   bool boolean = false;
   double number = 0;
   std::string text;
-  std::vector<JsonValue> items;                           ///< array elements
-  std::vector<std::pair<std::string, JsonValue>> members;  ///< object members in order
+  std::vector<JsonValue> items;     ///< array elements
+  std::vector<JsonMember> members;  ///< object members in document order
 
   /// The member called `key`, or null when this is no object or has no such member.
-  const JsonValue* member(std::string_view key) const {
-    for (const auto& [name, value] : members)
-      if (name == key) return &value;
-    return nullptr;
-  }
+  const JsonValue* member(std::string_view key) const;
   /// The member `key` as an integer, or `fallback` when it is missing or not a number.
-  long long integer(std::string_view key, long long fallback) const {
-    const JsonValue* value = member(key);
-    return value != nullptr && value->kind == Number ? static_cast<long long>(value->number)
-                                                     : fallback;
-  }
+  long long integer(std::string_view key, long long fallback) const;
 };
+
+struct JsonMember {
+  std::string name;
+  JsonValue value;
+};
+
+inline const JsonValue* JsonValue::member(std::string_view key) const {
+  for (const JsonMember& each : members)
+    if (each.name == key) return &each.value;
+  return nullptr;
+}
+
+inline long long JsonValue::integer(std::string_view key, long long fallback) const {
+  const JsonValue* value = member(key);
+  return value != nullptr && value->kind == Number ? static_cast<long long>(value->number)
+                                                   : fallback;
+}
 
 class JsonReader {
  public:
@@ -168,10 +178,10 @@ class JsonReader {
       skipBlanks();
       if (m_Pos >= m_Text.size() || m_Text[m_Pos] != '"') return false;
       out.members.emplace_back();
-      if (!string(out.members.back().first)) return false;
+      if (!string(out.members.back().name)) return false;
       skipBlanks();
       if (m_Pos >= m_Text.size() || m_Text[m_Pos++] != ':') return false;
-      if (!value(out.members.back().second, depth + 1)) return false;
+      if (!value(out.members.back().value, depth + 1)) return false;
       skipBlanks();
       if (m_Pos >= m_Text.size()) return false;
       const char c = m_Text[m_Pos++];

@@ -77,7 +77,8 @@ class YosysDifferential : public ::testing::TestWithParam<std::string> {
     for (const std::string& file : fixtureFiles("verilog", {".v", ".sv"})) {
       std::string text;
       if (readFile(file, text) && isSharedFile(text) &&
-          runTool({s_Yosys, "-q", "-p", "read_verilog -sv -I" + fixtureDir() + " " + file})
+          runTool({s_Yosys, "-q", "-p", "read_verilog -sv -I" + fixtureDir() + " " + file},
+                  s_Root->path())
                   .status == 0)
         s_SharedFiles.push_back(file);
     }
@@ -100,7 +101,7 @@ class YosysDifferential : public ::testing::TestWithParam<std::string> {
     script += "\nproc\n" + commands;
     const std::string path = m_Workdir + "/" + name + ".ys";
     if (!writeFile(path, script)) return {};
-    return runTool({s_Yosys, "-q", "-s", path});
+    return runTool({s_Yosys, "-q", "-s", path}, m_Workdir);
   }
 
   bool readJson(const std::string& path, JsonValue& json) {

@@ -256,7 +256,8 @@ class GhdlDifferential : public ::testing::TestWithParam<std::string> {
   static ToolRun ghdl(std::vector<std::string> args, const std::string& workdir) {
     args.insert(args.begin() + 1, {kStd, kRelaxed, "--workdir=" + workdir, "-P" + workdir});
     args.insert(args.begin(), s_Ghdl);
-    return runTool(args);
+    // Inside the work directory: GHDL's code-generating back ends write executables there.
+    return runTool(args, workdir);
   }
 
   static bool disjoint(const std::set<std::string>& a, const std::set<std::string>& b) {
@@ -278,8 +279,9 @@ class GhdlDifferential : public ::testing::TestWithParam<std::string> {
       while (progress && !pending.empty()) {
         progress = false;
         for (auto it = pending.begin(); it != pending.end();) {
-          const ToolRun run = runTool({s_Ghdl, "-a", kStd, kRelaxed, "--workdir=" + s_Shared,
-                                       "--work=" + library, *it});
+          const ToolRun run = runTool(
+              {s_Ghdl, "-a", kStd, kRelaxed, "--workdir=" + s_Shared, "--work=" + library, *it},
+              s_Shared);
           if (run.status != 0) {
             ++it;
             continue;
@@ -517,7 +519,7 @@ TEST_P(GhdlDifferential, PortsMatchGhdl) {
   for (const ProbedEntity& probe : probes) {
     if (!probe.analysable) continue;
     const GhdlEntity& entity = *probe.entity;
-    const ToolRun run = ghdl({"-r", entity.name, kProbeArchitecture}, workdir);
+    const ToolRun run = ghdl({"--elab-run", entity.name, kProbeArchitecture}, workdir);
     if (run.status != 0) {
       std::cout << "  note: " << file << ": entity " << entity.name
                 << " left out, GHDL cannot elaborate it as top: " << firstErrorLine(run.output)
