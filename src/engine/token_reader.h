@@ -4,6 +4,7 @@
 
 #include <cstdint>
 #include <cstdio>
+#include <memory>
 #include <string>
 #include <string_view>
 
@@ -19,11 +20,23 @@ class TokenReader {
   std::string_view current() const { return m_Buffer; }
   /// 1 plus the number of newlines consumed so far.
   int32_t line() const { return m_Line; }
-  /// True once a read has met the end of the stream.
-  bool atEnd() const;
+  /// True once a read has met the end of the stream (a read that needed one more byte and
+  /// found none), as the stream's own end-of-file indicator would be.
+  bool atEnd() const { return m_AtEnd; }
 
  private:
+  /// Makes at least one unread byte available; false at the end of the stream.
+  bool fill();
+  /// Moves the unread bytes up to (not including) the next "%" or "@" into the token.
+  void takeRun();
+
+  static constexpr size_t kChunkSize = 64 * 1024;
+
   std::FILE* m_Stream;
   std::string m_Buffer;
   int32_t m_Line = 1;
+  std::unique_ptr<char[]> m_Chunk;
+  size_t m_Position = 0;
+  size_t m_Filled = 0;
+  bool m_AtEnd = false;
 };

@@ -77,4 +77,50 @@ TEST(TokenReader, LineCountsNewlinesConsumedSoFar) {
   EXPECT_EQ(reader.current(), "\nc");
 }
 
+// The grammar stated one byte at a time, as the reference for large inputs.
+std::vector<std::string> referenceTokens(const std::string& input, int& lines) {
+  std::vector<std::string> tokens;
+  lines = 1;
+  size_t i = 0;
+  for (;;) {
+    std::string token;
+    if (i == input.size()) {
+      tokens.push_back(token);
+      return tokens;
+    }
+    const bool keyword = input[i] == '%' || input[i] == '@';
+    token += input[i++];
+    while (i < input.size() && input[i] != '%' && input[i] != '@') token += input[i++];
+    const bool closed = keyword && i < input.size();
+    if (closed) token += input[i++];
+    for (char c : token) lines += c == '\n' ? 1 : 0;
+    tokens.push_back(token);
+    // A text token or an open keyword token that reached the end has met the end of input.
+    if (i == input.size() && !closed) return tokens;
+  }
+}
+
+TEST(TokenReader, LargeInputMatchesByteByByteGrammar) {
+  // Tokens of every length straddle the reader's block boundaries.
+  std::string input;
+  unsigned state = 12345;
+  while (input.size() < 300000) {
+    state = state * 1103515245u + 12345u;
+    const unsigned pick = (state >> 16) % 16;
+    if (pick == 0) input += '%';
+    else if (pick == 1) input += '@';
+    else if (pick == 2) input += '\n';
+    else if (pick == 3) input += '\0';
+    else input += static_cast<char>('a' + pick);
+  }
+  for (const std::string& text : {input, input + "%", input + "@x"}) {
+    auto file = fileWith(text);
+    TokenReader reader(file.get());
+    int lines = 0;
+    const std::vector<std::string> expected = referenceTokens(text, lines);
+    EXPECT_EQ(readAll(reader), expected);
+    EXPECT_EQ(reader.line(), lines);
+  }
+}
+
 }  // namespace
