@@ -20,6 +20,13 @@ struct Expansion {
   std::string message;
 };
 
+/// The argument that names `path` as the response file.
+std::string responseArgument(const std::string& path) {
+  std::string argument = "@";
+  argument += path;
+  return argument;
+}
+
 Expansion expand(std::vector<std::string> args) {
   std::vector<char*> argv;
   for (std::string& arg : args) argv.push_back(arg.data());
@@ -76,7 +83,8 @@ TEST(ExpandResponseFile, ResponseFileWordsAreSplitAtBlanksTabsAndNewlines) {
     SCOPED_TRACE(test.what);
     ScratchDir dir;
     ASSERT_TRUE(dir.write("args.rsp", test.content));
-    const Expansion result = expand({"pinforge", "@" + dir.file("args.rsp"), "-ignored", "x"});
+    const Expansion result =
+        expand({"pinforge", responseArgument(dir.file("args.rsp")), "-ignored", "x"});
     EXPECT_FALSE(result.failed);
     std::vector<std::string> expected = {"pinforge"};
     expected.insert(expected.end(), test.words.begin(), test.words.end());
@@ -90,7 +98,7 @@ TEST(ExpandResponseFile, UnreadableResponseFileFailsWithItsName) {
   const std::string missing = dir.file("missing.rsp");
   for (const std::string& name : {missing, std::string(), dir.path()}) {
     SCOPED_TRACE(name);
-    const Expansion result = expand({"pinforge", "@" + name});
+    const Expansion result = expand({"pinforge", responseArgument(name)});
     EXPECT_TRUE(result.failed);
     EXPECT_EQ(result.message, "FATAL ERROR: Unable to open response file " + name + "...\n");
   }
