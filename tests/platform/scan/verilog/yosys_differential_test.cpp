@@ -296,6 +296,49 @@ TEST_P(YosysDifferential, PortsMatchYosys) {
   }
 }
 
+// The harness itself: a wrong reading of Yosys' answers would hide real mismatches.
+TEST(MiniJson, KeepsMemberOrderAndDecodesStrings) {
+  JsonValue json;
+  ASSERT_TRUE(JsonReader(R"( {"z": {"offset": -3, "upto": 1}, "a": [1, "x\"y\u0041\n", true, null],
+                             "m": {}} )")
+                  .parse(json));
+  ASSERT_EQ(json.members.size(), 3u);
+  EXPECT_EQ(json.members[0].name, "z");
+  EXPECT_EQ(json.members[1].name, "a");
+  EXPECT_EQ(json.member("z")->integer("offset", 0), -3);
+  EXPECT_EQ(json.member("z")->integer("missing", 7), 7);
+  const JsonValue* array = json.member("a");
+  ASSERT_TRUE(array != nullptr && array->items.size() == 4u);
+  EXPECT_EQ(array->items[1].text, "x\"yA\n");
+  EXPECT_TRUE(array->items[2].kind == JsonValue::Bool && array->items[2].boolean);
+  EXPECT_EQ(array->items[3].kind, JsonValue::Null);
+  EXPECT_TRUE(json.member("m")->members.empty());
+  EXPECT_EQ(json.member("nope"), nullptr);
+}
+
+TEST(MiniJson, RejectsMalformedDocuments) {
+  for (const char* text : {"", "{\"a\":}", "[1, 2", "{\"a\": 1} x", "\"open", "tru", "{a: 1}",
+                           "[1,]", "-"}) {
+    JsonValue json;
+    EXPECT_FALSE(JsonReader(text).parse(json)) << text;
+  }
+}
+
+TEST(YosysSourceSpans, AcceptLinesInsideAnySpan) {
+  struct Case {
+    const char* src;
+    int line;
+    bool inside;
+  } const cases[] = {
+      {"m.v:13.15-13.16", 13, true},
+      {"m.v:13.15-13.16", 12, false},
+      {"m.v:3.1-5.2", 4, true},
+      {"m.v:3.1-3.9|m.v:8.2-8.9", 8, true},
+      {"m.v:3.1-3.9|m.v:8.2-8.9", 5, false},
+  };
+  for (const Case& c : cases) EXPECT_EQ(lineInSource(c.src, c.line), c.inside) << c.src;
+}
+
 std::string testName(const ::testing::TestParamInfo<std::string>& info) {
   return fixtureTestName(info.param);
 }

@@ -539,6 +539,91 @@ TEST_P(GhdlDifferential, PortsMatchGhdl) {
   if (compared == 0) GTEST_SKIP() << "GHDL elaborates no entity of " << file;
 }
 
+// The harness itself: a wrong reading of GHDL's answers would hide real mismatches.
+TEST(GhdlDumpReader, ReadsEntityHeadersOfTheNamedFileOnly) {
+  const std::string xml = R"(<?xml version="1.0"?>
+<root>
+ <library_unit kind="entity_declaration" file="/x/a.vhd" line="2" identifier="top">
+  <generic_chain>
+   <el kind="interface_constant_declaration" identifier="w"><default_value kind="lit"/></el>
+   <el kind="interface_constant_declaration" identifier="n"></el>
+  </generic_chain>
+  <port_chain>
+   <el line="4" identifier="a" mode="in" has_identifier_list="true">
+    <subtype_indication kind="array_subtype_definition">
+     <subtype_type_mark kind="simple_name" identifier="std_logic_vector"/>
+    </subtype_indication>
+   </el>
+   <el line="5" identifier="b" mode="in" has_identifier_list="false">
+    <subtype_indication ref="7"/>
+   </el>
+   <el line="6" identifier="\x&#x26;y\" mode="buffer" has_identifier_list="false">
+    <subtype_indication kind="selected_name" identifier="word_t">
+     <prefix kind="simple_name" identifier="pkg"/>
+    </subtype_indication>
+   </el>
+  </port_chain>
+ </library_unit>
+ <library_unit kind="entity_declaration" file="/x/other.vhd" identifier="elsewhere"/>
+</root>
+)";
+  std::vector<GhdlEntity> entities;
+  ASSERT_TRUE(readGhdlEntities(xml, "/x/a.vhd", entities));
+  ASSERT_EQ(entities.size(), 1u);
+  EXPECT_EQ(entities[0].name, "top");
+  EXPECT_EQ(entities[0].genericsWithoutDefault, std::vector<std::string>{"n"});
+  struct Expected {
+    const char* name;
+    const char* mode;
+    int line;
+    int firstLine;
+    const char* typeMark;
+    bool constrained;
+  };
+  const Expected expected[] = {
+      {"a", "in", 4, 4, "std_logic_vector", true},
+      {"b", "in", 5, 4, "std_logic_vector", true},
+      {"\\x&y\\", "buffer", 6, 6, "word_t", false},
+  };
+  ASSERT_EQ(entities[0].ports.size(), std::size(expected));
+  for (size_t i = 0; i < std::size(expected); ++i) {
+    const GhdlPort& port = entities[0].ports[i];
+    EXPECT_EQ(port.name, expected[i].name);
+    EXPECT_EQ(port.mode, expected[i].mode) << port.name;
+    EXPECT_EQ(port.line, expected[i].line) << port.name;
+    EXPECT_EQ(port.firstLineOfList, expected[i].firstLine) << port.name;
+    EXPECT_EQ(port.typeMark, expected[i].typeMark) << port.name;
+    EXPECT_EQ(port.constrained, expected[i].constrained) << port.name;
+  }
+}
+
+TEST(GhdlDumpReader, RejectsTruncatedDumps) {
+  for (const char* xml : {"<root><el identifier=\"a\">", "<root a=\"1></root>", "</root>"}) {
+    std::vector<GhdlEntity> entities;
+    EXPECT_FALSE(readGhdlEntities(xml, "/x/a.vhd", entities)) << xml;
+  }
+}
+
+TEST(GhdlProbeReports, ReadsEveryKindOfLine) {
+  const std::string output =
+      "p.vhd:5:5:@0ms:(report note): P|0|A|15|8|false\n"
+      "p.vhd:6:5:@0ms:(report note): P|1|S|100|-4\n"
+      "p.vhd:7:5:@0ms:(report note): P|2|S|'U'|'-'\n"
+      "p.vhd:8:5:@0ms:(report note): P|3|E|2|true\n"
+      "p.vhd:9:5:@0ms:(report note): P|4|N\n"
+      "p.vhd:9:5:@0ms:(report note): P|9|A|1|2|true\n";
+  const std::vector<GhdlBounds> bounds = parseReports(output, 6);
+  EXPECT_TRUE(bounds[0].kind == ProbeKind::Array && bounds[0].left == "15" &&
+              bounds[0].right == "8" && !bounds[0].ascending);
+  EXPECT_TRUE(bounds[1].kind == ProbeKind::Scalar && bounds[1].left == "100" &&
+              bounds[1].right == "-4" && !bounds[1].ascending);
+  EXPECT_TRUE(bounds[2].kind == ProbeKind::Scalar && bounds[2].left == "'U'");
+  EXPECT_TRUE(bounds[3].kind == ProbeKind::Positional && bounds[3].length == 2 &&
+              bounds[3].ascending);
+  EXPECT_TRUE(bounds[4].reported && bounds[4].kind == ProbeKind::Opaque);
+  EXPECT_FALSE(bounds[5].reported);  // index 9 is beyond the entity's ports
+}
+
 std::string testName(const ::testing::TestParamInfo<std::string>& info) {
   return fixtureTestName(info.param);
 }
