@@ -92,6 +92,19 @@ const char* wordName(Word word) {
   }
 }
 
+// Bodies are read in coarse mode; the unit headers and the top level are not.
+class CoarseScope {
+ public:
+  explicit CoarseScope(Preprocessor& pre) : m_Pre(pre), m_Was(pre.coarse()) {
+    pre.setCoarse(true);
+  }
+  ~CoarseScope() { m_Pre.setCoarse(m_Was); }
+
+ private:
+  Preprocessor& m_Pre;
+  bool m_Was;
+};
+
 bool startsNewUnit(Word word) {
   return word == Word::Module || word == Word::Macromodule || word == Word::Package;
 }
@@ -128,6 +141,7 @@ void IndexWalk::skipLabel() {
 }
 
 bool IndexWalk::skipBlock(Word open, const Token& start) {
+  CoarseScope coarse(m_Pre);
   Word close = closingWord(open);
   size_t depth = 1;
   Token token;
@@ -194,6 +208,7 @@ void IndexWalk::unit(UnitKind kind, Word end, const Token& keyword) {
 }
 
 bool IndexWalk::body(size_t unit, Word end) {
+  CoarseScope coarse(m_Pre);
   bool statementStart = false;
   bool afterDpi = false;
   Word previous = Word::None;

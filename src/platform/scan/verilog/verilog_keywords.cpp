@@ -64,6 +64,7 @@ constexpr Entry kEntries[] = {
     {"global", Word::Global},
     {"genvar", Word::Genvar},
     {"endtask", Word::Endtask},
+    {"modport", Word::Modport},
     {"program", Word::Program},
     {"package", Word::Package},
     {"checker", Word::Checker},

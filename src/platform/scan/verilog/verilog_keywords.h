@@ -22,7 +22,7 @@ enum class Word : uint8_t {
   RealType,      ///< real, shortreal, realtime, string, chandle, event
   OtherEnd,      ///< end, endcase, endgenerate, join, ... (a statement may follow)
   Begin, If, Else, For, While, Repeat, Return, Case, Endcase, Struct, Union, Enum, Packed,
-  Genvar,
+  Genvar, Modport,
 };
 
 Word classify(std::string_view word);

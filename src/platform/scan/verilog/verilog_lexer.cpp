@@ -30,13 +30,39 @@ constexpr std::array<uint8_t, 256> kClass = makeClasses();
 
 inline uint8_t cls(char c) { return kClass[static_cast<unsigned char>(c)]; }
 
-// Longest operators first within each length so max munch is a prefix test.
-constexpr std::string_view kOperators[] = {
-    "<<<=", ">>>=", "<<<", ">>>", "===", "!==", "==?", "!=?", "<<=", ">>=", "|->", "|=>",
-    "<->",  "->>",  "**",  "<<",  ">>",  "<=",  ">=",  "==",  "!=",  "&&",  "||",  "::",
-    "->",   "~&",   "~|",  "~^",  "^~",  "+:",  "-:",  "++",  "--",  "+=",  "-=",  "*=",
-    "/=",   "%=",   "&=",  "|=",  "^=",  "'{",  "##",  ":=",  ":/",  ".*",
-};
+// Length of the operator at p (max munch); p[0..3] are readable thanks to the sentinel.
+size_t operatorLength(const char* p) {
+  char b = p[1], c = b ? p[2] : '\0';
+  switch (p[0]) {
+    case '.': return b == '*' ? 2 : 1;
+    case '<':
+      if (b == '<') return c == '<' ? (p[3] == '=' ? 4 : 3) : c == '=' ? 3 : 2;
+      if (b == '-' && c == '>') return 3;
+      return b == '=' ? 2 : 1;
+    case '>':
+      if (b == '>') return c == '>' ? (p[3] == '=' ? 4 : 3) : c == '=' ? 3 : 2;
+      return b == '=' ? 2 : 1;
+    case '=':
+    case '!':
+      if (b == '=') return c == '=' || c == '?' ? 3 : 2;
+      return 1;
+    case '*': return b == '*' || b == '=' ? 2 : 1;
+    case '&': return b == '&' || b == '=' ? 2 : 1;
+    case '|':
+      if ((b == '-' || b == '=') && c == '>') return 3;
+      return b == '|' || b == '=' ? 2 : 1;
+    case '~': return b == '&' || b == '|' || b == '^' ? 2 : 1;
+    case '^': return b == '~' || b == '=' ? 2 : 1;
+    case ':': return b == ':' || b == '=' || b == '/' ? 2 : 1;
+    case '+': return b == ':' || b == '+' || b == '=' ? 2 : 1;
+    case '-':
+      if (b == '>' && c == '>') return 3;
+      return b == ':' || b == '-' || b == '=' || b == '>' ? 2 : 1;
+    case '/':
+    case '%': return b == '=' ? 2 : 1;
+    default: return 1;
+  }
+}
 
 inline bool isBaseLetter(char c) {
   switch (c) {
@@ -135,8 +161,43 @@ const char* Lexer::lexNumber(const char* p) {
   return p;
 }
 
+const char* Lexer::skipIrrelevant(const char* p) {
+  for (;;) {
+    p = skipBlanks(p);
+    char c = *p;
+    uint8_t k = cls(c);
+    if (k & kIdStart) {
+      const char* q = p + 1;
+      while (cls(*q) & kIdChar) ++q;
+      size_t length = static_cast<size_t>(q - p);
+      if (c >= 'a' && c <= 'w' && length >= 2 && length <= 12) return p;  // maybe a keyword
+      p = q;
+      continue;
+    }
+    if (k & kDigit) {
+      p = lexNumber(p);
+      continue;
+    }
+    switch (c) {
+      case '\\':
+      case '$':
+        if (p + 1 >= m_End || (cls(p[1]) & kSpace)) return p;
+        ++p;
+        while (p < m_End && !(cls(*p) & kSpace) && (c == '\\' || (cls(*p) & kIdChar))) ++p;
+        continue;
+      case '(': case ')': case ',': case '.': case '[': case ']': case '{': case '}': case '=':
+      case '#': case '+': case '-': case '*': case '&': case '|': case '~': case '^': case '!':
+      case '<': case '>': case '?': case '%':
+        ++p;
+        continue;
+      default:
+        return p;
+    }
+  }
+}
+
 void Lexer::next(Token& token) {
-  const char* p = skipBlanks(m_Pos);
+  const char* p = m_Coarse ? skipIrrelevant(m_Pos) : skipBlanks(m_Pos);
   token.source = m_File;
   token.offset = offsetOf(p);
   if (p >= m_End) {
@@ -157,7 +218,7 @@ void Lexer::next(Token& token) {
   } else {
     switch (c) {
       case '(': case ')': case ',': case ';': case '[': case ']': case '{': case '}':
-      case '#': case '@':
+      case '@':
         token.kind = TokenKind::Symbol;
         ++p;
         break;
@@ -208,18 +269,14 @@ void Lexer::next(Token& token) {
         }
         break;
       }
-      default: {
+      case '#':
         token.kind = TokenKind::Symbol;
-        std::string_view rest(p, static_cast<size_t>(m_End - p));
-        size_t length = 1;
-        for (std::string_view op : kOperators)
-          if (rest.substr(0, op.size()) == op) {
-            length = op.size();
-            break;
-          }
-        p += length;
+        p += p[1] == '#' ? 2 : 1;
         break;
-      }
+      default:
+        token.kind = TokenKind::Symbol;
+        p += operatorLength(p);
+        break;
     }
   }
   token.text = std::string_view(start, static_cast<size_t>(p - start));

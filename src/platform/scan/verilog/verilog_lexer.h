@@ -23,6 +23,11 @@ class Lexer {
   /// The next token; kind End at the end of the text.
   void next(Token& token);
 
+  /// In coarse mode the lexer passes over punctuation, numbers, system names, escaped
+  /// identifiers and identifiers that cannot be keywords without returning them: enough for
+  /// the index pass, which only looks for keywords, `;`, `:`, `@`, strings and directives.
+  void setCoarse(bool coarse) { m_Coarse = coarse; }
+
   /// Raw access for directives: the current position and the end of the text.
   const char* position() const { return m_Pos; }
   const char* end() const { return m_End; }
@@ -37,6 +42,7 @@ class Lexer {
  private:
   void error(const char* at, std::string_view text);
   const char* skipBlanks(const char* p);
+  const char* skipIrrelevant(const char* p);
   const char* lexNumber(const char* p);
   const char* lexBasedDigits(const char* p);
 
@@ -46,6 +52,7 @@ class Lexer {
   const SourceBuffer* m_File;
   size_t m_Fixed;
   Diagnostics* m_Diagnostics;
+  bool m_Coarse = false;
 };
 
 /// Character classes shared by the lexer and the preprocessor.

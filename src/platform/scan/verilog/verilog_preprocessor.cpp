@@ -39,6 +39,14 @@ bool isConditional(std::string_view name) {
          name == "endif";
 }
 
+// "`name" followed by `tail`, built step by step (GCC 12 misreads the chained form).
+std::string directiveText(std::string_view name, std::string_view tail) {
+  std::string text = "`";
+  text.append(name);
+  text.append(tail);
+  return text;
+}
+
 std::string_view trim(std::string_view s) {
   while (!s.empty() && isBlank(s.front())) s.remove_prefix(1);
   while (!s.empty() && isBlank(s.back())) s.remove_suffix(1);
@@ -60,7 +68,13 @@ void Preprocessor::start(const SourceBuffer& file, size_t offset, size_t openCon
   Frame frame{Lexer(begin, file.end(), &file, Lexer::npos, m_Diagnostics), &file,
                openConditionals, nullptr, nullptr};
   frame.lexer.setPosition(begin + std::min(offset, file.text().size()));
+  frame.lexer.setCoarse(m_Coarse);
   m_Frames.push_back(std::move(frame));
+}
+
+void Preprocessor::setCoarse(bool coarse) {
+  m_Coarse = coarse;
+  for (Frame& frame : m_Frames) frame.lexer.setCoarse(coarse);
 }
 
 void Preprocessor::error(const Token& at, std::string_view text) {
@@ -104,7 +118,7 @@ void Preprocessor::popFrame() {
   m_Frames.pop_back();
 }
 
-void Preprocessor::releaseFinishedText() {
+void Preprocessor::releaseAll() {
   m_FinishedText.clear();
   m_FinishedMacros.clear();
 }
@@ -202,13 +216,13 @@ void Preprocessor::conditional(const Token& token) {
     m_Conditionals.push_back(open);
   } else if (m_Conditionals.size() <= base) {
     if (name == "elsif") readName();
-    error(token, "`" + std::string(name) + " without a matching `ifdef");
+    error(token, directiveText(name, " without a matching `ifdef"));
     return;
   } else if (name == "endif") {
     m_Conditionals.pop_back();
   } else {
     Conditional& open = m_Conditionals.back();
-    if (open.sawElse) error(token, "`" + std::string(name) + " after `else");
+    if (open.sawElse) error(token, directiveText(name, " after `else"));
     if (name == "elsif") {
       std::string_view macro = readName();
       if (macro.empty()) error(token, "expected a macro name after `elsif");
@@ -353,6 +367,7 @@ void Preprocessor::include(const Token& token) {
   }
   m_Frames.push_back(Frame{Lexer(file->begin(), file->end(), file, Lexer::npos, m_Diagnostics),
                            file, m_Conditionals.size(), nullptr, nullptr});
+  m_Frames.back().lexer.setCoarse(m_Coarse);
 }
 
 void Preprocessor::skipProtected(const Token& token, std::string_view endMarker) {
@@ -375,6 +390,7 @@ void Preprocessor::pushText(const Token& at, std::string text,
   const char* end = begin + owned->size();
   m_Frames.push_back(Frame{Lexer(begin, end, at.source, at.offset, m_Diagnostics), nullptr, 0,
                            std::move(macro), std::move(owned)});
+  m_Frames.back().lexer.setCoarse(m_Coarse);
 }
 
 bool Preprocessor::collectArguments(const Token& at, const Macro& macro,
@@ -489,6 +505,7 @@ void Preprocessor::expand(const Token& token) {
     m_Expansions = 0;
     m_ExpansionBytes = 0;
     m_BudgetReported = false;
+    m_OutermostMacro = macro->name;
   }
   if (m_Frames.size() >= kMaxFrames) {
     if (!m_BudgetReported)
@@ -499,13 +516,14 @@ void Preprocessor::expand(const Token& token) {
   std::vector<std::string> args;
   if (macro->functionLike && !collectArguments(token, *macro, args)) return;
   if (++m_Expansions > kMaxExpansions || m_ExpansionBytes > kMaxExpansionBytes) {
-    if (!m_BudgetReported) error(token, "expansion of macro `" + macro->name + " is too large");
+    if (!m_BudgetReported) error(token, "expansion of macro `" + m_OutermostMacro + " is too large");
     m_BudgetReported = true;
     return;
   }
   if (!macro->functionLike && !macro->needsRewrite) {
     const char* begin = macro->body.data();
     Lexer lexer(begin, begin + macro->body.size(), token.source, token.offset, m_Diagnostics);
+    lexer.setCoarse(m_Coarse);
     m_Frames.push_back(Frame{lexer, nullptr, 0, std::move(macro), nullptr});
     return;
   }

@@ -31,11 +31,17 @@ class Preprocessor {
   /// The next token of active text; false at the end of the started file.
   bool next(Token& token);
 
+  /// Switches every lexer, present and future, to coarse mode or back (see Lexer).
+  void setCoarse(bool coarse);
+  bool coarse() const { return m_Coarse; }
+
   /// Conditional branches open at the current position.
   size_t openConditionals() const { return m_Conditionals.size(); }
 
   /// Frees the text of finished expansions. Tokens handed out before become invalid.
-  void releaseFinishedText();
+  void releaseFinishedText() {
+    if (!m_FinishedText.empty() || !m_FinishedMacros.empty()) releaseAll();
+  }
 
  private:
   struct Conditional {
@@ -56,6 +62,7 @@ class Preprocessor {
   };
 
   void error(const Token& at, std::string_view text);
+  void releaseAll();
   void popFrame();
   void updateSkipping();
   void directive(const Token& token);
@@ -81,9 +88,11 @@ class Preprocessor {
   std::vector<Frame> m_Frames;
   std::vector<Conditional> m_Conditionals;
   bool m_Skipping = false;
+  bool m_Coarse = false;
   size_t m_Expansions = 0;
   size_t m_ExpansionBytes = 0;
   bool m_BudgetReported = false;
+  std::string m_OutermostMacro;
   std::vector<std::unique_ptr<std::string>> m_FinishedText;
   std::vector<std::shared_ptr<const Macro>> m_FinishedMacros;
 };
