@@ -14,11 +14,6 @@ namespace {
 // Evaluation recursion (nested expressions, constants defined by other constants).
 constexpr int kMaxDepth = 400;
 
-std::string quoted(std::string_view text) {
-  if (text.size() > 60) return "'" + std::string(text.substr(0, 57)) + "...'";
-  return "'" + std::string(text) + "'";
-}
-
 bool isTypeDecl(DeclKind k) {
   return k == DeclKind::Subtype || k == DeclKind::ArrayType || k == DeclKind::RangeType ||
          k == DeclKind::EnumType || k == DeclKind::RecordType || k == DeclKind::OtherType;

@@ -12,11 +12,6 @@ namespace {
 // Subtypes defined by other subtypes; a cycle stops here.
 constexpr int kMaxTypeChain = 32;
 
-std::string quoted(std::string_view text) {
-  if (text.size() > 60) return "'" + std::string(text.substr(0, 57)) + "...'";
-  return "'" + std::string(text) + "'";
-}
-
 std::string markText(const std::vector<std::string_view>& mark) {
   std::string out;
   for (std::string_view part : mark) {

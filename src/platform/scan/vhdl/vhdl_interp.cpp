@@ -9,8 +9,6 @@ namespace {
 
 constexpr int kMaxCalls = 64;
 
-std::string quoted(std::string_view text) { return "'" + std::string(text) + "'"; }
-
 }  // namespace
 
 bool Evaluator::callFunction(UnitScope* unit, Decl& decl, const std::vector<Value>& args,

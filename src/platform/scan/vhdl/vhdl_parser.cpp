@@ -27,6 +27,17 @@ std::string normalizeName(std::string_view name) {
   return out;
 }
 
+std::string quoted(std::string_view text) {
+  constexpr size_t kLongest = 60;
+  std::string out;
+  out.reserve(std::min(text.size(), kLongest) + 5);
+  out += '\'';
+  out.append(text.substr(0, text.size() > kLongest ? kLongest - 3 : kLongest));
+  if (text.size() > kLongest) out += "...";
+  out += '\'';
+  return out;
+}
+
 Parser::Parser(const SourceBuffer& source, size_t offset, ExprArena& arena,
                Diagnostics& diagnostics)
     : m_Source(source), m_Lexer(source.text(), offset), m_Arena(arena),

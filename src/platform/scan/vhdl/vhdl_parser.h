@@ -19,6 +19,8 @@ namespace scan::vhdl {
 /// Normalized lookup key of an identifier: basic identifiers in lowercase, extended ones as
 /// written.
 std::string normalizeName(std::string_view name);
+/// `text` in single quotes for a message, shortened when long.
+std::string quoted(std::string_view text);
 
 class Parser {
  public:

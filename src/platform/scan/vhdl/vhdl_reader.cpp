@@ -38,11 +38,12 @@ class LineCounter {
   size_t m_Line = 1;
 };
 
-std::string shortened(std::string_view text) {
+// An expression as one line of a message.
+std::string oneLine(std::string_view text) {
   std::string out;
-  for (char c : text.substr(0, 80)) out.push_back(c == '\n' || c == '\r' || c == '\t' ? ' ' : c);
-  if (text.size() > 80) out += "...";
-  return out;
+  for (char c : text.substr(0, 200)) out.push_back(c == '\n' || c == '\r' || c == '\t' ? ' ' : c);
+  if (text.size() > 200) out += "...";
+  return quoted(out);
 }
 
 }  // namespace
@@ -98,9 +99,9 @@ std::vector<ScanPort> VhdlReader::readPorts() {
                               "port '" + name + "' has an unconstrained type; no range reported");
         break;
       case Evaluator::Shape::Failed: {
-        std::string what = failed ? "'" + shortened(source.text().substr(
-                                              failed->begin, failed->end - failed->begin)) + "'"
-                                  : "its range";
+        std::string what =
+            failed ? oneLine(source.text().substr(failed->begin, failed->end - failed->begin))
+                   : std::string("its range");
         m_Diagnostics.warning(source, decl.offset,
                               "port '" + name + "': cannot evaluate " + what + " (" +
                                   m_Evaluator.reason() + "); no range reported");
