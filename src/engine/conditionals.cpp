@@ -8,7 +8,7 @@
 
 namespace {
 
-int lowerAscii(unsigned char c) { return (c >= 'A' && c <= 'Z') ? c + ('a' - 'A') : c; }
+int lowerAscii(int c) { return (c >= 'A' && c <= 'Z') ? c + ('a' - 'A') : c; }
 
 // Byte-wise three-way comparison, optionally folding ASCII letters to lower case.
 int compareBytes(std::string_view a, std::string_view b, bool foldCase) {
@@ -17,8 +17,8 @@ int compareBytes(std::string_view a, std::string_view b, bool foldCase) {
     int x = static_cast<unsigned char>(a[i]);
     int y = static_cast<unsigned char>(b[i]);
     if (foldCase) {
-      x = lowerAscii(static_cast<unsigned char>(x));
-      y = lowerAscii(static_cast<unsigned char>(y));
+      x = lowerAscii(x);
+      y = lowerAscii(y);
     }
     if (x != y) return x - y;
   }
