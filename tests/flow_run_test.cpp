@@ -72,6 +72,27 @@ TEST_P(TraceFileTest, CreatedOnlyWhenDebugging) {
   }
 }
 
+TEST(ScriptShell, FoundBesideTheExecutableWhenNotOnPath) {
+  const std::string tclDir = flowtest::directoryOnPath("tclsh");
+  if (tclDir.empty()) GTEST_SKIP() << "tclsh is not installed";
+  if (flowtest::exists(tclDir + "/runscr")) GTEST_SKIP() << "a runscr is installed beside tclsh";
+  flowtest::TempDir work;
+  ASSERT_FALSE(work.path().empty());
+  ASSERT_TRUE(flowtest::writeFile(work.file("design.vhd"), kDesign));
+  ASSERT_TRUE(flowtest::writeFile(work.file("t.tcl"),
+                                  "set f [open $OutputFileName w]\n"
+                                  "puts $f \"$ModuleName $TotalPorts $PortName\"\n"
+                                  "close $f\n"));
+  const flowtest::RunResult run = flowtest::runProgram(
+      flowtest::pinforgeBinary(),
+      {"-lib", "work", "design.vhd", "-module", "top", "-prj", "demo", "-template", "t.tcl",
+       "-o", "out.txt"},
+      work.path(), {{"PATH", tclDir}});
+  ASSERT_TRUE(run.started);
+  EXPECT_EQ(run.status, 0) << run.out << run.err;
+  EXPECT_EQ(flowtest::readFile(work.file("out.txt")), "top 2 clk q\n");
+}
+
 INSTANTIATE_TEST_SUITE_P(Cases, TraceFileTest, testing::ValuesIn(kCases),
                          [](const testing::TestParamInfo<TraceCase>& info) {
                            return std::string(info.param.name);

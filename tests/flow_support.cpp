@@ -163,15 +163,17 @@ std::string sourceDir() {
   return value != nullptr ? value : "";
 }
 
-bool onPath(std::string_view program) {
+std::string directoryOnPath(std::string_view program) {
   const char* path = std::getenv("PATH");
-  if (path == nullptr) return false;
+  if (path == nullptr) return "";
   std::stringstream dirs{std::string(path)};
   std::string dir;
   while (std::getline(dirs, dir, ':'))
-    if (access((dir + "/" + std::string(program)).c_str(), X_OK) == 0) return true;
-  return false;
+    if (!dir.empty() && access((dir + "/" + std::string(program)).c_str(), X_OK) == 0) return dir;
+  return "";
 }
+
+bool onPath(std::string_view program) { return !directoryOnPath(program).empty(); }
 
 std::string describeDifference(std::string_view what, std::string_view expected,
                                std::string_view actual) {

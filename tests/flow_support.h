@@ -51,6 +51,8 @@ bool exists(const std::string& path);
 std::string pinforgeBinary();
 std::string sourceDir();
 
+/// The directory on PATH that holds an executable of that name; empty when none does.
+std::string directoryOnPath(std::string_view program);
 /// True when an executable of that name is on PATH.
 bool onPath(std::string_view program);
 
