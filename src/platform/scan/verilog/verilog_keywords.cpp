@@ -129,15 +129,29 @@ constexpr std::array<std::pair<size_t, size_t>, kMaxLength + 1> makeRanges() {
 
 constexpr auto kRanges = makeRanges();
 
+// Which (first, second) letter pairs start some keyword: most identifiers fail this test.
+constexpr std::array<bool, 26 * 26> makePairs() {
+  std::array<bool, 26 * 26> pairs{};
+  for (const Entry& entry : kEntries)
+    pairs[static_cast<size_t>((entry.text[0] - 'a') * 26 + (entry.text[1] - 'a'))] = true;
+  return pairs;
+}
+
+constexpr auto kPairs = makePairs();
+
 }  // namespace
 
 Word classify(std::string_view word) {
   if (word.size() < 2 || word.size() > kMaxLength) return Word::None;
   char first = word.front();
-  if (first < 'a' || first > 'w') return Word::None;
+  char second = word[1];
+  if (first < 'a' || first > 'w' || second < 'a' || second > 'z') return Word::None;
+  if (!kPairs[static_cast<size_t>((first - 'a') * 26 + (second - 'a'))]) return Word::None;
   auto [begin, end] = kRanges[word.size()];
-  for (size_t i = begin; i < end; ++i)
-    if (kEntries[i].text == word) return kEntries[i].word;
+  for (size_t i = begin; i < end; ++i) {
+    std::string_view text = kEntries[i].text;
+    if (text[0] == first && text[1] == second && text == word) return kEntries[i].word;
+  }
   return Word::None;
 }
 

@@ -6,15 +6,17 @@
 #include <cstring>
 
 #include "platform/scan/common/diagnostics.h"
+#include "platform/scan/verilog/verilog_keywords.h"
 
 namespace scan::verilog {
 namespace {
 
-enum : uint8_t { kSpace = 1, kIdStart = 2, kIdChar = 4, kDigit = 8, kBasedDigit = 16 };
+enum : uint8_t { kSpace = 1, kIdStart = 2, kIdChar = 4, kDigit = 8, kBasedDigit = 16, kEnd = 32 };
 
 constexpr std::array<uint8_t, 256> makeClasses() {
   std::array<uint8_t, 256> t{};
   for (int c : {' ', '\t', '\n', '\r', '\v', '\f'}) t[c] = kSpace;
+  t[0] = kEnd;
   for (int c = 'a'; c <= 'z'; ++c) t[c] = kIdStart | kIdChar;
   for (int c = 'A'; c <= 'Z'; ++c) t[c] = kIdStart | kIdChar;
   t['_'] = kIdStart | kIdChar | kBasedDigit;
@@ -163,14 +165,16 @@ const char* Lexer::lexNumber(const char* p) {
 
 const char* Lexer::skipIrrelevant(const char* p) {
   for (;;) {
-    p = skipBlanks(p);
     char c = *p;
     uint8_t k = cls(c);
+    if (k & kSpace) {
+      ++p;
+      continue;
+    }
     if (k & kIdStart) {
       const char* q = p + 1;
       while (cls(*q) & kIdChar) ++q;
-      size_t length = static_cast<size_t>(q - p);
-      if (c >= 'a' && c <= 'w' && length >= 2 && length <= 12) return p;  // maybe a keyword
+      if (classify(std::string_view(p, static_cast<size_t>(q - p))) != Word::None) return p;
       p = q;
       continue;
     }
@@ -180,12 +184,28 @@ const char* Lexer::skipIrrelevant(const char* p) {
     }
     switch (c) {
       case '\\':
-      case '$':
         if (p + 1 >= m_End || (cls(p[1]) & kSpace)) return p;
         ++p;
-        while (p < m_End && !(cls(*p) & kSpace) && (c == '\\' || (cls(*p) & kIdChar))) ++p;
+        while (!(cls(*p) & (kSpace | kEnd))) ++p;
+        if (*p == '\0' && p < m_End) ++p;
         continue;
-      case '(': case ')': case ',': case '.': case '[': case ']': case '{': case '}': case '=':
+      case '$':
+        if (!(cls(p[1]) & kIdChar)) return p;
+        ++p;
+        while (cls(*p) & kIdChar) ++p;
+        continue;
+      case '/':
+        if (p[1] != '/' && p[1] != '*') return p;
+        p = skipBlanks(p);
+        continue;
+      case '(':
+        if (p[1] == '*' && p[2] != ')') {
+          p = skipBlanks(p);
+          continue;
+        }
+        ++p;
+        continue;
+      case ')': case ',': case '.': case '[': case ']': case '{': case '}': case '=':
       case '#': case '+': case '-': case '*': case '&': case '|': case '~': case '^': case '!':
       case '<': case '>': case '?': case '%':
         ++p;
