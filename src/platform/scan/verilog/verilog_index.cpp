@@ -137,7 +137,11 @@ void IndexWalk::skipLabel() {
     unread(token);
     return;
   }
+  // The label itself is no keyword, so coarse lexing would pass over it.
+  bool coarse = m_Pre.coarse();
+  m_Pre.setCoarse(false);
   if (read(token) && token.kind != TokenKind::Identifier) unread(token);
+  m_Pre.setCoarse(coarse);
 }
 
 bool IndexWalk::skipBlock(Word open, const Token& start) {
