@@ -64,8 +64,12 @@ class Sweep {
     if (!m_ErrorInUnit) m_Diagnostics.error(m_Source, at.offset, text);
     m_ErrorInUnit = true;
   }
-  // `a.b.c {, a.b.c} ;` into the pending clauses; returns the token after the clause.
+  // `a.b.c {, a.b.c} ;` into the pending clauses; returns the semicolon.
   Token readUseList(bool context);
+  // `entity name is`, `package [body] name is [new]`, `architecture a of e is`...: registers
+  // the unit and returns the first token after its header.
+  template <typename OnUnit>
+  Token readUnitHeader(Token keyword, UnitKind kind, OnUnit& onUnit);
 
   const SourceBuffer& m_Source;
   Lexer m_Lexer;
@@ -99,90 +103,94 @@ Token Sweep::readUseList(bool context) {
 
 template <typename OnUnit>
 void Sweep::run(OnUnit onUnit) {
-  bool atStart = true;
-  Token t = next();
-  while (t.kind != TokenKind::End) {
-    if (t.kind != TokenKind::Identifier) {
-      atStart = t.is(';');
-      t = next();
+  for (;;) {
+    Token t = m_Lexer.nextAtStatementStart();
+    if (t.kind == TokenKind::End) return;
+    if (t.kind == TokenKind::Invalid) {
+      if (!m_ErrorInUnit) m_Diagnostics.error(m_Source, t.offset, t.error);
+      m_ErrorInUnit = true;
       continue;
     }
     std::string_view w = t.text;
-    if (w.size() == 3 && equalsWord(w, "end")) {
+    if (t.kind != TokenKind::Identifier || w.size() < 3 || w.size() > 13) continue;
+    if (equalsWord(w, "end")) {
       m_Pending.clear();
-      atStart = false;
-      t = next();
       continue;
     }
-    if (!atStart || w.size() < 3 || w.size() > 13) {
-      atStart = false;
-      t = next();
-      continue;
-    }
-    atStart = false;
+    // The rest reads whole tokens; `t` ends as the first token not consumed, which the fast
+    // path reads again.
     UnitKind kind;
     if (equalsWord(w, "use")) {
       t = readUseList(false);
-      continue;
-    }
-    if (equalsWord(w, "library")) {
+    } else if (equalsWord(w, "library")) {
       while (t.kind != TokenKind::End && !t.is(';')) t = next();
+    } else if (equalsWord(w, "entity")) {
+      kind = UnitKind::Entity;
+      t = readUnitHeader(t, kind, onUnit);
+    } else if (equalsWord(w, "architecture")) {
+      kind = UnitKind::Architecture;
+      t = readUnitHeader(t, kind, onUnit);
+    } else if (equalsWord(w, "package")) {
+      kind = UnitKind::Package;
+      t = readUnitHeader(t, kind, onUnit);
+    } else if (equalsWord(w, "configuration")) {
+      kind = UnitKind::Configuration;
+      t = readUnitHeader(t, kind, onUnit);
+    } else if (equalsWord(w, "context")) {
+      kind = UnitKind::Context;
+      t = readUnitHeader(t, kind, onUnit);
+    } else {
       continue;
     }
-    if (equalsWord(w, "entity")) kind = UnitKind::Entity;
-    else if (equalsWord(w, "architecture")) kind = UnitKind::Architecture;
-    else if (equalsWord(w, "package")) kind = UnitKind::Package;
-    else if (equalsWord(w, "configuration")) kind = UnitKind::Configuration;
-    else if (equalsWord(w, "context")) kind = UnitKind::Context;
-    else {
-      t = next();
-      continue;
-    }
-    Token keyword = t;
-    m_ErrorInUnit = false;
-    t = next();
-    if (kind == UnitKind::Package && t.kind == TokenKind::Identifier && equalsWord(t.text, "body")) {
-      kind = UnitKind::PackageBody;
-      t = next();
-    }
-    if (!isNameToken(t)) {
-      syntaxError(t, std::string("expected a name after '") + kindWord(kind) + "'");
-      m_Pending.clear();
-      continue;
-    }
-    Token name = t;
-    t = next();
-    if (kind == UnitKind::Context && !(t.kind == TokenKind::Identifier && equalsWord(t.text, "is"))) {
-      // A context reference in a context clause, not a declaration.
-      m_Lexer = Lexer(m_Source.text(), name.offset);
-      t = readUseList(true);
-      continue;
-    }
-    if (kind == UnitKind::Architecture || kind == UnitKind::Configuration) {
-      if (!(t.kind == TokenKind::Identifier && equalsWord(t.text, "of"))) {
-        syntaxError(t, "expected 'of'");
-        m_Pending.clear();
-        continue;
-      }
-      t = next();
-      if (isNameToken(t)) t = next();
-    }
-    if (!(t.kind == TokenKind::Identifier && equalsWord(t.text, "is"))) {
-      syntaxError(t, "expected 'is'");
-      m_Pending.clear();
-      continue;
-    }
-    t = next();
-    if (kind == UnitKind::Package && t.kind == TokenKind::Identifier && equalsWord(t.text, "new"))
-      kind = UnitKind::PackageInstance;
-    UnitRecord unit;
-    unit.kind = kind;
-    unit.name = normalizeName(name.text);
-    unit.offset = keyword.offset;
-    unit.uses = std::move(m_Pending);
-    m_Pending.clear();
-    onUnit(std::move(unit), name.offset);
+    m_Lexer.seek(t.offset, false);
   }
+}
+
+template <typename OnUnit>
+Token Sweep::readUnitHeader(Token keyword, UnitKind kind, OnUnit& onUnit) {
+  m_ErrorInUnit = false;
+  Token t = next();
+  if (kind == UnitKind::Package && t.kind == TokenKind::Identifier && equalsWord(t.text, "body")) {
+    kind = UnitKind::PackageBody;
+    t = next();
+  }
+  if (!isNameToken(t)) {
+    syntaxError(t, std::string("expected a name after '") + kindWord(kind) + "'");
+    m_Pending.clear();
+    return t;
+  }
+  Token name = t;
+  t = next();
+  if (kind == UnitKind::Context && !(t.kind == TokenKind::Identifier && equalsWord(t.text, "is"))) {
+    // A context reference in a context clause, not a declaration.
+    m_Lexer.seek(name.offset, false);
+    return readUseList(true);
+  }
+  if (kind == UnitKind::Architecture || kind == UnitKind::Configuration) {
+    if (!(t.kind == TokenKind::Identifier && equalsWord(t.text, "of"))) {
+      syntaxError(t, "expected 'of'");
+      m_Pending.clear();
+      return t;
+    }
+    t = next();
+    if (isNameToken(t)) t = next();
+  }
+  if (!(t.kind == TokenKind::Identifier && equalsWord(t.text, "is"))) {
+    syntaxError(t, "expected 'is'");
+    m_Pending.clear();
+    return t;
+  }
+  t = next();
+  if (kind == UnitKind::Package && t.kind == TokenKind::Identifier && equalsWord(t.text, "new"))
+    kind = UnitKind::PackageInstance;
+  UnitRecord unit;
+  unit.kind = kind;
+  unit.name = normalizeName(name.text);
+  unit.offset = keyword.offset;
+  unit.uses = std::move(m_Pending);
+  m_Pending.clear();
+  onUnit(std::move(unit), name.offset);
+  return t;
 }
 
 }  // namespace

@@ -85,10 +85,101 @@ Lexer::Lexer(std::string_view text, size_t start)
 Token Lexer::make(TokenKind kind, const char* start) {
   Token t{kind, std::string_view(start, static_cast<size_t>(m_Cursor - start)),
           static_cast<size_t>(start - m_Begin), nullptr};
-  m_TickAllowed = kind == TokenKind::Identifier || kind == TokenKind::Extended ||
-                  (kind == TokenKind::Symbol && (t.text == ")" || t.text == "]"));
-  m_Previous = t;
+  m_Tick = Tick::No;
+  m_StatementStart = false;
+  if (kind == TokenKind::Identifier) {
+    m_Tick = Tick::AfterWord;
+    m_LastWord = t.text;
+  } else if (kind == TokenKind::Extended) {
+    m_Tick = Tick::AfterBracket;
+  } else if (kind == TokenKind::Symbol && t.text.size() == 1) {
+    if (t.text[0] == ')' || t.text[0] == ']') m_Tick = Tick::AfterBracket;
+    m_StatementStart = t.text[0] == ';';
+  }
   return t;
+}
+
+// After a name or a closing bracket a quote is a tick (x'range, f(a)'length); after a
+// reserved word other than `all` it opens a character literal (when '0').
+bool Lexer::tickFollows() const {
+  if (m_Tick == Tick::AfterBracket) return true;
+  if (m_Tick == Tick::No) return false;
+  return equalsWord(m_LastWord, "all") || !isReservedWord(m_LastWord);
+}
+
+void Lexer::seek(size_t offset, bool statementStart) {
+  m_Cursor = m_Begin + std::min(offset, static_cast<size_t>(m_End - m_Begin));
+  m_Tick = Tick::No;
+  m_StatementStart = statementStart;
+}
+
+Token Lexer::nextAtStatementStart() {
+  for (;;) {
+    const char* p = m_Cursor;
+    while (classOf(*p) == Blank) ++p;
+    m_Cursor = p;
+    char c = *p;
+    uint8_t k = classOf(c);
+    if (k == Letter) {
+      const char* start = p;
+      ++p;
+      while (isWordChar(*p)) ++p;
+      size_t n = static_cast<size_t>(p - start);
+      m_Cursor = p;
+      if (*p == '"' && isBaseSpecifier(start, n)) {
+        Token t = lexQuoted(start, TokenKind::BitString);
+        if (t.kind == TokenKind::Invalid) return t;
+        continue;
+      }
+      bool statementStart = m_StatementStart;
+      m_StatementStart = false;
+      m_Tick = Tick::AfterWord;
+      m_LastWord = std::string_view(start, n);
+      if (statementStart || (n == 3 && equalsWord(m_LastWord, "end")))
+        return Token{TokenKind::Identifier, m_LastWord, static_cast<size_t>(start - m_Begin),
+                     nullptr};
+      continue;
+    }
+    if (k == Digit) {
+      Token t = lexNumber(p);
+      if (t.kind == TokenKind::Invalid) return t;
+      continue;
+    }
+    if (c == ';') {
+      ++m_Cursor;
+      m_StatementStart = true;
+      m_Tick = Tick::No;
+      continue;
+    }
+    if (c == '-' && p[1] == '-') {
+      const void* eol = std::memchr(p, '\n', static_cast<size_t>(m_End - p));
+      m_Cursor = eol ? static_cast<const char*>(eol) + 1 : m_End;
+      continue;
+    }
+    if (c == '/' && p[1] == '*') {
+      if (!skipBlockComment()) {
+        m_Cursor = m_End;
+        return invalid(p, "unterminated block comment");
+      }
+      continue;
+    }
+    // Strings, extended identifiers, stray bytes and the end: the token starts right here.
+    if (c == '"' || c == '\\' || k == Other) {
+      bool statementStart = m_StatementStart;
+      Token t = next();
+      if (t.kind == TokenKind::End || t.kind == TokenKind::Invalid) return t;
+      if (t.kind == TokenKind::Extended && statementStart) return t;
+      continue;
+    }
+    // A delimiter: only a quote needs care, for the tick ambiguity.
+    if (c == '\'' && !tickFollows() && p + 2 < m_End && p[2] == '\'') {
+      m_Cursor += 3;
+    } else {
+      ++m_Cursor;
+    }
+    m_StatementStart = false;
+    m_Tick = c == ')' || c == ']' ? Tick::AfterBracket : Tick::No;
+  }
 }
 
 Token Lexer::invalid(const char* start, const char* why) {
@@ -155,11 +246,7 @@ Token Lexer::next() {
       return invalid(start, "stray character");
   }
   if (c == '\'') {
-    bool tick = m_TickAllowed;
-    if (tick && m_Previous.kind == TokenKind::Identifier && !equalsWord(m_Previous.text, "all") &&
-        isReservedWord(m_Previous.text))
-      tick = false;
-    if (!tick && m_Cursor + 2 < m_End && m_Cursor[2] == '\'') {
+    if (!tickFollows() && m_Cursor + 2 < m_End && m_Cursor[2] == '\'') {
       m_Cursor += 3;
       return make(TokenKind::Character, start);
     }

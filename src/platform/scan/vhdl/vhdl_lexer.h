@@ -45,10 +45,18 @@ class Lexer {
   explicit Lexer(std::string_view text, size_t start = 0);
 
   Token next();
+  /// The fast path of the index pass: skips everything except identifiers that start a
+  /// statement (after a semicolon or at the start), every `end`, invalid tokens and the end of
+  /// the text, without building tokens for what it skips.
+  Token nextAtStatementStart();
+  /// Continues lexing at `offset`, as if nothing that allows a tick came before.
+  void seek(size_t offset, bool statementStart);
   /// Offset of the next unread byte.
   size_t position() const { return static_cast<size_t>(m_Cursor - m_Begin); }
 
  private:
+  enum class Tick : uint8_t { No, AfterWord, AfterBracket };
+  bool tickFollows() const;
   Token make(TokenKind kind, const char* start);
   Token invalid(const char* start, const char* why);
   Token lexNumber(const char* start);
@@ -59,8 +67,9 @@ class Lexer {
   const char* m_Begin;
   const char* m_Cursor;
   const char* m_End;
-  bool m_TickAllowed = false;  // the previous token may carry an attribute
-  Token m_Previous;
+  Tick m_Tick = Tick::No;        // whether the previous token may carry an attribute
+  std::string_view m_LastWord;   // the previous token, when it was a basic identifier
+  bool m_StatementStart = true;  // the previous token was a semicolon, or there was none
 };
 
 }  // namespace scan::vhdl
