@@ -30,7 +30,7 @@ enum class ExprKind : uint8_t {
   Box,        ///< <> of an unconstrained index
   Open,       ///< open
   Others,     ///< others
-  Aggregate,  ///< (args), never evaluated
+  Aggregate,  ///< (args): the elements of a positional aggregate, else none
 };
 
 enum class Op : uint8_t {

@@ -263,7 +263,8 @@ bool Evaluator::evalCall(const EvalContext& c, const Expr& e, Value& out) {
   const Expr& prefix = c.unit->arena[static_cast<size_t>(e.a)];
   std::string_view text = c.unit->source->text().substr(prefix.begin, prefix.end - prefix.begin);
   Found f = resolve(c, prefix, e.args.size());
-  if (f.local != nullptr || (f.decl != nullptr && isObjectDecl(f.decl->kind)))
+  if (f.decl != nullptr && isObjectDecl(f.decl->kind)) return evalIndexed(c, f, e, out);
+  if (f.local != nullptr)
     return failWith("indexing " + quoted(text) + " is not supported in bounds");
   std::vector<Value> args(e.args.size());
   for (size_t i = 0; i < e.args.size(); ++i)
@@ -285,6 +286,26 @@ bool Evaluator::evalCall(const EvalContext& c, const Expr& e, Value& out) {
   if (callBuiltinFunction(prefix.key, args, out, known)) return true;
   if (known) return failWith("invalid arguments to " + quoted(text));
   return failWith(quoted(text) + " is not declared");
+}
+
+// A constant table given by a positional aggregate, indexed by one constant expression.
+bool Evaluator::evalIndexed(const EvalContext& c, const Found& f, const Expr& call, Value& out) {
+  std::string_view text = c.unit->source->text().substr(call.begin, call.end - call.begin);
+  Decl& decl = *f.decl;
+  const Expr* init = decl.init == kNoExpr ? nullptr : &f.unit->arena[static_cast<size_t>(decl.init)];
+  if (decl.kind != DeclKind::Constant || init == nullptr || init->kind != ExprKind::Aggregate ||
+      init->args.empty() || call.args.size() != 1)
+    return failWith("indexing " + quoted(text) + " is not supported in bounds");
+  Value index;
+  RangeValue r;
+  if (!eval(c, call.args[0], index) || !declRange(f.unit, decl, r)) return false;
+  if (!index.isInteger()) return failWith("the index in " + quoted(text) + " is not an integer");
+  int64_t i = index.asInteger();
+  int64_t position = r.ascending ? i - r.left : r.left - i;
+  if (i < r.low() || i > r.high() || position < 0 ||
+      position >= static_cast<int64_t>(init->args.size()))
+    return failWith("the index in " + quoted(text) + " is out of range");
+  return eval(EvalContext{f.unit, nullptr}, init->args[static_cast<size_t>(position)], out);
 }
 
 // ---- operators ----

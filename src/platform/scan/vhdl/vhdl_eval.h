@@ -75,6 +75,7 @@ class Evaluator {
   bool eval(const EvalContext& c, ExprId id, Value& out);
   bool evalName(const EvalContext& c, const Expr& e, Value& out);
   bool evalCall(const EvalContext& c, const Expr& e, Value& out);
+  bool evalIndexed(const EvalContext& c, const Found& f, const Expr& call, Value& out);
   bool evalAttribute(const EvalContext& c, const Expr& e, Value& out);
   bool evalUnary(const EvalContext& c, const Expr& e, Value& out);
   bool evalBinary(const EvalContext& c, const Expr& e, Value& out);

@@ -697,7 +697,7 @@ ExprId Parser::parsePrimary() {
 }
 
 // `(e)` is a parenthesized expression; anything with a comma, a choice or a range is an
-// aggregate, which bounds never need.
+// aggregate. Positional aggregates keep their elements, so constant tables can be indexed.
 ExprId Parser::parseParenthesized() {
   size_t begin = peek().offset;
   take();
@@ -708,11 +708,15 @@ ExprId Parser::parseParenthesized() {
   }
   ExprId inner = parseDiscreteRange();
   bool aggregate = inner != kNoExpr && m_Arena[inner].kind == ExprKind::Range;
+  bool positional = !aggregate;
+  std::vector<ExprId> elements{inner};
   while (inner != kNoExpr && !m_Failed &&
          (peek().is(',') || peek().isSymbol("=>") || peek().is('|'))) {
     aggregate = true;
+    positional = positional && peek().is(',');
     take();
     inner = parseDiscreteRange();
+    if (positional) elements.push_back(inner);
   }
   --m_Depth;
   if (inner == kNoExpr || !expect(')')) return kNoExpr;
@@ -723,6 +727,7 @@ ExprId Parser::parseParenthesized() {
   }
   Expr e;
   e.kind = ExprKind::Aggregate;
+  if (positional) e.args = std::move(elements);
   e.begin = begin;
   e.end = lastEnd();
   return add(std::move(e));
