@@ -35,7 +35,9 @@ class Forge {
 
   /// The status (0 or 2) and a copy of the message.
   uint32_t getResult(std::string& message) const;
-  /// Records the first template error, prefixed with the reader's current line.
+  /// Records the first template error, prefixed with the reader's current line; later calls
+  /// change nothing. A message longer than kMessageCapacity is cut between characters and
+  /// still ends with a newline.
   void reportError(std::string_view text);
 
   // --- Main loop and dispatch (dispatch.cpp) ---
@@ -55,12 +57,17 @@ class Forge {
   const std::string& displayName(const PortRecord& port) const;
 
   // --- Scalar variables and case (scalar_variables.cpp) ---
+  /// Writes the header value of keyword `index` (%module%, %date%, ...) in the case mode; an
+  /// index that names no header value writes the version. True when a write failed.
   bool writeScalarVariable(int index);
-  /// Converts `text` in place by m_Case and returns it.
+  /// Converts `text` in place by m_Case (ASCII letters only) and returns it.
   std::string& applyCase(std::string& text) const;
+  /// Swaps the case of every ASCII letter in place and returns `text`.
   static std::string& invertCase(std::string& text);
 
   // --- @SET (set_directive.cpp) ---
+  /// Handles "@SET key=value@". Outline width values beyond 32 bits are clamped. True (after
+  /// reporting) when the token is rejected.
   bool doSet(std::string_view token);
 
   // --- Conditionals (conditionals.cpp) ---
