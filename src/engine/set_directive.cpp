@@ -1,7 +1,7 @@
 // "@SET key=value@": changes one output state variable from inside the template. The token is
-// split the way the directive has always been read: the directive word ends at the first blank
-// or tab, the key at the first "=", the value at the first "@"; blanks around the key stay in
-// it, so such keys match nothing.
+// split field by field: the directive word ends at the first blank or tab, the key at the first
+// "=", the value at the first "@". Blanks around the key stay in it, so such keys match nothing
+// and templates that relied on loose spacing fail loudly instead of setting the wrong thing.
 #include <cstdint>
 #include <limits>
 
