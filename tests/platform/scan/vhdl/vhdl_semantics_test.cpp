@@ -1,0 +1,198 @@
+// Name resolution and evaluation rules on small in-memory designs: which declarations a
+// bound sees, how functions are chosen and run, and how subtypes shape a port.
+#include <gtest/gtest.h>
+
+#include <string>
+#include <vector>
+
+#include "platform/scan/common/diagnostics.h"
+#include "platform/scan/common/source_buffer.h"
+#include "platform/scan/vhdl/vhdl_lexer.h"
+#include "platform/scan/vhdl/vhdl_reader.h"
+
+namespace {
+
+struct File {
+  const char* library;
+  const char* text;
+};
+
+// "name(left dir right)" or "name" per port, joined by blanks; "?" when the unit is missing.
+std::string portsOf(const std::vector<File>& files, const char* unit) {
+  scan::Diagnostics diagnostics(nullptr);
+  scan::vhdl::VhdlReader reader(diagnostics);
+  for (size_t i = 0; i < files.size(); ++i)
+    reader.indexSource(scan::SourceBuffer::fromText("f" + std::to_string(i) + ".vhd", files[i].text),
+                       files[i].library);
+  if (!reader.selectUnit("work", unit)) return "?";
+  std::string out;
+  for (const ScanPort& p : reader.readPorts()) {
+    if (!out.empty()) out += ' ';
+    out += p.name();
+    if (!p.hasRange()) continue;
+    int32_t left = 0;
+    int32_t right = 0;
+    p.getBounds(left, right);
+    out += "(" + std::to_string(left) + (p.isAscending() ? " to " : " downto ") +
+           std::to_string(right) + ")";
+  }
+  return out;
+}
+
+const char* kPkg =
+    "package pkg is\n"
+    "  constant W : natural := 8;\n"
+    "  constant DEFERRED : natural;\n"
+    "  function f(a : integer) return integer;\n"
+    "  function f(a, b : integer) return integer;\n"
+    "  function g(a : integer; b : integer := 100) return integer;\n"
+    "  procedure p(x : inout integer);\n"
+    "  type prot is protected\n"
+    "    procedure inc;\n"
+    "  end protected prot;\n"
+    "end package;\n"
+    "package body pkg is\n"
+    "  constant DEFERRED : natural := W * 2;\n"
+    "  function helper(n : natural) return natural is\n"
+    "  begin\n"
+    "    return n + 1;\n"
+    "  end function;\n"
+    "  function f(a : integer) return integer is begin return helper(a); end;\n"
+    "  function f(a, b : integer) return integer is begin return a - b; end function f;\n"
+    "  function g(a : integer; b : integer := 100) return integer is\n"
+    "    constant K : integer := 2;\n"
+    "    variable acc : integer;\n"
+    "  begin\n"
+    "    acc := 0;\n"
+    "    for i in a downto 1 loop acc := acc + K; end loop;\n"
+    "    return acc + b;\n"
+    "  end;\n"
+    "  procedure p(x : inout integer) is begin if x > 0 then x := x - 1; end if; end procedure;\n"
+    "  type prot is protected body\n"
+    "    variable n : integer := 0;\n"
+    "    procedure inc is begin n := n + 1; end procedure;\n"
+    "  end protected body prot;\n"
+    "end package body;\n";
+
+struct SemanticsCase {
+  const char* label;
+  std::vector<File> files;
+  const char* unit;
+  const char* ports;
+};
+
+const SemanticsCase kCases[] = {
+    {"deferred_constants_overloads_defaults_and_private_helpers",
+     {{"work", kPkg},
+      {"work",
+       "use work.pkg.all;\n"
+       "entity e is port (a : in bit_vector(DEFERRED - 1 downto 0); b : in bit_vector(f(3) downto f(9, 8));\n"
+       "  c : in bit_vector(g(3) downto g(1, 0))); end;"}},
+     "e",
+     "a(15 downto 0) b(4 downto 1) c(106 downto 2)"},
+    {"use_clauses_inside_a_body_do_not_reach_the_next_unit",
+     {{"work", kPkg},
+      {"work",
+       "entity a is end;\narchitecture r of a is use work.pkg.all; begin end;\n"
+       "entity e is port (x : in bit_vector(W - 1 downto 0); y : in bit); end;"}},
+     "e",
+     "x y"},
+    {"package_found_in_another_library_than_named",
+     {{"lib1", kPkg}, {"work", "library other; use other.pkg.all;\nentity e is port (x : in bit_vector(W downto 1)); end;"}},
+     "e",
+     "x(8 downto 1)"},
+    {"generics_in_order_and_earlier_ports",
+     {{"work",
+       "entity e is generic (A : integer := 3; B : integer := A * 2; R : real := 2.5);\n"
+       "port (x : in bit_vector(B downto A); y : out bit_vector(x'range);\n"
+       "  z : out bit_vector(x'length downto natural(R)); w : in bit_vector(y'reverse_range)); end;"}},
+     "e",
+     "x(6 downto 3) y(6 downto 3) z(4 downto 3) w(3 to 6)"},
+    {"math_real_and_predefined_functions",
+     {{"work",
+       "library ieee; use ieee.math_real.all;\n"
+       "entity e is generic (N : natural := 1000);\n"
+       "port (a : in bit_vector(integer(floor(log2(real(N)))) downto 0);\n"
+       "  b : in bit_vector(integer(round(2.5)) downto integer(ceil(0.1)));\n"
+       "  c : in bit_vector(maximum(3, 7) downto minimum(3, 7));\n"
+       "  d : in bit_vector(integer(sqrt(16.0)) downto integer(log2(1.0)))); end;"}},
+     "e",
+     "a(9 downto 0) b(3 downto 1) c(7 downto 3) d(4 downto 0)"},
+    {"letter_case_resolution_functions_and_selected_type_marks",
+     {{"work", kPkg},
+      {"work",
+       "LIBRARY IEEE; USE IEEE.STD_LOGIC_1164.ALL; USE WORK.PKG.ALL;\n"
+       "ENTITY Mixed_Case IS PORT (A : IN resolved std_ulogic; B : IN (resolved) std_ulogic_vector(w downto 1);\n"
+       "  C : OUT ieee.numeric_std.unsigned(Pkg.W - 5 DOWNTO 0); D : INOUT WORK.PKG.prot); END;"}},
+     "mixed_case",
+     "A B(8 downto 1) C(3 downto 0) D"},
+    {"integer_overflow_is_not_a_range",
+     {{"work", "entity e is port (a : in bit_vector(2 ** 40 downto 0); b : in bit_vector(2 ** 63 downto 0)); end;"}},
+     "e",
+     "a b"},
+    {"booleans_enumerations_and_case",
+     {{"work",
+       "package q is type color is (red, green, blue);\n"
+       "function pick(c : color; wide : boolean) return natural; end;\n"
+       "package body q is function pick(c : color; wide : boolean) return natural is begin\n"
+       "  case c is when red => return 1; when green | blue => if wide and not false then return 8; else return 4; end if; end case;\n"
+       "end; end;\n"
+       "use work.q.all; entity e is port (a : in bit_vector(pick(green, true) downto pick(red, false));\n"
+       "  b : in bit_vector(color'pos(blue) downto 0); c : in bit_vector(pick(blue, 1 > 2) downto 0)); end;"}},
+     "e",
+     "a(8 downto 1) b(2 downto 0) c(4 downto 0)"},
+    {"while_loops_exit_and_next",
+     {{"work",
+       "package q is function bits(n : natural) return natural; end;\n"
+       "package body q is function bits(n : natural) return natural is variable v : natural := n; variable r : natural := 0;\n"
+       "begin loop exit when v = 0; v := v / 2; r := r + 1; next when r < 100; end loop; return r; end; end;\n"
+       "use work.q.all; entity e is port (a : in bit_vector(bits(255) - 1 downto 0); b : in bit_vector(bits(256) downto 0)); end;"}},
+     "e",
+     "a(7 downto 0) b(9 downto 0)"},
+};
+
+class Semantics : public testing::TestWithParam<SemanticsCase> {};
+
+TEST_P(Semantics, PortsFollowTheRules) {
+  EXPECT_EQ(portsOf(GetParam().files, GetParam().unit), GetParam().ports);
+}
+
+INSTANTIATE_TEST_SUITE_P(Vhdl, Semantics, testing::ValuesIn(kCases),
+                         [](const testing::TestParamInfo<SemanticsCase>& info) {
+                           return std::string(info.param.label);
+                         });
+
+struct StartCase {
+  const char* text;
+  const char* words;  ///< what the index pass's fast path stops at
+};
+
+const StartCase kStartCases[] = {
+    {"entity e is port (a : in bit); end;", "entity end"},
+    {"a; -- b;\n c; /* d; */ e", "a c e"},
+    {"x <= \"; y\"; z", "x z"},
+    {"x := '; '; y", "x y"},
+    {"f(a)';' b; c", "f c"},
+    {"when ';' => q; r", "when r"},
+    {"x := 8UX\";\"; y", "x y"},
+    {"\\ext\\; \\two words\\ is", "\\ext\\ \\two words\\"},
+    {"ENDING; End; a.end", "ENDING End a end"},
+};
+
+class StatementStarts : public testing::TestWithParam<StartCase> {};
+
+TEST_P(StatementStarts, AreFoundByTheFastPath) {
+  std::string text = GetParam().text;
+  scan::vhdl::Lexer lexer(text);
+  std::string words;
+  for (scan::vhdl::Token t = lexer.nextAtStatementStart(); t.kind != scan::vhdl::TokenKind::End;
+       t = lexer.nextAtStatementStart()) {
+    if (!words.empty()) words += ' ';
+    words += std::string(t.text);
+  }
+  EXPECT_EQ(words, GetParam().words);
+}
+
+INSTANTIATE_TEST_SUITE_P(Vhdl, StatementStarts, testing::ValuesIn(kStartCases));
+
+}  // namespace
