@@ -47,7 +47,6 @@ class Design {
   /// The parsed body of the function declared at `decl` in `unit`; null on a syntax error.
   const FunctionBody* function(UnitScope& unit, const Decl& decl);
   bool isLibraryName(std::string_view name) const;
-  Diagnostics& diagnostics() { return m_Diagnostics; }
 
  private:
   UnitScope* parse(const UnitRecord& record);

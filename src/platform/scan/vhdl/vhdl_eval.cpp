@@ -38,26 +38,7 @@ bool Evaluator::failWith(std::string reason) {
 
 bool Evaluator::step() {
   if (++m_Steps <= kStepLimit) return true;
-  m_StepLimitHit = true;
   return failWith("a function did not finish within " + std::to_string(kStepLimit) + " steps");
-}
-
-bool Evaluator::value(const EvalContext& context, ExprId expr, Value& out) {
-  if (m_Depth == 0) {
-    m_Reason.clear();
-    m_Steps = 0;
-    m_StepLimitHit = false;
-  }
-  return eval(context, expr, out);
-}
-
-bool Evaluator::range(const EvalContext& context, ExprId expr, RangeValue& out) {
-  if (m_Depth == 0) {
-    m_Reason.clear();
-    m_Steps = 0;
-    m_StepLimitHit = false;
-  }
-  return evalRange(context, expr, out);
 }
 
 bool Evaluator::eval(const EvalContext& c, ExprId id, Value& out) {
@@ -240,6 +221,7 @@ bool Evaluator::foundValue(const Found& f, std::string_view name, Value& out) {
 
 bool Evaluator::evalName(const EvalContext& c, const Expr& e, Value& out) {
   Found f = resolve(c, e, kAnyArity);
+  if (f.decl != nullptr && f.decl->kind == DeclKind::Function) f = resolve(c, e, 0);
   if (f) return foundValue(f, e.text, out);
   if (e.kind == ExprKind::Name) {
     if (equalsWord(e.text, "true") || equalsWord(e.text, "false")) {

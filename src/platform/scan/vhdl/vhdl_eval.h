@@ -24,7 +24,6 @@ struct RangeValue {
 
 /// The running state of one user function call.
 struct Frame {
-  UnitScope* unit = nullptr;
   const FunctionBody* function = nullptr;
   std::vector<Value> parameters;
   std::vector<Value> locals;
@@ -44,11 +43,6 @@ class Evaluator {
 
   explicit Evaluator(Design& design) : m_Design(design) {}
 
-  /// Evaluates `expr` of `context.unit`'s arena. False with reason() set on failure.
-  bool value(const EvalContext& context, ExprId expr, Value& out);
-  /// Evaluates a discrete range: `a to b`, `x'range`, or a type name.
-  bool range(const EvalContext& context, ExprId expr, RangeValue& out);
-
   enum class Shape { Scalar, Array, Unconstrained, Unknown, Failed };
   /// What a port of this subtype is: a scalar, an array with `out` as its (first) index
   /// range, an unconstrained array, or of a type nobody declared. On Failed, `failed` is the
@@ -58,8 +52,6 @@ class Evaluator {
 
   /// Why the last evaluation failed.
   const std::string& reason() const { return m_Reason; }
-  /// True when the last failure was the step limit.
-  bool stepLimitHit() const { return m_StepLimitHit; }
 
  private:
   struct Found {
@@ -111,7 +103,6 @@ class Evaluator {
   int m_Depth = 0;
   int m_Calls = 0;
   uint64_t m_Steps = 0;
-  bool m_StepLimitHit = false;
 };
 
 }  // namespace scan::vhdl

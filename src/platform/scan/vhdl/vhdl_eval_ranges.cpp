@@ -227,7 +227,6 @@ Evaluator::Shape Evaluator::portShape(const EvalContext& c, const SubtypeIndicat
                                       RangeValue& out, const Expr*& failed) {
   m_Reason.clear();
   m_Steps = 0;
-  m_StepLimitHit = false;
   failed = nullptr;
   if (!s.indexConstraint.empty()) {
     const Expr& first = c.unit->arena[static_cast<size_t>(s.indexConstraint[0])];

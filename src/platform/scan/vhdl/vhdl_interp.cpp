@@ -35,7 +35,6 @@ bool Evaluator::callFunction(UnitScope* unit, Decl& decl, const std::vector<Valu
   if (args.size() > fn->parameters.size())
     return failWith("too many arguments to " + quoted(decl.name));
   Frame frame;
-  frame.unit = bodyUnit;
   frame.function = fn;
   frame.parameters.resize(fn->parameters.size());
   frame.locals.resize(fn->locals.size());

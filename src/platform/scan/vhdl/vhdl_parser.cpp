@@ -198,7 +198,18 @@ bool Parser::parseInterfaceList(std::vector<Decl>& out, DeclKind kind) {
   for (;;) {
     if (peekWord("type") || peekWord("function") || peekWord("procedure") ||
         peekWord("impure") || peekWord("pure") || peekWord("package")) {
-      // Generic types, subprograms and packages carry no bounds for ports.
+      // Generic subprograms and packages carry no bounds for ports; ports of a generic type
+      // are scalars as far as ranges go.
+      if (peekWord("type") && isName(peek(1))) {
+        take();
+        Token name = take();
+        Decl d;
+        d.kind = DeclKind::OtherType;
+        d.key = normalizeName(name.text);
+        d.name = name.text;
+        d.offset = name.offset;
+        out.push_back(std::move(d));
+      }
       long depth = 0;
       while (!m_Failed && peek().kind != TokenKind::End) {
         if (depth == 0 && (peek().is(';') || peek().is(')'))) break;

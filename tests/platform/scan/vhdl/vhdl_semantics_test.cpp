@@ -126,6 +126,13 @@ const SemanticsCase kCases[] = {
        "  C : OUT ieee.numeric_std.unsigned(Pkg.W - 5 DOWNTO 0); D : INOUT WORK.PKG.prot); END;"}},
      "mixed_case",
      "A B(8 downto 1) C(3 downto 0) D"},
+    {"generic_types_and_subprograms",
+     {{"work",
+       "entity e is generic (type T; N : natural := 2; function f(x : T) return T is <>;\n"
+       "  package p is new work.gp generic map (<>));\n"
+       "  port (a : in T; b : in bit_vector(N downto 0)); end;"}},
+     "e",
+     "a b(2 downto 0)"},
     {"integer_overflow_is_not_a_range",
      {{"work", "entity e is port (a : in bit_vector(2 ** 40 downto 0); b : in bit_vector(2 ** 63 downto 0)); end;"}},
      "e",
