@@ -27,6 +27,14 @@ struct Run {
   std::string trace;
 };
 
+/// A temporary file holding `text`, positioned at its start. The caller closes it.
+inline std::FILE* fileWith(std::string_view text) {
+  std::FILE* file = std::tmpfile();
+  std::fwrite(text.data(), 1, text.size(), file);
+  std::rewind(file);
+  return file;
+}
+
 inline std::string readAll(std::FILE* file) {
   std::fflush(file);
   std::rewind(file);
@@ -41,16 +49,14 @@ inline void fillPorts(StbDataList& data, const std::vector<PortSpec>& ports) {
   for (const PortSpec& p : ports) data.appendOwned(new PortRecord(p.name, p.left, p.right, p.dir));
 }
 
-/// Expands `templateText` over `ports` with a fresh processor.
+/// Expands `templateText` over `ports` with a fresh processor (module "top", ext "vhd").
 inline Run runTemplate(std::string_view templateText, const std::vector<PortSpec>& ports,
                        bool traced = false) {
   StbDataList data("prj", "top", "out.vhd", "vhd", "pinforge", "", "title", "date");
   fillPorts(data, ports);
-  std::FILE* in = std::tmpfile();
+  std::FILE* in = fileWith(templateText);
   std::FILE* out = std::tmpfile();
   std::FILE* debug = traced ? std::tmpfile() : nullptr;
-  std::fwrite(templateText.data(), 1, templateText.size(), in);
-  std::rewind(in);
   Run run;
   {
     Forge forge(out, in, debug, &data);
