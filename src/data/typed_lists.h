@@ -1,5 +1,5 @@
-// The typed lists of the program: the run's design data, one bus's expanded bits, and the
-// tokens of one @ITERATE@ body. Each owns its objects.
+// The typed lists of the program: the run's design data and the tokens of one @ITERATE@ body.
+// Each owns its objects.
 #pragma once
 
 #include <string>
@@ -23,9 +23,6 @@ class StbDataList : public OwningObjectList<PortRecord> {
   std::string m_Title;
   std::string m_Date;
 };
-
-/// The single-bit records of one bus, in bit order.
-class ExpansionList : public OwningObjectList<PortRecord> {};
 
 /// The tokens of one @ITERATE@ body, in template order.
 class TokList : public OwningObjectList<TokEntry> {};

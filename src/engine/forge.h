@@ -12,6 +12,7 @@
 
 #include "data/port_record.h"
 #include "data/typed_lists.h"
+#include "engine/expansion_list.h"
 #include "engine/token_reader.h"
 
 class Forge {
@@ -89,6 +90,8 @@ class Forge {
   bool doIterate(int kind, TokList* list);
 
   // --- @ITERATOR@ and bus expansion (port_format.cpp) ---
+  /// The bits of bus `port`, worked out one at a time as they are walked; they carry the
+  /// port's mapped name as it is now.
   std::unique_ptr<ExpansionList> expandBus(const PortRecord& port) const;
   std::string formatPort(const PortRecord& port) const;
 
@@ -122,6 +125,7 @@ class Forge {
   bool m_Map = false;
   bool m_CaseSensitiveIf = true;
   uint32_t m_Conditions[11] = {0};
+  /// The bus that selectPort is handing out bit by bit, if any; its record is the current bit.
   std::unique_ptr<ExpansionList> m_Expansion;
   uint32_t m_Column = 0;
 

@@ -1,20 +1,11 @@
 // How one port is written (its name under map, its bit suffix or range, and the case mode) and
-// how a bus is split into single-bit records while expandbus is on.
+// how a bus is handed out as single bits while expandbus is on.
 #include <string>
 
 #include "engine/forge.h"
 
 std::unique_ptr<ExpansionList> Forge::expandBus(const PortRecord& port) const {
-  auto bits = std::make_unique<ExpansionList>();
-  const int32_t step = port.m_Left < port.m_Right ? 1 : -1;
-  // Test before stepping so that a bound at the edge of the 32-bit range cannot overflow.
-  for (int32_t index = port.m_Left;; index += step) {
-    auto* bit = new PortRecord(port.m_Name, index, index, port.m_Dir);
-    if (port.m_MappedName.has_value()) bit->setMappedName(*port.m_MappedName);
-    bits->appendOwned(bit);
-    if (index == port.m_Right) break;
-  }
-  return bits;
+  return std::make_unique<ExpansionList>(port);
 }
 
 std::string Forge::formatPort(const PortRecord& port) const {

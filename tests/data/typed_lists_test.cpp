@@ -47,9 +47,8 @@ TEST(TypedLists, LongOwningListIsFreedCompletely) {
 
 TEST(TypedLists, ClassNameIsThatOfTheObjectList) {
   StbDataList data("p", "m", "f", ".e", "t", "", "title", "date");
-  ExpansionList bits;
   TokList tokens;
-  const List* lists[] = {&data, &bits, &tokens};
+  const List* lists[] = {&data, &tokens};
   for (const List* list : lists) {
     EXPECT_STREQ(list->className(), "Object_list");
     List* made = list->newList();
