@@ -94,7 +94,7 @@ INSTANTIATE_TEST_SUITE_P(
             std::string("a\0;\0b\0;\0c", 9), ""},
         Row{"WidthSkipsBlanksAndSign", kAbc, "@SET outlinewidth=\n +3 @%iport%", "a, b, \nc", ""},
         Row{"WidthClampsHigh", kAbc, "@SET outlinewidth=2147483648@%iport%", "a, b, c", ""},
-        Row{"WidthClampsLow", kAbc, "@SET outlinewidth=-99999999999@@SET sigdelim=,\n@%iport%",
+        Row{"WidthClampsLow", kAbc, "@SET outlinewidth=-4294967295@@SET sigdelim=,\n@%iport%",
             "a,\n\nb,\n\nc", ""},
         Row{"ExpandBusSwitch", kSmallBus,
             "@SET expandbus=ON@%ibusport%|@SET EXPANDBUS=off@%ibusport%", "d_1_, d_0_|d", ""},
@@ -141,7 +141,8 @@ INSTANTIATE_TEST_SUITE_P(
         Row{"OnlyWholeDelimiterCounts", kNone, "@SET outlinewidth=0@, x@SET sigdelim=VHD@%ext%",
             ", xvhd", ""},
         Row{"SuppressedDelimiterStillBreaks", kNone,
-            "@SUPPRESNEWLINE@@SET outlinewidth=0@@SET sigdelim=\n@%ext%\n%ext%", "vhd\nvhd", ""},
+            "@SUPPRESNEWLINE@@SET outlinewidth=0@@SET sigdelim=\n@%ext%\n%ext%\tx\n", "vhd\nvhdx",
+            ""},
         Row{"EmptyDelimiterMatchesEmptyWrites", kAbc,
             "@SET outlinewidth=-1@@SET sigdelim=@%iport%", "a\nb\nc\n", ""}),
     rowName);
