@@ -1,101 +1,109 @@
-// Whole runs of the binary where the golden format cannot say enough: the trace file must be
-// created only in debug mode and only once the unit is found, and an unwritable trace file
-// must not break the run.
+// Whole runs of the binary where the golden format cannot say enough: the trace file exists
+// only in debug mode once the unit is found, an unwritable trace file does not break the run,
+// the script shell is found beside tclsh, and the shipped demo keeps its reviewed outputs.
 #include <gtest/gtest.h>
+#include <unistd.h>
 
 #include <cstdlib>
-#include <ostream>
+#include <filesystem>
 #include <string>
 #include <vector>
 
-#include "flow_support.h"
+#include "support/process.h"
+#include "support/scratch_dir.h"
 
 namespace {
+
+using namespace pinforge_test;
 
 constexpr const char* kDesign =
     "library ieee;\nuse ieee.std_logic_1164.all;\n"
     "entity top is\n  port (clk : in std_logic; q : out std_logic_vector(3 downto 0));\n"
     "end entity top;\n";
 
-struct TraceCase {
-  const char* name;
-  const char* module;
-  const char* templateName;  // ".tcl" takes the Tcl path (a stand-in runscr that succeeds)
-  bool debug;
-  bool traceIsDirectory;  // "forge.deb" already exists as a directory
-  bool traceExpected;
-  int expectedStatus;
-  const char* expectedOutput;  // out.txt after the run
-};
+std::vector<std::string> argsFor(const std::string& module, const std::string& templateName) {
+  return {"-lib", "work", "design.vhd", "-module", module,   "-prj",
+          "demo", "-template", templateName, "-o", "out.txt"};
+}
 
-const TraceCase kCases[] = {
-    {"NoDebugNoTrace", "top", "t.txt", false, false, false, 0, "top\n"},
-    {"DebugWritesTrace", "top", "t.txt", true, false, true, 0, "top\n"},
-    {"DebugUnitMissingNoTrace", "other", "t.txt", true, false, false, 1, ""},
-    {"DebugTclPathWritesTrace", "top", "t.tcl", true, false, true, 0, ""},
-    {"UnwritableTraceIgnored", "top", "t.txt", true, true, false, 0, "top\n"},
-};
-
-void PrintTo(const TraceCase& c, std::ostream* os) { *os << c.name; }
-
-class TraceFileTest : public testing::TestWithParam<TraceCase> {};
-
-TEST_P(TraceFileTest, CreatedOnlyWhenDebugging) {
-  const TraceCase& c = GetParam();
-  flowtest::TempDir dir;
-  ASSERT_FALSE(dir.path().empty());
-  const std::string bin = dir.file("bin");
-  const std::string work = dir.file("work");
-  ASSERT_TRUE(flowtest::makeDirectory(bin));
-  ASSERT_TRUE(flowtest::makeDirectory(work));
-  ASSERT_TRUE(flowtest::writeFile(bin + "/runscr", "#!/bin/sh\nexit 0\n", true));
-  ASSERT_TRUE(flowtest::writeFile(work + "/design.vhd", kDesign));
-  ASSERT_TRUE(flowtest::writeFile(work + "/" + c.templateName, "%module%\n"));
-  if (c.traceIsDirectory) {
-    ASSERT_TRUE(flowtest::makeDirectory(work + "/forge.deb"));
-  }
-
-  std::vector<std::string> args = {"-lib", "work", "design.vhd", "-module",    c.module,
-                                   "-prj", "demo", "-template",  c.templateName, "-o",
-                                   "out.txt"};
-  if (c.debug) args.push_back("--a");
-  const char* path = std::getenv("PATH");
-  const flowtest::RunResult run =
-      flowtest::runProgram(flowtest::pinforgeBinary(), args, work,
-                           {{"PATH", bin + ":" + (path != nullptr ? path : "/usr/bin:/bin")}});
-  ASSERT_TRUE(run.started);
-  EXPECT_EQ(run.status, c.expectedStatus) << run.out << run.err;
-  EXPECT_EQ(flowtest::readFile(work + "/out.txt"), c.expectedOutput);
-
-  if (!c.traceIsDirectory) {
-    EXPECT_EQ(flowtest::exists(work + "/forge.deb"), c.traceExpected);
+TEST(FlowRun, TraceFileOnlyWhenDebuggingAFoundUnit) {
+  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
+  const struct {
+    const char* what;
+    const char* module;
+    const char* templateName;  // ".tcl" takes the Tcl path (a stand-in runscr that succeeds)
+    bool debug;
+    bool traceIsDirectory;  // "forge.deb" already exists as a directory
+    int status;
+    const char* output;
+    bool traced;
+  } cases[] = {
+      {"no debug", "top", "t.txt", false, false, 0, "top\n", false},
+      {"debug", "top", "t.txt", true, false, 0, "top\n", true},
+      {"debug, unit missing", "other", "t.txt", true, false, 1, "", false},
+      {"debug, Tcl path", "top", "t.tcl", true, false, 0, "", true},
+      {"unwritable trace", "top", "t.txt", true, true, 0, "top\n", true},
+  };
+  for (const auto& c : cases) {
+    SCOPED_TRACE(c.what);
+    ScratchDir dir;
+    ASSERT_TRUE(dir.makeDir("bin") && dir.makeDir("work"));
+    ASSERT_TRUE(dir.write("bin/runscr", "#!/bin/sh\nexit 0\n", true));
+    ASSERT_TRUE(dir.write("work/design.vhd", kDesign));
+    ASSERT_TRUE(dir.write(std::string("work/") + c.templateName, "%module%\n"));
+    if (c.traceIsDirectory) {
+      ASSERT_TRUE(dir.makeDir("work/forge.deb"));
+    }
+    std::vector<std::string> args = argsFor(c.module, c.templateName);
+    if (c.debug) args.push_back("--a");
+    const char* path = std::getenv("PATH");
+    const RunResult run = runPinforge(
+        args, dir.file("work"),
+        {{"PATH", dir.file("bin") + ":" + (path != nullptr ? path : "/usr/bin:/bin")}});
+    ASSERT_TRUE(run.started);
+    EXPECT_EQ(run.status, c.status) << run.out << run.err;
+    EXPECT_EQ(dir.read("work/out.txt"), c.output);
+    EXPECT_EQ(dir.exists("work/forge.deb"), c.traced);
   }
 }
 
-TEST(ScriptShell, FoundBesideTheExecutableWhenNotOnPath) {
-  const std::string tclDir = flowtest::directoryOnPath("tclsh");
-  if (tclDir.empty()) GTEST_SKIP() << "tclsh is not installed";
-  if (flowtest::exists(tclDir + "/runscr")) GTEST_SKIP() << "a runscr is installed beside tclsh";
-  flowtest::TempDir work;
-  ASSERT_FALSE(work.path().empty());
-  ASSERT_TRUE(flowtest::writeFile(work.file("design.vhd"), kDesign));
-  ASSERT_TRUE(flowtest::writeFile(work.file("t.tcl"),
-                                  "set f [open $OutputFileName w]\n"
-                                  "puts $f \"$ModuleName $TotalPorts $PortName\"\n"
-                                  "close $f\n"));
-  const flowtest::RunResult run = flowtest::runProgram(
-      flowtest::pinforgeBinary(),
-      {"-lib", "work", "design.vhd", "-module", "top", "-prj", "demo", "-template", "t.tcl",
-       "-o", "out.txt"},
-      work.path(), {{"PATH", tclDir}});
-  ASSERT_TRUE(run.started);
+TEST(FlowRun, ScriptShellFoundBesideTclshWhenNotOnPath) {
+  const std::string tclsh = findOnPath("tclsh");
+  if (tclsh.empty() || binaryPath().empty()) GTEST_SKIP() << "tclsh or PINFORGE_BIN missing";
+  const std::string tclDir = std::filesystem::path(tclsh).parent_path().string();
+  if (access((tclDir + "/runscr").c_str(), F_OK) == 0)
+    GTEST_SKIP() << "a runscr is installed beside tclsh";
+  ScratchDir work;
+  ASSERT_TRUE(work.write("design.vhd", kDesign));
+  ASSERT_TRUE(work.write("t.tcl",
+                         "set f [open $OutputFileName w]\n"
+                         "puts $f \"$ModuleName $TotalPorts $PortName\"\n"
+                         "close $f\n"));
+  const RunResult run = runPinforge(argsFor("top", "t.tcl"), work.path(), {{"PATH", tclDir}});
   EXPECT_EQ(run.status, 0) << run.out << run.err;
-  EXPECT_EQ(flowtest::readFile(work.file("out.txt")), "top 2 clk q\n");
+  EXPECT_EQ(work.read("out.txt"), "top 2 clk q\n");
 }
 
-INSTANTIATE_TEST_SUITE_P(Cases, TraceFileTest, testing::ValuesIn(kCases),
-                         [](const testing::TestParamInfo<TraceCase>& info) {
-                           return std::string(info.param.name);
-                         });
+TEST(FlowRun, DemoProducesTheReviewedOutputs) {
+  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
+  const std::string source = sourceDir();
+  ScratchDir out;
+  const RunResult run =
+      runProgram({"/bin/sh", source + "/examples/demo.sh", binaryPath(), out.path()}, source);
+  EXPECT_EQ(run.status, 0) << run.out << run.err;
+  EXPECT_NE(run.out.find("Outputs are in "), std::string::npos) << run.out;
+  // The port tables come from the Tcl template, which needs tclsh.
+  const bool haveTcl = !findOnPath("tclsh").empty();
+  std::error_code error;
+  int compared = 0;
+  for (const auto& entry :
+       std::filesystem::directory_iterator(source + "/examples/expected", error)) {
+    const std::string name = entry.path().filename().string();
+    if (!haveTcl && name.ends_with("_ports.txt")) continue;
+    EXPECT_EQ(out.read(name), readFile(entry.path().string())) << name;
+    ++compared;
+  }
+  EXPECT_GE(compared, 6);
+}
 
 }  // namespace

@@ -20,13 +20,6 @@ struct Expansion {
   std::string message;
 };
 
-/// The argument that names `path` as the response file.
-std::string responseArgument(const std::string& path) {
-  std::string argument = "@";
-  argument += path;
-  return argument;
-}
-
 Expansion expand(std::vector<std::string> args) {
   std::vector<char*> argv;
   for (std::string& arg : args) argv.push_back(arg.data());
@@ -60,7 +53,6 @@ TEST(ExpandResponseFile, ResponseFileWordsAreSplitAtBlanksTabsAndNewlines) {
     std::vector<std::string> words;
   };
   const std::vector<Case> cases = {
-      {"one line", "-lib work a.vhd -module top\n", {"-lib", "work", "a.vhd", "-module", "top"}},
       {"several lines, runs of delimiters",
        "  -lib\twork \t a.vhd\n\n\n-module   top  \n",
        {"-lib", "work", "a.vhd", "-module", "top"}},
@@ -68,7 +60,6 @@ TEST(ExpandResponseFile, ResponseFileWordsAreSplitAtBlanksTabsAndNewlines) {
       {"CRLF line ends", "-lib work\r\na.vhd\r\n", {"-lib", "work", "a.vhd"}},
       {"a carriage return inside a line stays", "a\rb\n", {"a\rb"}},
       {"empty file", "", {}},
-      {"only delimiters", " \t\n\n \n", {}},
       {"no quoting, comments or nesting",
        "\"a b\" # c @inner.rsp\n",
        {"\"a", "b\"", "#", "c", "@inner.rsp"}},
@@ -79,12 +70,12 @@ TEST(ExpandResponseFile, ResponseFileWordsAreSplitAtBlanksTabsAndNewlines) {
        std::string(9990, ' ') + "abcdefghijklmnop\n",
        {"abcdefghijklmnop"}},
   };
+  ScratchDir dir;
   for (const Case& test : cases) {
     SCOPED_TRACE(test.what);
-    ScratchDir dir;
     ASSERT_TRUE(dir.write("args.rsp", test.content));
     const Expansion result =
-        expand({"pinforge", responseArgument(dir.file("args.rsp")), "-ignored", "x"});
+        expand({"pinforge", "@" + dir.file("args.rsp"), "-ignored", "x"});
     EXPECT_FALSE(result.failed);
     std::vector<std::string> expected = {"pinforge"};
     expected.insert(expected.end(), test.words.begin(), test.words.end());
@@ -98,7 +89,7 @@ TEST(ExpandResponseFile, UnreadableResponseFileFailsWithItsName) {
   const std::string missing = dir.file("missing.rsp");
   for (const std::string& name : {missing, std::string(), dir.path()}) {
     SCOPED_TRACE(name);
-    const Expansion result = expand({"pinforge", responseArgument(name)});
+    const Expansion result = expand({"pinforge", "@" + name});
     EXPECT_TRUE(result.failed);
     EXPECT_EQ(result.message, "FATAL ERROR: Unable to open response file " + name + "...\n");
   }

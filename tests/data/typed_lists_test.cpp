@@ -5,6 +5,7 @@
 #include <gtest/gtest.h>
 
 #include <string>
+#include <utility>
 #include <vector>
 
 namespace {
@@ -24,23 +25,10 @@ TEST(TypedLists, OwningListFreesEveryObjectEvenAfterANullOne) {
     OwningObjectList<Counted> list;
     list.appendOwned(new Counted);
     list.appendObject(nullptr);
-    list.appendOwned(new Counted);
-    list.appendOwned(new Counted);
-    EXPECT_EQ(g_Alive, 3);
+    for (int i = 0; i < 200000; ++i) list.appendOwned(new Counted);
+    EXPECT_EQ(g_Alive, 200001);
     list.first();
     list.next();  // a walk in progress does not change what is freed
-  }
-  EXPECT_EQ(g_Alive, 0);
-}
-
-TEST(TypedLists, LongOwningListIsFreedCompletely) {
-  g_Alive = 0;
-  {
-    OwningObjectList<Counted> list;
-    for (int i = 0; i < 200000; ++i) list.appendOwned(new Counted);
-    int walked = 0;
-    for (Counted* object = list.first(); object != nullptr; object = list.next()) ++walked;
-    EXPECT_EQ(walked, 200000);
   }
   EXPECT_EQ(g_Alive, 0);
 }
@@ -91,22 +79,13 @@ TEST(TypedLists, PortsComeBackInAppendOrder) {
   EXPECT_EQ(tokens.next(), nullptr);
 }
 
-TEST(PortRecord, BoundsDirectionAndBus) {
-  const struct {
-    int32_t left;
-    int32_t right;
-    bool bus;
-  } cases[] = {{-1, -1, false}, {2, 0, true}, {0, 1, true}, {0, 0, true}, {-1, 5, false}};
-  for (const auto& c : cases) {
-    const PortRecord port("p", c.left, c.right, 'N');
-    EXPECT_EQ(port.isBus(), c.bus) << c.left << ":" << c.right;
-    EXPECT_EQ(port.m_Left, c.left);
-    EXPECT_EQ(port.m_Right, c.right);
-    EXPECT_EQ(port.m_Dir, 'N');
-  }
-}
+TEST(PortRecord, BusAndMappedName) {
+  const std::pair<std::pair<int32_t, int32_t>, bool> cases[] = {
+      {{-1, -1}, false}, {{2, 0}, true}, {{0, 1}, true}, {{0, 0}, true}, {{-1, 5}, false}};
+  for (const auto& [bounds, bus] : cases)
+    EXPECT_EQ(PortRecord("p", bounds.first, bounds.second, 'N').isBus(), bus)
+        << bounds.first << ":" << bounds.second;
 
-TEST(PortRecord, MappedNameIsReplacedWhole) {
   PortRecord port("data", 3, 0, 'O');
   EXPECT_FALSE(port.m_MappedName.has_value());
   port.setMappedName("first_longer_name");

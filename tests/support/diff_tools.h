@@ -1,85 +1,38 @@
-// Plumbing for the tests that hold the extractor against external HDL tools: locating a tool
-// on PATH, running it without a shell, a scratch directory per suite, whole-file reads and
-// writes, and the list of fixture files a suite runs over.
+// What the tests that hold the extractor against external HDL tools share: running a tool
+// with its two output streams interleaved, and the fixture files a suite runs over.
 #pragma once
 
-#include <fcntl.h>
-#include <stdlib.h>
-#include <sys/wait.h>
-#include <unistd.h>
-
 #include <algorithm>
-#include <cerrno>
-#include <cstdio>
-#include <cstdlib>
 #include <filesystem>
-#include <memory>
 #include <string>
 #include <string_view>
 #include <system_error>
 #include <vector>
 
+#include "support/process.h"
+#include "support/scratch_dir.h"
+
 namespace difftest {
 
+using pinforge_test::readFile;
+using pinforge_test::ScratchDir;
+using pinforge_test::sourceDir;
+using pinforge_test::writeFile;
+
 /// The full path of `name` found on PATH, or empty when it is not installed.
-inline std::string findTool(const std::string& name) {
-  const char* path = std::getenv("PATH");
-  std::string_view dirs = path != nullptr ? path : "/usr/bin:/bin";
-  while (true) {
-    const size_t colon = dirs.find(':');
-    std::string dir(dirs.substr(0, colon));
-    if (dir.empty()) dir = ".";
-    const std::string candidate = dir + "/" + name;
-    if (access(candidate.c_str(), X_OK) == 0) return candidate;
-    if (colon == std::string_view::npos) return "";
-    dirs.remove_prefix(colon + 1);
-  }
-}
+inline std::string findTool(const std::string& name) { return pinforge_test::findOnPath(name); }
 
 struct ToolRun {
   int status = -1;     ///< exit code; -1 when the tool could not start or was killed
   std::string output;  ///< standard output and standard error, interleaved
 };
 
-/// Runs `argv` (argv[0] a full path) with standard input from /dev/null, in `workDir` when
-/// one is given. A tool that hangs is killed after `timeoutSeconds` so a broken installation
-/// cannot stall the suite.
+/// Runs `argv` (argv[0] a full path) in `workDir` when one is given.
 inline ToolRun runTool(const std::vector<std::string>& argv, const std::string& workDir = "",
                        unsigned timeoutSeconds = 120) {
-  ToolRun run;
-  std::vector<char*> args;
-  for (const std::string& arg : argv) args.push_back(const_cast<char*>(arg.c_str()));
-  args.push_back(nullptr);
-  int pipeFds[2];
-  if (argv.empty() || pipe2(pipeFds, O_CLOEXEC) != 0) return run;
-  const pid_t pid = fork();
-  if (pid == 0) {
-    const int devNull = open("/dev/null", O_RDONLY);
-    if (devNull < 0 || dup2(devNull, 0) < 0 || dup2(pipeFds[1], 1) < 0 ||
-        dup2(pipeFds[1], 2) < 0 || (!workDir.empty() && chdir(workDir.c_str()) != 0))
-      _exit(127);
-    alarm(timeoutSeconds);
-    execv(args[0], args.data());
-    _exit(127);
-  }
-  close(pipeFds[1]);
-  char buffer[8192];
-  while (pid > 0) {
-    const ssize_t got = read(pipeFds[0], buffer, sizeof buffer);
-    if (got > 0) {
-      run.output.append(buffer, static_cast<size_t>(got));
-    } else if (got == 0 || errno != EINTR) {
-      break;
-    }
-  }
-  close(pipeFds[0]);
-  if (pid < 0) return run;
-  int wstatus = 0;
-  while (waitpid(pid, &wstatus, 0) < 0) {
-    if (errno != EINTR) return run;
-  }
-  run.status = WIFEXITED(wstatus) ? WEXITSTATUS(wstatus) : -1;
-  return run;
+  pinforge_test::RunResult run =
+      pinforge_test::runProgram(argv, workDir, {}, true, timeoutSeconds);
+  return {run.status, std::move(run.out)};
 }
 
 /// `text` in lower case (ASCII only: identifiers are compared, not prose).
@@ -97,56 +50,6 @@ inline std::string firstErrorLine(const std::string& output) {
   pos = pos == std::string::npos ? 0 : output.rfind('\n', pos);
   pos = pos == std::string::npos ? 0 : pos + (output[pos] == '\n' ? 1 : 0);
   return output.substr(pos, output.find('\n', pos) - pos);
-}
-
-/// A private directory removed with its contents when the object goes away.
-class ScratchDir {
- public:
-  ScratchDir() {
-    std::error_code error;
-    std::string pattern =
-        (std::filesystem::temp_directory_path(error) / "pinforge-diff-XXXXXX").string();
-    if (mkdtemp(pattern.data()) != nullptr) m_Path = pattern;
-  }
-  ~ScratchDir() {
-    std::error_code error;
-    if (!m_Path.empty()) std::filesystem::remove_all(m_Path, error);
-  }
-  ScratchDir(const ScratchDir&) = delete;
-  ScratchDir& operator=(const ScratchDir&) = delete;
-
-  /// Empty when the directory could not be created.
-  const std::string& path() const { return m_Path; }
-
- private:
-  std::string m_Path;
-};
-
-struct FileCloser {
-  void operator()(std::FILE* file) const { std::fclose(file); }
-};
-
-inline bool readFile(const std::string& path, std::string& content) {
-  std::unique_ptr<std::FILE, FileCloser> in(std::fopen(path.c_str(), "rb"));
-  if (!in) return false;
-  content.clear();
-  char buffer[8192];
-  size_t got;
-  while ((got = std::fread(buffer, 1, sizeof buffer, in.get())) > 0) content.append(buffer, got);
-  return std::ferror(in.get()) == 0;
-}
-
-inline bool writeFile(const std::string& path, std::string_view content) {
-  std::unique_ptr<std::FILE, FileCloser> out(std::fopen(path.c_str(), "wb"));
-  return out && std::fwrite(content.data(), 1, content.size(), out.get()) == content.size();
-}
-
-/// The repository root: $PINFORGE_SOURCE_DIR when ctest runs the binary, else derived from
-/// where this header lives so the binary also runs by hand.
-inline std::string sourceDir() {
-  const char* fromEnv = std::getenv("PINFORGE_SOURCE_DIR");
-  if (fromEnv != nullptr && *fromEnv != '\0') return fromEnv;
-  return std::filesystem::path(__FILE__).parent_path().parent_path().parent_path().string();
 }
 
 /// The files directly inside tests/fixtures/<language> whose extension is one of
@@ -167,8 +70,8 @@ inline std::vector<std::string> fixtureFiles(const std::string& language,
   return files;
 }
 
-/// A GoogleTest parameter name for a fixture path: its file name with every character that
-/// is not a letter or digit turned into '_'.
+/// A GoogleTest parameter name for a path: its file name with every character that is not a
+/// letter or digit turned into '_'.
 inline std::string fixtureTestName(const std::string& path) {
   std::string name = std::filesystem::path(path).filename().string();
   for (char& c : name)

@@ -1,13 +1,15 @@
 // A private temporary directory for one test, removed with everything in it afterwards, and
-// small whole-file helpers for what a test puts in or finds there.
+// whole-file reads and writes for what a test puts in or finds there.
 #pragma once
 
 #include <stdlib.h>
+#include <sys/stat.h>
 
 #include <cstdio>
 #include <filesystem>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <system_error>
 
 namespace pinforge_test {
@@ -16,6 +18,31 @@ struct FileCloser {
   void operator()(std::FILE* file) const { std::fclose(file); }
 };
 using FilePtr = std::unique_ptr<std::FILE, FileCloser>;
+
+/// The whole file into `content`; false when it cannot be read.
+inline bool readFile(const std::string& path, std::string& content) {
+  FilePtr in(std::fopen(path.c_str(), "rb"));
+  if (!in) return false;
+  content.clear();
+  char buffer[8192];
+  size_t got;
+  while ((got = std::fread(buffer, 1, sizeof buffer, in.get())) > 0) content.append(buffer, got);
+  return std::ferror(in.get()) == 0;
+}
+
+/// The whole file, or "<missing>" when it cannot be read.
+inline std::string readFile(const std::string& path) {
+  std::string content;
+  return readFile(path, content) ? content : "<missing>";
+}
+
+inline bool writeFile(const std::string& path, std::string_view content, bool executable = false) {
+  FilePtr out(std::fopen(path.c_str(), "wb"));
+  if (!out || std::fwrite(content.data(), 1, content.size(), out.get()) != content.size())
+    return false;
+  out.reset();
+  return !executable || chmod(path.c_str(), 0755) == 0;
+}
 
 class ScratchDir {
  public:
@@ -36,27 +63,16 @@ class ScratchDir {
   const std::string& path() const { return m_Path; }
   std::string file(const std::string& name) const { return m_Path + "/" + name; }
 
-  /// Writes `content` to the file `name` inside the directory; false on failure.
-  bool write(const std::string& name, const std::string& content) const {
-    FilePtr out(std::fopen(file(name).c_str(), "wb"));
-    return out && std::fwrite(content.data(), 1, content.size(), out.get()) == content.size();
+  bool write(const std::string& name, std::string_view content, bool executable = false) const {
+    return writeFile(file(name), content, executable);
   }
+  bool makeDir(const std::string& name) const { return mkdir(file(name).c_str(), 0755) == 0; }
   bool exists(const std::string& name) const {
     std::error_code error;
     return std::filesystem::exists(file(name), error);
   }
   /// The whole file, or "<missing>" when it cannot be read.
   std::string read(const std::string& name) const { return readFile(file(name)); }
-
-  static std::string readFile(const std::string& path) {
-    FilePtr in(std::fopen(path.c_str(), "rb"));
-    if (!in) return "<missing>";
-    std::string content;
-    char buffer[4096];
-    size_t got;
-    while ((got = std::fread(buffer, 1, sizeof buffer, in.get())) > 0) content.append(buffer, got);
-    return content;
-  }
 
  private:
   std::string m_Path;

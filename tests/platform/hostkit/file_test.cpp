@@ -4,12 +4,12 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <cstdio>
 #include <cstdlib>
 #include <set>
 #include <string>
 
 #include "platform/hostkit.h"
+#include "support/scratch_dir.h"
 
 namespace {
 
@@ -17,53 +17,38 @@ namespace {
 class FileTest : public testing::Test {
  protected:
   void SetUp() override {
-    char pattern[] = "/tmp/hostkit-test-XXXXXX";
-    ASSERT_NE(::mkdtemp(pattern), nullptr);
-    m_Dir = pattern;
+    ASSERT_FALSE(m_Dir.path().empty());
     const char* saved = std::getenv("TMPDIR");
     m_Saved = saved != nullptr ? saved : "";
-    ::setenv("TMPDIR", (m_Dir + "/").c_str(), 1);
+    ::setenv("TMPDIR", (m_Dir.path() + "/").c_str(), 1);
   }
-  void TearDown() override {
-    ::setenv("TMPDIR", m_Saved.c_str(), 1);
-    EXPECT_EQ(std::system(("rm -rf '" + m_Dir + "'").c_str()), 0);
-  }
-  std::string makeFile(const std::string& name, mode_t mode) {
-    const std::string path = m_Dir + "/" + name;
-    std::FILE* file = std::fopen(path.c_str(), "w");
-    if (file != nullptr) std::fclose(file);
-    EXPECT_EQ(::chmod(path.c_str(), mode), 0);
-    return path;
-  }
-  static bool exists(const std::string& path) { return ::access(path.c_str(), F_OK) == 0; }
+  void TearDown() override { ::setenv("TMPDIR", m_Saved.c_str(), 1); }
 
-  std::string m_Dir;
+  pinforge_test::ScratchDir m_Dir;
   std::string m_Saved;
 };
 
-TEST_F(FileTest, IsFileOnlyForRegularFiles) {
-  const std::string plain = makeFile("plain.txt", 0644);
-  ASSERT_EQ(::symlink(plain.c_str(), (m_Dir + "/link").c_str()), 0);
-  ASSERT_EQ(::symlink("nowhere", (m_Dir + "/dangling").c_str()), 0);
+TEST_F(FileTest, IsFileAndRemovals) {
+  ASSERT_TRUE(m_Dir.write("plain.txt", ""));
+  const std::string plain = m_Dir.file("plain.txt");
+  ASSERT_EQ(::symlink(plain.c_str(), m_Dir.file("link").c_str()), 0);
+  ASSERT_EQ(::symlink("nowhere", m_Dir.file("dangling").c_str()), 0);
   const std::pair<std::string, bool> cases[] = {
-      {plain, true},  {m_Dir + "/link", true},     {m_Dir + "/dangling", false},
-      {m_Dir, false}, {m_Dir + "/missing", false}, {"", false},
+      {plain, true},         {m_Dir.file("link"), true},     {m_Dir.file("dangling"), false},
+      {m_Dir.path(), false}, {m_Dir.file("missing"), false}, {"", false},
   };
   for (const auto& [path, expected] : cases)
     EXPECT_EQ(Host::File::isfile(path.c_str()), expected) << path;
   EXPECT_FALSE(Host::File::isfile(nullptr));
-}
 
-TEST_F(FileTest, RemovalsDeleteTheNamedFile) {
-  const std::string writable = makeFile("w.txt", 0644);
-  EXPECT_TRUE(Host::File::remove(writable.c_str()));
-  EXPECT_FALSE(exists(writable));
-  EXPECT_FALSE(Host::File::remove(writable.c_str()));
-
-  const std::string readOnly = makeFile("r.txt", 0444);
-  EXPECT_TRUE(Host::File::remove_f(readOnly.c_str()));
-  EXPECT_FALSE(exists(readOnly));
-  EXPECT_FALSE(Host::File::remove_f(readOnly.c_str()));
+  EXPECT_TRUE(Host::File::remove(plain.c_str()));
+  EXPECT_FALSE(m_Dir.exists("plain.txt"));
+  EXPECT_FALSE(Host::File::remove(plain.c_str()));
+  ASSERT_TRUE(m_Dir.write("r.txt", ""));
+  ASSERT_EQ(::chmod(m_Dir.file("r.txt").c_str(), 0444), 0);
+  EXPECT_TRUE(Host::File::remove_f(m_Dir.file("r.txt").c_str()));
+  EXPECT_FALSE(m_Dir.exists("r.txt"));
+  EXPECT_FALSE(Host::File::remove_f(m_Dir.file("r.txt").c_str()));
   EXPECT_FALSE(Host::File::remove(nullptr) || Host::File::remove_f(nullptr));
 }
 
@@ -73,9 +58,8 @@ TEST_F(FileTest, TemporaryFilesAreNewUniqueAndCarryTheSuffix) {
     std::string name;
     std::FILE* file = Host::File::createTemporary(".tcl", name);
     ASSERT_NE(file, nullptr);
-    EXPECT_GE(std::fputs("puts hi\n", file), 0);
     std::fclose(file);
-    EXPECT_EQ(Host::FileName(name).GetDirectory().str(), m_Dir);
+    EXPECT_EQ(Host::FileName(name).GetDirectory().str(), m_Dir.path());
     EXPECT_EQ(Host::FileName(name).GetExtension().str(), ".tcl");
     EXPECT_TRUE(Host::File::isfile(name.c_str()));
     names.insert(name);
@@ -83,19 +67,16 @@ TEST_F(FileTest, TemporaryFilesAreNewUniqueAndCarryTheSuffix) {
   EXPECT_EQ(names.size(), 50u);
 
   const Host::StringBase freeName = Host::File::tmpnam(nullptr);
-  EXPECT_EQ(Host::FileName(freeName.str()).GetDirectory().str(), m_Dir);
-  EXPECT_FALSE(exists(freeName.str()));
+  EXPECT_EQ(Host::FileName(freeName.str()).GetDirectory().str(), m_Dir.path());
+  EXPECT_EQ(::access(freeName.c_str(), F_OK), -1);
   EXPECT_NE(freeName.str(), Host::File::tmpnam(nullptr).str());
 
   std::string untouched = "keep";
   EXPECT_EQ(Host::File::createTemporary("/escape", untouched), nullptr);
   EXPECT_EQ(untouched, "keep");
-}
 
-TEST_F(FileTest, TemporaryFilesFailWhenTheDirectoryIsMissing) {
-  ::setenv("TMPDIR", (m_Dir + "/missing").c_str(), 1);
-  std::string name;
-  EXPECT_EQ(Host::File::createTemporary(".x", name), nullptr);
+  ::setenv("TMPDIR", m_Dir.file("missing").c_str(), 1);
+  EXPECT_EQ(Host::File::createTemporary(".x", untouched), nullptr);
   EXPECT_TRUE(Host::File::tmpnam(nullptr).IsEmpty());
 }
 

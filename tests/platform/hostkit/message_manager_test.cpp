@@ -8,7 +8,7 @@
 
 namespace {
 
-TEST(MessageManager, ErrorsGoToStandardError) {
+TEST(MessageManager, ErrorsGoToStandardErrorDebugTextOnlyWhenAskedFor) {
   auto manager = Host_MsgManData::createObject("Mod", "src", 1, "rev");
   ASSERT_NE(manager, nullptr);
   testing::internal::CaptureStdout();
@@ -16,9 +16,7 @@ TEST(MessageManager, ErrorsGoToStandardError) {
   manager->issueError("ERROR: something %s failed\n");
   EXPECT_EQ(testing::internal::GetCapturedStderr(), "ERROR: something %s failed\n");
   EXPECT_EQ(testing::internal::GetCapturedStdout(), "");
-}
 
-TEST(MessageManager, DebugTextOnlyWhenAskedFor) {
   ::unsetenv("PINFORGE_DEBUG_STUB");
   testing::internal::CaptureStderr();
   Host_MsgManData::debugStub("quiet\n");
