@@ -185,6 +185,8 @@ INSTANTIATE_TEST_SUITE_P(
             "A@IFHAS IPORT=x@B@IFHAS IPORT=clk@C@ENDIF@D@ENDIF@E"
             "@IFHAS IPORT=clk@F@IFHAS IPORT=y@G@ENDIF@H@ENDIF@",
             "AEFH", ""},
+        Row{"FailedBlockDropsAllButConditionals", kDesign,
+            "<@IFHAS IPORT=zz@%module%t@FOO@@SET@@ENDITERATE@@ITERATOR@%iport%@ENDIF@>", "<>", ""},
         Row{"MalformedIfInFailedBlockStillNests", kDesign,
             "<@IFHAS IPORT=zz@@IFHAS@@IFNHAS FOO@@ENDIF@@ENDIF@x@ENDIF@>", "<>", ""},
         Row{"BusFoundByNameWhenExpanding", kDesign,
