@@ -2,8 +2,9 @@
 # Reads generated gate-level Verilog netlists (cell instances with escaped names, the wanted
 # top module last with a 500-port non-ANSI header) through a whole pinforge run with a
 # one-line template, and prints the rate and the peak resident memory for each size; two
-# sizes show whether the cost is linear. For comparison the largest file also goes through
-# `yosys -p read_verilog` when yosys is installed.
+# sizes show whether the cost is linear. For comparison the smallest file also goes once
+# through `yosys -p read_verilog` when yosys is installed (on 100 MB yosys needs minutes and
+# gigabytes, which a shared machine cannot spare; its rate per MB is what compares).
 # Usage: sh bench/verilog_bench.sh <pinforge-binary> [megabytes ...]   (default: 10 100)
 set -eu
 if [ "$#" -lt 1 ]; then
@@ -20,7 +21,10 @@ printf '%%module%%\n' > "$out/verilog_one_line.tmpl"
 
 # Best-of-three figures from /usr/bin/time -v reports: wall and CPU seconds, peak RSS in kB.
 summarize() {
-  awk -v bytes="$1" -v label="$2" '
+  bytes=$1
+  label=$2
+  shift 2
+  awk -v bytes="$bytes" -v label="$label" '
     /Elapsed \(wall clock\)/ {
       n = split($NF, part, ":"); s = 0
       for (i = 1; i <= n; i++) s = s * 60 + part[i]
@@ -42,10 +46,10 @@ summarize() {
       printf "%s: %.1f MB netlist: %.2f s wall (%.0f MB/s), %.2f s CPU (%.0f MB/s), peak RSS %.1f MB (limit %.1f MB)%s\n",
         label, bytes / 1e6, bestWall, bytes / 1e6 / bestWall, bestCpu, bytes / 1e6 / bestCpu,
         peak / 1024, limit / 1024, (label == "verilog_bench" && peak > limit ? " OVER LIMIT" : "")
-    }' "$3" "$4" "$5"
+    }' "$@"
 }
 
-last=
+first=
 for mb in $sizes; do
   netlist=$out/verilog_netlist_$mb.v
   python3 "$here/verilog_netlist_gen.py" "$mb" "$netlist"
@@ -64,19 +68,15 @@ for mb in $sizes; do
     exit 1
   fi
   summarize "$bytes" verilog_bench "$out"/verilog_time.1 "$out"/verilog_time.2 "$out"/verilog_time.3
-  [ -n "$last" ] && rm -f "$last"
-  last=$netlist
+  if [ -z "$first" ]; then first=$netlist; else rm -f "$netlist"; fi
 done
 
 if command -v yosys > /dev/null 2>&1; then
-  bytes=$(wc -c < "$last")
-  for round in 1 2 3; do
-    /usr/bin/time -v -o "$out/verilog_yosys.$round" yosys -q -p "read_verilog $last" \
-      > "$out/verilog_yosys.log" 2>&1 || true
-  done
-  summarize "$bytes" "yosys read_verilog" "$out"/verilog_yosys.1 "$out"/verilog_yosys.2 \
-    "$out"/verilog_yosys.3
+  bytes=$(wc -c < "$first")
+  /usr/bin/time -v -o "$out/verilog_yosys.time" yosys -q -p "read_verilog $first" \
+    > "$out/verilog_yosys.log" 2>&1 || true
+  summarize "$bytes" "yosys read_verilog" "$out/verilog_yosys.time"
 else
   echo "verilog_bench: yosys not installed; no comparison"
 fi
-rm -f "$last"
+rm -f "$first"
