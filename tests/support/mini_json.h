@@ -50,17 +50,19 @@ class JsonReader {
   bool parse(JsonValue& out) {
     m_Pos = 0;
     if (!value(out, 0)) return false;
-    skipBlanks();
+    peek();
     return m_Pos == m_Text.size();
   }
 
  private:
   static constexpr int kMaxDepth = 200;
 
-  void skipBlanks() {
-    while (m_Pos < m_Text.size() && (m_Text[m_Pos] == ' ' || m_Text[m_Pos] == '\n' ||
-                                     m_Text[m_Pos] == '\r' || m_Text[m_Pos] == '\t'))
+  /// The next character after blanks, not consumed; '\0' at the end.
+  char peek() {
+    while (m_Pos < m_Text.size() && std::string_view(" \n\r\t").find(m_Text[m_Pos]) !=
+                                        std::string_view::npos)
       ++m_Pos;
+    return m_Pos < m_Text.size() ? m_Text[m_Pos] : '\0';
   }
 
   bool literal(std::string_view word) {
@@ -70,30 +72,19 @@ class JsonReader {
   }
 
   bool value(JsonValue& out, int depth) {
-    if (depth > kMaxDepth) return false;
-    skipBlanks();
-    if (m_Pos >= m_Text.size()) return false;
-    const char c = m_Text[m_Pos];
-    if (c == '{') return object(out, depth);
-    if (c == '[') return array(out, depth);
+    const char c = peek();
+    if (depth > kMaxDepth || c == '\0') return false;
+    if (c == '{' || c == '[') return container(out, c == '{', depth);
     if (c == '"') {
       out.kind = JsonValue::String;
       return string(out.text);
     }
-    if (literal("true")) {
-      out.kind = JsonValue::Bool;
-      out.boolean = true;
-      return true;
-    }
-    if (literal("false")) {
-      out.kind = JsonValue::Bool;
-      return true;
-    }
     if (literal("null")) return true;
-    return number(out);
-  }
-
-  bool number(JsonValue& out) {
+    if (literal("true") || literal("false")) {
+      out.kind = JsonValue::Bool;
+      out.boolean = c == 't';
+      return true;
+    }
     const size_t end = m_Text.find_first_not_of("+-0123456789.eE", m_Pos);
     const std::string digits(m_Text.substr(m_Pos, end - m_Pos));
     char* stop = nullptr;
@@ -111,81 +102,53 @@ class JsonReader {
       if (c == '"') return true;
       if (c != '\\') {
         out += c;
-        continue;
-      }
-      if (m_Pos >= m_Text.size()) return false;
-      const char escaped = m_Text[m_Pos++];
-      switch (escaped) {
-        case 'n': out += '\n'; break;
-        case 't': out += '\t'; break;
-        case 'r': out += '\r'; break;
-        case 'b': out += '\b'; break;
-        case 'f': out += '\f'; break;
-        case 'u': {
-          if (m_Pos + 4 > m_Text.size()) return false;
-          const long code = std::strtol(std::string(m_Text.substr(m_Pos, 4)).c_str(), nullptr, 16);
-          m_Pos += 4;
-          appendUtf8(out, code);
-          break;
+      } else if (m_Pos >= m_Text.size()) {
+        return false;
+      } else if (const char escaped = m_Text[m_Pos++]; escaped != 'u') {
+        const size_t known = std::string_view("ntrbf").find(escaped);
+        out += known == std::string_view::npos ? escaped : "\n\t\r\b\f"[known];
+      } else {
+        if (m_Pos + 4 > m_Text.size()) return false;
+        const long code = std::strtol(std::string(m_Text.substr(m_Pos, 4)).c_str(), nullptr, 16);
+        m_Pos += 4;
+        if (code < 0x80) {
+          out += static_cast<char>(code);
+        } else if (code < 0x800) {
+          out += static_cast<char>(0xC0 | (code >> 6));
+          out += static_cast<char>(0x80 | (code & 0x3F));
+        } else {
+          out += static_cast<char>(0xE0 | (code >> 12));
+          out += static_cast<char>(0x80 | ((code >> 6) & 0x3F));
+          out += static_cast<char>(0x80 | (code & 0x3F));
         }
-        default: out += escaped; break;
       }
     }
     return false;
   }
 
-  static void appendUtf8(std::string& out, long code) {
-    if (code < 0x80) {
-      out += static_cast<char>(code);
-    } else if (code < 0x800) {
-      out += static_cast<char>(0xC0 | (code >> 6));
-      out += static_cast<char>(0x80 | (code & 0x3F));
-    } else {
-      out += static_cast<char>(0xE0 | (code >> 12));
-      out += static_cast<char>(0x80 | ((code >> 6) & 0x3F));
-      out += static_cast<char>(0x80 | (code & 0x3F));
-    }
-  }
-
-  bool array(JsonValue& out, int depth) {
-    out.kind = JsonValue::Array;
+  /// An object ({"name": value, ...}) or an array ([value, ...]).
+  bool container(JsonValue& out, bool object, int depth) {
+    out.kind = object ? JsonValue::Object : JsonValue::Array;
+    const char close = object ? '}' : ']';
     ++m_Pos;
-    skipBlanks();
-    if (m_Pos < m_Text.size() && m_Text[m_Pos] == ']') {
+    if (peek() == close) {
       ++m_Pos;
       return true;
     }
     while (true) {
-      out.items.emplace_back();
-      if (!value(out.items.back(), depth + 1)) return false;
-      skipBlanks();
-      if (m_Pos >= m_Text.size()) return false;
-      const char c = m_Text[m_Pos++];
-      if (c == ']') return true;
-      if (c != ',') return false;
-    }
-  }
-
-  bool object(JsonValue& out, int depth) {
-    out.kind = JsonValue::Object;
-    ++m_Pos;
-    skipBlanks();
-    if (m_Pos < m_Text.size() && m_Text[m_Pos] == '}') {
+      JsonValue* item = nullptr;
+      if (object) {
+        out.members.emplace_back();
+        if (peek() != '"' || !string(out.members.back().name) || peek() != ':') return false;
+        ++m_Pos;
+        item = &out.members.back().value;
+      } else {
+        item = &out.items.emplace_back();
+      }
+      if (!value(*item, depth + 1)) return false;
+      const char c = peek();
       ++m_Pos;
-      return true;
-    }
-    while (true) {
-      skipBlanks();
-      if (m_Pos >= m_Text.size() || m_Text[m_Pos] != '"') return false;
-      out.members.emplace_back();
-      if (!string(out.members.back().name)) return false;
-      skipBlanks();
-      if (m_Pos >= m_Text.size() || m_Text[m_Pos++] != ':') return false;
-      if (!value(out.members.back().value, depth + 1)) return false;
-      skipBlanks();
-      if (m_Pos >= m_Text.size()) return false;
-      const char c = m_Text[m_Pos++];
-      if (c == '}') return true;
+      if (c == close) return true;
       if (c != ',') return false;
     }
   }
