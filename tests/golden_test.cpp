@@ -25,11 +25,15 @@ const std::string kMissing = "<missing>";
 
 std::string goldenRoot() { return sourceDir() + "/tests/golden"; }
 
+// Holds the designs several cases run on; it is not a case itself.
+const std::string kSharedDesigns = "designs";
+
 std::vector<std::string> goldenCases() {
   std::vector<std::string> cases;
   std::error_code error;
   for (const fs::directory_entry& entry : fs::directory_iterator(goldenRoot(), error))
-    if (entry.is_directory(error)) cases.push_back(entry.path().filename().string());
+    if (entry.is_directory(error) && entry.path().filename() != kSharedDesigns)
+      cases.push_back(entry.path().filename().string());
   std::sort(cases.begin(), cases.end());
   return cases;
 }
@@ -53,16 +57,24 @@ TEST_P(GoldenTest, MatchesExpectations) {
   for (const std::string& tool : words(caseFile("requires")))
     if (findOnPath(tool).empty()) GTEST_SKIP() << tool << " is not installed";
 
-  // Everything but the files that describe the case takes part in the run.
-  const std::set<std::string> control = {"args", "requires", "expect", "expect.stdout",
-                                         "expect.stderr", "expect.status"};
+  // The shared designs the case names come first, so that its own files can replace them;
+  // everything but the files that describe the case takes part in the run.
+  const std::set<std::string> control = {"args",          "requires",      "designs", "expect",
+                                         "expect.stdout", "expect.stderr", "expect.status"};
   ScratchDir work;
   std::error_code error;
-  for (const fs::directory_entry& entry : fs::directory_iterator(caseDir, error)) {
-    if (control.count(entry.path().filename().string()) != 0) continue;
-    fs::copy(entry.path(), fs::path(work.path()) / entry.path().filename(),
-             fs::copy_options::recursive, error);
-    ASSERT_FALSE(error) << entry.path();
+  std::vector<fs::path> sources;
+  for (const std::string& design : words(caseFile("designs")))
+    sources.push_back(fs::path(goldenRoot()) / kSharedDesigns / design);
+  sources.push_back(caseDir);
+  for (const fs::path& source : sources) {
+    ASSERT_TRUE(fs::is_directory(source, error)) << source << " does not exist";
+    for (const fs::directory_entry& entry : fs::directory_iterator(source, error)) {
+      if (control.count(entry.path().filename().string()) != 0) continue;
+      fs::copy(entry.path(), fs::path(work.path()) / entry.path().filename(),
+               fs::copy_options::recursive | fs::copy_options::overwrite_existing, error);
+      ASSERT_FALSE(error) << entry.path();
+    }
   }
   const RunResult run = runPinforge(words(argsText), work.path());
   ASSERT_TRUE(run.started);
