@@ -6,16 +6,11 @@
 # the cost of a single large expansion.
 # Usage: sh bench/expand_bench.sh <pinforge-binary> [buses] [bits-per-bus]
 set -eu
-if [ "$#" -lt 1 ]; then
-  echo "usage: sh bench/expand_bench.sh <pinforge-binary> [buses] [bits-per-bus]" >&2
-  exit 2
-fi
-pinforge=$1
+here=$(cd "$(dirname "$0")" && pwd)
+. "$here/lib.sh"
+bench_start "[buses] [bits-per-bus]" "$@"
 buses=${2:-1000}
 bits=${3:-1000}
-here=$(cd "$(dirname "$0")" && pwd)
-out=$here/out
-mkdir -p "$out"
 
 entity() {
   awk -v n="$1" -v w="$2" 'BEGIN {

@@ -5,15 +5,10 @@
 # Times are CPU seconds (user + system) of pinforge, which a busy machine disturbs less than
 # wall-clock time. Usage: sh bench/ports_bench.sh <pinforge-binary> [ports]
 set -eu
-if [ "$#" -lt 1 ]; then
-  echo "usage: sh bench/ports_bench.sh <pinforge-binary> [ports]" >&2
-  exit 2
-fi
-pinforge=$1
-ports=${2:-100000}
 here=$(cd "$(dirname "$0")" && pwd)
-out=$here/out
-mkdir -p "$out"
+. "$here/lib.sh"
+bench_start "[ports]" "$@"
+ports=${2:-100000}
 
 awk -v n="$ports" -f "$here/ports_gen.awk" > "$out/ports_bench.vhd"
 printf '%%module%%\n' > "$out/ports_baseline.tmpl"

@@ -4,15 +4,10 @@
 # time and the rate in MB of template read per second.
 # Usage: sh bench/template_text_bench.sh <pinforge-binary> [lines]
 set -eu
-if [ "$#" -lt 1 ]; then
-  echo "usage: sh bench/template_text_bench.sh <pinforge-binary> [lines]" >&2
-  exit 2
-fi
-pinforge=$1
-lines=${2:-1000000}
 here=$(cd "$(dirname "$0")" && pwd)
-out=$here/out
-mkdir -p "$out"
+. "$here/lib.sh"
+bench_start "[lines]" "$@"
+lines=${2:-1000000}
 
 cat > "$out/text_bench.vhd" <<'VHDL'
 entity text_bench is
