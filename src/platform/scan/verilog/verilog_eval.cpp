@@ -76,55 +76,43 @@ bool Evaluator::integer(const Expr& expr, Scope& scope, int64_t& out) {
   return evaluate(expr, scope, value) && toInteger(value, out);
 }
 
-Parameter* Evaluator::findParameter(const std::string& name, Scope& scope, Scope*& owner,
-                                    int depth) {
+// Parameters and functions resolve alike: the scope itself, a named import, the packages of
+// wildcard imports (without following their own imports), then the compilation unit.
+template <typename Map>
+typename Map::mapped_type* Evaluator::findInScopes(const std::string& name, Scope& scope,
+                                                   Map Scope::*members, Scope*& owner,
+                                                   int depth) {
   if (depth > 8) return nullptr;
-  auto it = scope.parameters.find(name);
-  if (it != scope.parameters.end()) {
+  auto it = (scope.*members).find(name);
+  if (it != (scope.*members).end()) {
     owner = &scope;
     return &it->second;
   }
   auto named = scope.namedImports.find(name);
   if (named != scope.namedImports.end())
     if (Scope* package = m_Scopes.package(named->second))
-      if (Parameter* found = findParameter(name, *package, owner, depth + 1)) return found;
+      if (auto* found = findInScopes(name, *package, members, owner, depth + 1)) return found;
   for (const std::string& packageName : scope.wildcardImports)
     if (Scope* package = m_Scopes.package(packageName)) {
-      auto local = package->parameters.find(name);
-      if (local != package->parameters.end()) {
+      auto local = (package->*members).find(name);
+      if (local != (package->*members).end()) {
         owner = package;
         return &local->second;
       }
     }
   if (!scope.isCompilationUnit)
     if (Scope* unit = m_Scopes.compilationUnit())
-      return findParameter(name, *unit, owner, depth + 1);
+      return findInScopes(name, *unit, members, owner, depth + 1);
   return nullptr;
 }
 
-Function* Evaluator::findFunction(const std::string& name, Scope& scope, Scope*& owner,
-                                  int depth) {
-  if (depth > 8) return nullptr;
-  auto it = scope.functions.find(name);
-  if (it != scope.functions.end()) {
-    owner = &scope;
-    return it->second.get();
-  }
-  auto named = scope.namedImports.find(name);
-  if (named != scope.namedImports.end())
-    if (Scope* package = m_Scopes.package(named->second))
-      if (Function* found = findFunction(name, *package, owner, depth + 1)) return found;
-  for (const std::string& packageName : scope.wildcardImports)
-    if (Scope* package = m_Scopes.package(packageName)) {
-      auto local = package->functions.find(name);
-      if (local != package->functions.end()) {
-        owner = package;
-        return local->second.get();
-      }
-    }
-  if (!scope.isCompilationUnit)
-    if (Scope* unit = m_Scopes.compilationUnit()) return findFunction(name, *unit, owner, depth + 1);
-  return nullptr;
+Parameter* Evaluator::findParameter(const std::string& name, Scope& scope, Scope*& owner) {
+  return findInScopes(name, scope, &Scope::parameters, owner);
+}
+
+Function* Evaluator::findFunction(const std::string& name, Scope& scope, Scope*& owner) {
+  std::shared_ptr<Function>* found = findInScopes(name, scope, &Scope::functions, owner);
+  return found ? found->get() : nullptr;
 }
 
 const TypeSpec* Evaluator::findType(const std::string& package, const std::string& name,

@@ -42,8 +42,11 @@ class Evaluator {
   bool toInteger(const Value& value, int64_t& out);
   bool fail(std::string text);
 
-  Parameter* findParameter(const std::string& name, Scope& scope, Scope*& owner, int depth = 0);
-  Function* findFunction(const std::string& name, Scope& scope, Scope*& owner, int depth = 0);
+  Parameter* findParameter(const std::string& name, Scope& scope, Scope*& owner);
+  Function* findFunction(const std::string& name, Scope& scope, Scope*& owner);
+  template <typename Map>
+  typename Map::mapped_type* findInScopes(const std::string& name, Scope& scope,
+                                          Map Scope::*members, Scope*& owner, int depth = 0);
 
   ScopeProvider& m_Scopes;
   std::string m_Error;

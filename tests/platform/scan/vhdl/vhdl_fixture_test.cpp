@@ -21,19 +21,23 @@ struct UnitCase {
 const std::vector<std::pair<std::string, std::string>> kPackageFiles = {
     {"work", "cfg_pkg.vhd"}, {"mylib", "lib_pkg.vhd"}, {"work", "pkg_user.vhd"}};
 
+// The ports of entity basic in basic.vhd, wherever that file is registered.
+const std::vector<Port> kBasicPorts = {
+    scalar("clk", "std_logic", 1, 12), scalar("RST_n", "std_logic", 1, 12),
+    ranged("data_in", "std_logic_vector", 1, 13, 7, "downto", 0),
+    ranged("data_out", "std_logic_vector", 2, 14, 0, "to", 7),
+    ranged("bidir", "std_logic_vector", 3, 15, 7, "downto", 0),
+    ranged("buf", "unsigned", 4, 16, 16, "downto", -2), scalar("lnk", "bit", 5, 17),
+    scalar("nomode", "std_logic", 1, 18), ranged("cnt", "integer", 2, 19, 0, "to", 255),
+    ranged("nat", "natural", 1, 20, 0, "to", 31),
+    ranged("sel", "std_logic_vector", 1, 21, 3, "downto", 0), scalar("flag", "boolean", 2, 22),
+    ranged("ops", "bit_vector", 1, 23, 3, "downto", 5)};
+
 const UnitCase kCases[] = {
     {"modes_generics_and_operators",
      {{"work", "basic.vhd"}},
      "BASIC",
-     {scalar("clk", "std_logic", 1, 12), scalar("RST_n", "std_logic", 1, 12),
-      ranged("data_in", "std_logic_vector", 1, 13, 7, "downto", 0),
-      ranged("data_out", "std_logic_vector", 2, 14, 0, "to", 7),
-      ranged("bidir", "std_logic_vector", 3, 15, 7, "downto", 0),
-      ranged("buf", "unsigned", 4, 16, 16, "downto", -2), scalar("lnk", "bit", 5, 17),
-      scalar("nomode", "std_logic", 1, 18), ranged("cnt", "integer", 2, 19, 0, "to", 255),
-      ranged("nat", "natural", 1, 20, 0, "to", 31),
-      ranged("sel", "std_logic_vector", 1, 21, 3, "downto", 0), scalar("flag", "boolean", 2, 22),
-      ranged("ops", "bit_vector", 1, 23, 3, "downto", 5)}},
+     kBasicPorts},
     {"entity_without_ports", {{"work", "basic.vhd"}}, "empty_ports", {}},
     {"packages_subtypes_attributes_and_functions",
      kPackageFiles,
@@ -93,15 +97,7 @@ const UnitCase kCases[] = {
     {"library_other_than_work_is_searched",
      {{"mylib", "basic.vhd"}},
      "basic",
-     {scalar("clk", "std_logic", 1, 12), scalar("RST_n", "std_logic", 1, 12),
-      ranged("data_in", "std_logic_vector", 1, 13, 7, "downto", 0),
-      ranged("data_out", "std_logic_vector", 2, 14, 0, "to", 7),
-      ranged("bidir", "std_logic_vector", 3, 15, 7, "downto", 0),
-      ranged("buf", "unsigned", 4, 16, 16, "downto", -2), scalar("lnk", "bit", 5, 17),
-      scalar("nomode", "std_logic", 1, 18), ranged("cnt", "integer", 2, 19, 0, "to", 255),
-      ranged("nat", "natural", 1, 20, 0, "to", 31),
-      ranged("sel", "std_logic_vector", 1, 21, 3, "downto", 0), scalar("flag", "boolean", 2, 22),
-      ranged("ops", "bit_vector", 1, 23, 3, "downto", 5)}},
+     kBasicPorts},
 };
 
 class FixturePorts : public testing::TestWithParam<UnitCase> {};
