@@ -22,7 +22,10 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     size_t end = at;
     while (end < text.size() && (std::isalnum(static_cast<unsigned char>(text[end])) || text[end] == '_'))
       ++end;
-    if (reader.selectUnit("work", std::string_view(text).substr(at, end - at))) reader.readPorts();
+    if (reader.selectUnit("work", std::string_view(text).substr(at, end - at))) {
+      scan::UnitDescription unit;
+      reader.readUnit(unit);
+    }
   }
   return 0;
 }

@@ -20,7 +20,9 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     if (unit.kind == scan::vhdl::UnitKind::Entity) entities.push_back(unit.name);
   for (const std::string& name : entities) {
     if (!reader.selectUnit("work", name)) continue;
-    ScanPortList ports(reader.readPorts());
+    scan::UnitDescription unit;
+    reader.readUnit(unit);
+    ScanPortList ports(std::move(unit.ports));
     for (const ScanPort* p = ports.firstPort(); p != nullptr; p = ports.nextPort(p))
       if (p->name() == nullptr || p->typeName() == nullptr) __builtin_trap();
   }

@@ -1,6 +1,7 @@
 // The extractor keeps the registered files per library and hands them to the reader of the
 // run's language; lookups walk the libraries in search order.
 #include <algorithm>
+#include <cctype>
 
 #include "platform/scan.h"
 #include "platform/scan/common/diagnostics.h"
@@ -43,15 +44,19 @@ void ScanExtractor::addDesignFile(const char* library, const char* file, Languag
 int ScanExtractor::Parse(Language language) {
   // Files are read in command-line order across libraries: Verilog macros persist from
   // file to file in that order.
-  m_Reader = language == Verilog ? scan::makeVerilogReader(*m_Diagnostics)
-                                 : scan::makeVhdlReader(*m_Diagnostics);
+  m_Language = language;
+  m_Reader = language == Verilog ? scan::makeVerilogReader(*m_Diagnostics, m_Settings)
+                                 : scan::makeVhdlReader(*m_Diagnostics, m_Settings);
   m_Reader->indexFiles(m_Files);
   return static_cast<int>(m_Diagnostics->errorCount());
 }
 
 int ScanExtractor::findDesignUnit(const char* library, const char* unit, DesignUnitSearch search) {
   m_UnitFound = false;
+  m_UnitErrors = false;
   m_Ports.reset();
+  m_Generics.clear();
+  m_Context.clear();
   if (!m_Reader || unit == nullptr) return 1;
   std::string wanted = library ? library : "work";
   std::vector<std::string> order{wanted};
@@ -68,8 +73,35 @@ int ScanExtractor::findDesignUnit(const char* library, const char* unit, DesignU
 }
 
 ScanPortList* ScanExtractor::getPorts() {
-  if (!m_Ports)
-    m_Ports = std::make_unique<ScanPortList>(m_UnitFound ? m_Reader->readPorts()
-                                                         : std::vector<ScanPort>{});
+  if (!m_Ports) {
+    scan::UnitDescription unit;
+    if (m_UnitFound) m_UnitErrors = !m_Reader->readUnit(unit);
+    m_Generics = std::move(unit.generics);
+    m_Context = std::move(unit.context);
+    m_Ports = std::make_unique<ScanPortList>(std::move(unit.ports));
+  }
   return m_Ports.get();
+}
+
+std::vector<ScanUnitInfo> ScanExtractor::listUnits() const {
+  return m_Reader ? m_Reader->listUnits() : std::vector<ScanUnitInfo>{};
+}
+
+std::vector<std::string> ScanExtractor::unknownOverrides() const {
+  // VHDL names ignore case; Verilog names do not.
+  auto same = [this](const std::string& a, const std::string& b) {
+    if (a.size() != b.size()) return false;
+    for (size_t i = 0; i < a.size(); ++i) {
+      const auto x = static_cast<unsigned char>(a[i]), y = static_cast<unsigned char>(b[i]);
+      if (m_Language == Vhdl ? std::tolower(x) != std::tolower(y) : x != y) return false;
+    }
+    return true;
+  };
+  std::vector<std::string> unknown;
+  for (const auto& [name, value] : m_Settings.genericOverrides) {
+    bool found = false;
+    for (const ScanGeneric& generic : m_Generics) found = found || same(name, generic.name);
+    if (!found) unknown.push_back(name);
+  }
+  return unknown;
 }

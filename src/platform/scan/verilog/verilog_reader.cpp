@@ -67,14 +67,17 @@ bool VerilogReader::selectUnit(std::string_view library, std::string_view unit) 
   return true;
 }
 
-std::vector<ScanPort> VerilogReader::readPorts() {
-  if (!m_Selected) return {};
+std::vector<ScanUnitInfo> VerilogReader::listUnits() const { return {}; }
+
+bool VerilogReader::readUnit(UnitDescription& unit) {
+  if (!m_Selected) return true;
   UnitModel model;
   UnitReader reader(m_Diagnostics, m_Macros, *m_Sources);
   reader.readUnit(*m_Selected, model);
   Evaluator evaluator(*this);
   LineCounter lines;
-  return buildPorts(model, evaluator, *m_Index, m_Diagnostics, lines);
+  unit.ports = buildPorts(model, evaluator, *m_Index, m_Diagnostics, lines);
+  return true;
 }
 
 Scope* VerilogReader::package(const std::string& name) {
@@ -108,7 +111,8 @@ Scope* VerilogReader::compilationUnit() {
 
 namespace scan {
 
-std::unique_ptr<LanguageReader> makeVerilogReader(Diagnostics& diagnostics) {
+std::unique_ptr<LanguageReader> makeVerilogReader(Diagnostics& diagnostics,
+                                                  const ScanSettings&) {
   return std::make_unique<verilog::VerilogReader>(diagnostics);
 }
 

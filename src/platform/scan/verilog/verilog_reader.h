@@ -24,7 +24,8 @@ class VerilogReader final : public LanguageReader, private ScopeProvider {
   /// Indexes in-memory text as the next file of the compilation unit (fuzzing, tests).
   void indexText(std::string path, std::string text, const std::string& library);
   bool selectUnit(std::string_view library, std::string_view unit) override;
-  std::vector<ScanPort> readPorts() override;
+  bool readUnit(UnitDescription& unit) override;
+  std::vector<ScanUnitInfo> listUnits() const override;
 
  private:
   Scope* package(const std::string& name) override;

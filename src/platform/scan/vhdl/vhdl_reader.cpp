@@ -9,7 +9,7 @@
 
 namespace scan {
 
-std::unique_ptr<LanguageReader> makeVhdlReader(Diagnostics& diagnostics) {
+std::unique_ptr<LanguageReader> makeVhdlReader(Diagnostics& diagnostics, const ScanSettings&) {
   return std::make_unique<vhdl::VhdlReader>(diagnostics);
 }
 
@@ -70,9 +70,11 @@ bool VhdlReader::selectUnit(std::string_view library, std::string_view unit) {
   return m_Selected != nullptr;
 }
 
-std::vector<ScanPort> VhdlReader::readPorts() {
-  std::vector<ScanPort> ports;
-  if (m_Selected == nullptr) return ports;
+std::vector<ScanUnitInfo> VhdlReader::listUnits() const { return {}; }
+
+bool VhdlReader::readUnit(UnitDescription& unit) {
+  std::vector<ScanPort>& ports = unit.ports;
+  if (m_Selected == nullptr) return true;
   UnitScope* scope = m_Design.entity(*m_Selected);
   const SourceBuffer& source = *scope->source;
   LineCounter lines(source.text());
@@ -117,7 +119,7 @@ std::vector<ScanPort> VhdlReader::readPorts() {
     }
     ports.push_back(std::move(port));
   }
-  return ports;
+  return true;
 }
 
 }  // namespace vhdl

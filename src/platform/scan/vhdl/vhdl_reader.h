@@ -23,7 +23,8 @@ class VhdlReader final : public LanguageReader {
   /// Indexes text already in memory as part of `library`.
   void indexSource(std::unique_ptr<SourceBuffer> source, std::string_view library);
   bool selectUnit(std::string_view library, std::string_view unit) override;
-  std::vector<ScanPort> readPorts() override;
+  bool readUnit(UnitDescription& unit) override;
+  std::vector<ScanUnitInfo> listUnits() const override;
 
   const DesignIndex& index() const { return m_Index; }
 

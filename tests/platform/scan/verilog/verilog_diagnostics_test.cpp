@@ -41,7 +41,9 @@ ReadResult readText(const std::string& text, const char* unit = "m") {
     scan::verilog::VerilogReader reader(diagnostics);
     reader.indexText("t.v", text, "work");
     result.found = reader.selectUnit("work", unit);
-    if (result.found) result.ports = reader.readPorts();
+    scan::UnitDescription description;
+    if (result.found) reader.readUnit(description);
+    result.ports = std::move(description.ports);
   }
   result.messages = headLines(sink);
   std::fclose(sink);
@@ -203,7 +205,9 @@ TEST(VerilogIncludeTest, IncludeCycleIsAnError) {
     scan::Diagnostics diagnostics(sink, 1000);
     scan::verilog::VerilogReader reader(diagnostics);
     reader.indexFiles({{"work", dir + "/top.v"}});
-    if (reader.selectUnit("work", "m")) ports = reader.readPorts().size();
+    scan::UnitDescription description;
+    if (reader.selectUnit("work", "m") && (reader.readUnit(description), true))
+      ports = description.ports.size();
   }
   std::vector<std::string> messages = headLines(sink);
   std::fclose(sink);

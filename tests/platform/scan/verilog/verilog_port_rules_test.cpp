@@ -29,7 +29,9 @@ std::vector<std::string> portsOf(const std::vector<std::string>& files, const ch
   for (const std::string& text : files) reader.indexText("f" + std::to_string(n++) + ".sv", text, "work");
   std::vector<std::string> out;
   if (!reader.selectUnit("work", unit)) return {"not found"};
-  for (const ScanPort& port : reader.readPorts()) out.push_back(describe(port));
+  scan::UnitDescription description;
+  reader.readUnit(description);
+  for (const ScanPort& port : description.ports) out.push_back(describe(port));
   return out;
 }
 

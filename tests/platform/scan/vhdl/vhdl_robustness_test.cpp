@@ -25,7 +25,9 @@ Outcome read(const std::string& text, const std::string& unit) {
   reader.indexSource(scan::SourceBuffer::fromText("t.vhd", text), "work");
   Outcome o;
   o.found = reader.selectUnit("work", unit);
-  if (o.found) o.ports = reader.readPorts();
+  scan::UnitDescription description;
+  if (o.found) reader.readUnit(description);
+  o.ports = std::move(description.ports);
   o.errors = diagnostics.errorCount();
   o.warnings = diagnostics.warningCount();
   return o;

@@ -26,7 +26,9 @@ std::string portsOf(const std::vector<File>& files, const char* unit) {
                        files[i].library);
   if (!reader.selectUnit("work", unit)) return "?";
   std::string out;
-  for (const ScanPort& p : reader.readPorts()) {
+  scan::UnitDescription description;
+  reader.readUnit(description);
+  for (const ScanPort& p : description.ports) {
     if (!out.empty()) out += ' ';
     out += p.name();
     if (!p.hasRange()) continue;
