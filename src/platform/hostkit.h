@@ -121,6 +121,24 @@ class Process {
                   unsigned flags, bool hideWindow, bool captureOutput, bool detach);
 };
 
+/// What an interrupted run leaves behind. Once installed, SIGINT, SIGTERM and SIGHUP stop
+/// the registered child process group (SIGTERM, then SIGKILL after a short grace), wait for
+/// it, remove the registered files, and end the process with the signal's own status.
+/// Registration is cheap and safe to call at any time from the main thread.
+class Interrupt {
+ public:
+  /// Installs the handlers; later calls do nothing.
+  static void install();
+  /// Removes `path` if a signal arrives before forget(path). At most kMaxFiles at once;
+  /// returns false when the table is full or the path is too long.
+  static bool removeOnSignal(std::string_view path);
+  static void forget(std::string_view path);
+  /// The process group of a running child, stopped on a signal; 0 for none.
+  static void setChildGroup(long processGroup);
+
+  static constexpr int kMaxFiles = 4;
+};
+
 }  // namespace Host
 
 /// Time: the standard time, local-time and formatted-time functions.
