@@ -75,10 +75,10 @@ UnitScope* Design::parse(const UnitRecord& record) {
   Parser parser(*scope->source, record.offset, scope->arena, m_Diagnostics);
   if (record.kind == UnitKind::Entity) {
     std::vector<Decl> ports;
-    parser.parseEntityHeader(scope->decls, ports);
+    scope->parseFailed = !parser.parseEntityHeader(scope->decls, ports);
     for (Decl& port : ports) scope->decls.push_back(std::move(port));
   } else {
-    parser.parsePackage(scope->decls);
+    scope->parseFailed = !parser.parsePackage(scope->decls);
   }
   scope->indexDecls();
   expandUses(*scope, record.uses);

@@ -329,15 +329,33 @@ bool Evaluator::evalUnary(const EvalContext& c, const Expr& e, Value& out) {
   return failWith("cannot evaluate " + quoted(text));
 }
 
-bool Evaluator::evalBinary(const EvalContext& c, const Expr& e, Value& out) {
-  Value a;
-  Value b;
-  if (!eval(c, e.a, a)) return false;
+// A left-associative chain (a+b+c+...) is walked down its left operands and folded back up
+// in a loop, so its length costs no evaluation depth.
+bool Evaluator::evalBinary(const EvalContext& c, const Expr& top, Value& out) {
+  std::vector<const Expr*> chain{&top};
+  for (;;) {
+    const Expr& left = c.unit->arena[static_cast<size_t>(chain.back()->a)];
+    if (left.kind != ExprKind::Binary) break;
+    chain.push_back(&left);
+  }
+  Value value;
+  if (!eval(c, chain.back()->a, value)) return false;
+  for (auto it = chain.rbegin(); it != chain.rend(); ++it) {
+    Value next;
+    if (!applyBinary(c, **it, value, next)) return false;
+    value = std::move(next);
+  }
+  out = std::move(value);
+  return true;
+}
+
+bool Evaluator::applyBinary(const EvalContext& c, const Expr& e, const Value& a, Value& out) {
   // Short-circuit forms, as VHDL evaluates them.
   if ((e.op == Op::And || e.op == Op::Or) && a.isBoolean() && a.asBoolean() == (e.op == Op::Or)) {
     out = a;
     return true;
   }
+  Value b;
   if (!eval(c, e.b, b)) return false;
   std::string_view text = c.unit->source->text().substr(e.begin, e.end - e.begin);
   if (a.isInteger() && b.isInteger()) {

@@ -71,6 +71,8 @@ class Evaluator {
   bool evalAttribute(const EvalContext& c, const Expr& e, Value& out);
   bool evalUnary(const EvalContext& c, const Expr& e, Value& out);
   bool evalBinary(const EvalContext& c, const Expr& e, Value& out);
+  /// `a op e.b` for the binary expression `e`, its left operand already evaluated to `a`.
+  bool applyBinary(const EvalContext& c, const Expr& e, const Value& a, Value& out);
   bool evalRange(const EvalContext& c, ExprId id, RangeValue& out);
   bool constantValue(UnitScope* unit, Decl& decl, Value& out);
   bool foundValue(const Found& f, std::string_view name, Value& out);

@@ -172,7 +172,7 @@ Token Lexer::nextAtStatementStart() {
       continue;
     }
     // A delimiter: only a quote needs care, for the tick ambiguity.
-    if (c == '\'' && !tickFollows() && p + 2 < m_End && p[2] == '\'') {
+    if (c == '\'' && !tickFollows() && p + 2 < m_End && p[2] == '\'' && p[1] != '\0') {
       m_Cursor += 3;
     } else {
       ++m_Cursor;
@@ -246,7 +246,7 @@ Token Lexer::next() {
       return invalid(start, "stray character");
   }
   if (c == '\'') {
-    if (!tickFollows() && m_Cursor + 2 < m_End && m_Cursor[2] == '\'') {
+    if (!tickFollows() && m_Cursor + 2 < m_End && m_Cursor[2] == '\'' && m_Cursor[1] != '\0') {
       m_Cursor += 3;
       return make(TokenKind::Character, start);
     }
@@ -303,8 +303,11 @@ Token Lexer::lexNumber(const char* start) {
   return make(TokenKind::Number, start);
 }
 
+// A NUL byte inside quotes is no graphic character; the token still ends at its closing
+// quote so that lexing resumes in step with the text.
 Token Lexer::lexQuoted(const char* start, TokenKind kind) {
   ++m_Cursor;  // opening quote
+  bool nul = false;
   for (;;) {
     char c = *m_Cursor;
     if (c == '"') {
@@ -313,15 +316,17 @@ Token Lexer::lexQuoted(const char* start, TokenKind kind) {
         continue;
       }
       ++m_Cursor;
-      return make(kind, start);
+      return nul ? invalid(start, "NUL byte in a string literal") : make(kind, start);
     }
     if (c == '\n' || m_Cursor >= m_End) return invalid(start, "unterminated string literal");
+    nul = nul || c == '\0';
     ++m_Cursor;
   }
 }
 
 Token Lexer::lexExtended(const char* start) {
   ++m_Cursor;
+  bool nul = false;
   for (;;) {
     char c = *m_Cursor;
     if (c == '\\') {
@@ -330,9 +335,11 @@ Token Lexer::lexExtended(const char* start) {
         continue;
       }
       ++m_Cursor;
-      return make(TokenKind::Extended, start);
+      return nul ? invalid(start, "NUL byte in an extended identifier")
+                 : make(TokenKind::Extended, start);
     }
     if (c == '\n' || m_Cursor >= m_End) return invalid(start, "unterminated extended identifier");
+    nul = nul || c == '\0';
     ++m_Cursor;
   }
 }

@@ -47,7 +47,10 @@ const Token& Parser::peek(size_t ahead) {
   while (m_Buffered <= ahead) {
     Token t = m_Lexer.next();
     if (t.kind == TokenKind::Invalid) {
-      if (!m_Failed) fail(t.offset, t.error);
+      // The index pass already reported the lexical errors of indexed files; saying it
+      // again here would print every such error twice.
+      if (m_ReportLexical) fail(t.offset, t.error);
+      m_Failed = true;
       t = Token{TokenKind::End, {}, t.offset, nullptr};
     }
     m_Ahead[m_Buffered++] = t;
@@ -196,6 +199,13 @@ bool Parser::parseEntityHeader(std::vector<Decl>& generics, std::vector<Decl>& p
 bool Parser::parseInterfaceList(std::vector<Decl>& out, DeclKind kind) {
   if (!expect('(')) return false;
   for (;;) {
+    // A declaration is complete only at the ';' or ')' after it: one cut short is dropped,
+    // so a truncated header never invents objects.
+    size_t first = out.size();
+    auto dropGroup = [&] {
+      out.resize(first);
+      return false;
+    };
     if (peekWord("type") || peekWord("function") || peekWord("procedure") ||
         peekWord("impure") || peekWord("pure") || peekWord("package")) {
       // Generic subprograms and packages carry no bounds for ports; ports of a generic type
@@ -220,9 +230,11 @@ bool Parser::parseInterfaceList(std::vector<Decl>& out, DeclKind kind) {
     } else {
       acceptWord("constant") || acceptWord("signal") || acceptWord("variable") ||
           acceptWord("file");
-      size_t first = out.size();
       for (;;) {
-        if (!isName(peek())) return failHere("expected an interface name");
+        if (!isName(peek())) {
+          failHere("expected an interface name");
+          return dropGroup();
+        }
         Token name = take();
         Decl d;
         d.kind = kind;
@@ -232,7 +244,7 @@ bool Parser::parseInterfaceList(std::vector<Decl>& out, DeclKind kind) {
         out.push_back(std::move(d));
         if (!accept(',')) break;
       }
-      if (!expect(':')) return false;
+      if (!expect(':')) return dropGroup();
       Mode mode = Mode::In;
       if (acceptWord("in")) mode = Mode::In;
       else if (acceptWord("out")) mode = Mode::Out;
@@ -240,12 +252,12 @@ bool Parser::parseInterfaceList(std::vector<Decl>& out, DeclKind kind) {
       else if (acceptWord("buffer")) mode = Mode::Buffer;
       else if (acceptWord("linkage")) mode = Mode::Linkage;
       SubtypeIndication subtype;
-      if (!parseSubtypeIndication(subtype)) return false;
+      if (!parseSubtypeIndication(subtype)) return dropGroup();
       acceptWord("bus");
       ExprId init = kNoExpr;
       if (acceptSymbol(":=")) {
         init = parseExpression();
-        if (init == kNoExpr) return false;
+        if (init == kNoExpr) return dropGroup();
       }
       for (size_t i = first; i < out.size(); ++i) {
         out[i].mode = mode;
@@ -260,7 +272,7 @@ bool Parser::parseInterfaceList(std::vector<Decl>& out, DeclKind kind) {
       }
       continue;
     }
-    return expect(')');
+    return expect(')') || dropGroup();
   }
 }
 
@@ -515,7 +527,9 @@ ExprId Parser::binary(Op op, ExprId a, ExprId b) {
   e.b = b;
   e.begin = m_Arena[a].begin;
   e.end = m_Arena[b].end;
-  e.depth = static_cast<uint16_t>(std::max(m_Arena[a].depth, m_Arena[b].depth) + 1);
+  // Only real nesting counts: the evaluator walks a left operand chain (a+b+c+...) in a
+  // loop, so a long flat chain is no deeper than its deepest right operand.
+  e.depth = std::max(m_Arena[a].depth, static_cast<uint16_t>(m_Arena[b].depth + 1));
   return add(std::move(e));
 }
 

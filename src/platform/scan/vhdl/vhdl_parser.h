@@ -28,6 +28,10 @@ class Parser {
   Parser(const SourceBuffer& source, size_t offset, ExprArena& arena,
          Diagnostics& diagnostics);
 
+  /// Report lexical errors as they are met. Without this the parser only fails on them, for
+  /// text the index pass has already read and reported.
+  void reportLexicalErrors() { m_ReportLexical = true; }
+
   /// `entity name is [generic (...);] [port (...);]`. False after a reported syntax error;
   /// what was read before it is kept.
   bool parseEntityHeader(std::vector<Decl>& generics, std::vector<Decl>& ports);
@@ -89,6 +93,7 @@ class Parser {
   size_t m_LastEnd = 0;
   int m_Depth = 0;
   bool m_Failed = false;
+  bool m_ReportLexical = false;
   bool m_WarnOnly = false;  // subprogram bodies: unsupported code is not a design error
 };
 

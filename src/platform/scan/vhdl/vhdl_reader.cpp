@@ -119,7 +119,7 @@ bool VhdlReader::readUnit(UnitDescription& unit) {
     }
     ports.push_back(std::move(port));
   }
-  return true;
+  return !scope->parseFailed;
 }
 
 }  // namespace vhdl

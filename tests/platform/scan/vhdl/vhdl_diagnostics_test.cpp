@@ -1,6 +1,8 @@
 // The messages users see for bad or unusual input: exact text, file, line and column.
 #include <gtest/gtest.h>
 
+#include <fstream>
+
 #include "vhdl_test_support.h"
 
 namespace {
@@ -75,6 +77,61 @@ TEST_P(Messages, AreReported) {
 
 INSTANTIATE_TEST_SUITE_P(Vhdl, Messages, testing::ValuesIn(kCases),
                          [](const testing::TestParamInfo<MessageCase>& info) {
+                           return std::string(info.param.label);
+                         });
+
+// Lexical errors are met by the index pass and again when the selected header is parsed; the
+// user must see each once. Any error in the header breaks it, and a declaration cut short
+// is dropped rather than reported as a port of no type.
+struct HeaderErrorCase {
+  const char* label;
+  std::string text;
+  const char* message;
+};
+
+const HeaderErrorCase kHeaderErrors[] = {
+    {"stray_character", "entity e is port (a : in bit; $ b : out bit); end;\n",
+     "t.vhd:1:31: error: stray character"},
+    {"unterminated_string", "entity e is generic (S : string := \"ab\n); port (a : in bit); end;\n",
+     "t.vhd:1:36: error: unterminated string literal"},
+    {"unterminated_comment", "entity e is port (a : in bit; /* b : out bit); end;\n",
+     "t.vhd:1:31: error: unterminated block comment"},
+    {"nul_in_a_string", std::string("entity e is generic (S : string := \"a\0b\"); end;\n", 48),
+     "t.vhd:1:36: error: NUL byte in a string literal"},
+    {"unterminated_based_literal", "entity e is port (a : in bit_vector(16#F downto 0)); end;\n",
+     "t.vhd:1:37: error: unterminated based literal"},
+    {"port_cut_short_after_its_name", "entity e is port (a : in bit; b",
+     "t.vhd:1:32: error: expected ':', found the end of the file"},
+};
+
+class HeaderErrors : public testing::TestWithParam<HeaderErrorCase> {};
+
+TEST_P(HeaderErrors, ArePrintedOnceAndBreakTheHeader) {
+  const HeaderErrorCase& c = GetParam();
+  std::string path = testing::TempDir() + "/t.vhd";
+  std::ofstream(path, std::ios::binary) << c.text;
+  testing::internal::CaptureStderr();
+  bool broken = false;
+  {
+    ScanExtractor extractor;
+    extractor.addDesignFile("work", path.c_str(), ScanExtractor::Vhdl);
+    extractor.Parse(ScanExtractor::Vhdl);
+    ASSERT_EQ(extractor.findDesignUnit("work", "e", ScanExtractor::SearchAllLibraries), 0);
+    extractor.getPorts();
+    broken = extractor.unitHasErrors();
+  }
+  std::string messages = testing::internal::GetCapturedStderr();
+  size_t first = messages.find(c.message);
+  ASSERT_NE(first, std::string::npos) << messages;
+  EXPECT_EQ(messages.find(c.message, first + 1), std::string::npos) << messages;
+  EXPECT_EQ(messages.find(": error: ", messages.find(": error: ") + 1), std::string::npos)
+      << messages;
+  EXPECT_EQ(messages.find("type ''"), std::string::npos) << messages;
+  EXPECT_TRUE(broken);
+}
+
+INSTANTIATE_TEST_SUITE_P(Vhdl, HeaderErrors, testing::ValuesIn(kHeaderErrors),
+                         [](const testing::TestParamInfo<HeaderErrorCase>& info) {
                            return std::string(info.param.label);
                          });
 

@@ -14,6 +14,7 @@ namespace {
 
 struct Outcome {
   bool found = false;
+  bool headerSound = false;  ///< what readUnit returned
   std::vector<ScanPort> ports;
   size_t errors = 0;
   size_t warnings = 0;
@@ -26,7 +27,7 @@ Outcome read(const std::string& text, const std::string& unit) {
   Outcome o;
   o.found = reader.selectUnit("work", unit);
   scan::UnitDescription description;
-  if (o.found) reader.readUnit(description);
+  if (o.found) o.headerSound = reader.readUnit(description);
   o.ports = std::move(description.ports);
   o.errors = diagnostics.errorCount();
   o.warnings = diagnostics.warningCount();
@@ -65,10 +66,15 @@ struct HostileCase {
   std::function<std::string()> text;
   const char* unit;
   bool found;
+  bool headerSound;    ///< readUnit's verdict on the selected unit's header
   size_t ports;
   size_t errors;       ///< exact error count
   size_t rangedPorts;  ///< ports that still got a range
 };
+
+std::string withNul(const std::string& before, const std::string& after) {
+  return before + std::string(1, '\0') + after;
+}
 
 const HostileCase kCases[] = {
     {"nested_parentheses_in_a_bound",
@@ -76,43 +82,66 @@ const HostileCase kCases[] = {
        return "entity e is port (a : in bit_vector(" + repeat("(", 100000) + "1" +
               repeat(")", 100000) + " downto 0)); end;";
      },
-     "e", true, 1, 1, 0},
+     "e", true, false, 0, 1, 0},
     {"nested_parentheses_in_a_body",
      [] {
        return "entity e is port (a : in bit); end;\narchitecture a of e is begin x <= " +
               repeat("(", 100000) + "1" + repeat(")", 100000) + "; end;";
      },
-     "e", true, 1, 0, 0},
-    {"operator_chain",
+     "e", true, true, 1, 0, 0},
+    {"flat_operator_chain_is_no_nesting",
      [] { return "entity e is port (a : in bit_vector(" + repeat("1+", 100000) + "1 downto 0)); end;"; },
-     "e", true, 1, 1, 0},
+     "e", true, true, 1, 0, 1},
     {"huge_identifier",
      [] {
        return "entity " + std::string(4 << 20, 'n') + " is port (" + std::string(1 << 20, 'p') +
               " : in bit_vector(1 downto 0)); end;\nentity e is port (b : in bit); end;";
      },
-     "e", true, 1, 0, 0},
+     "e", true, true, 1, 0, 0},
     {"self_recursive_function_and_constant",
      [] {
        return std::string(kPackage) +
               "entity e is port (a : in bit_vector(forever(1) downto 0);\n"
               "  b : in bit_vector(SELF downto 0); c : in bit_vector(count(9) downto 0)); end;";
      },
-     "e", true, 3, 0, 1},
+     "e", true, true, 3, 0, 1},
     {"loop_over_the_whole_integer_range",
      [] {
        return std::string(kPackage) +
               "entity e is port (a : in bit_vector(count(integer'high - 1) downto 0)); end;";
      },
-     "e", true, 1, 0, 0},
-    {"unterminated_block_comment",
+     "e", true, true, 1, 0, 0},
+    {"unterminated_block_comment_after_the_unit",
      [] { return "entity e is port (a : in bit); end;\n/* entity f is end;"; },
-     "e", true, 1, 1, 0},
-    {"unterminated_string_resumes_on_next_line",
+     "e", true, true, 1, 1, 0},
+    {"unterminated_block_comment_swallows_ports",
+     [] { return "entity e is port (a : in bit; /* b : out bit); end;"; },
+     "e", true, false, 1, 1, 0},
+    {"unterminated_string_in_another_unit",
      [] { return "entity e is generic (S : string := \"abc\n); port (a : in bit); end;\nentity f is port (b : out bit); end;"; },
-     "f", true, 1, 1, 0},
-    {"header_cut_short", [] { return std::string("entity e is port (a : in bit_vector(7 downto"); }, "e",
-     true, 1, 1, 0},
+     "f", true, true, 1, 1, 0},
+    {"unterminated_string_in_the_generic_clause",
+     [] { return "entity e is generic (S : string := \"abc\n); port (a : in bit); end;"; },
+     "e", true, false, 0, 1, 0},
+    {"nul_byte_between_ports",
+     [] { return withNul("entity e is port (a : in bit;", " b : out bit); end;"); },
+     "e", true, false, 1, 1, 0},
+    {"nul_byte_in_a_string_default",
+     [] { return withNul("entity e is generic (S : string := \"a", "b\"); port (a : in bit); end;"); },
+     "e", true, false, 0, 1, 0},
+    {"nul_byte_in_another_unit",
+     [] { return withNul("entity f is port (a : in bit;", " b : out bit); end;\nentity e is port (c : in bit); end;"); },
+     "e", true, true, 1, 1, 0},
+    {"header_cut_short_in_a_range", [] { return std::string("entity e is port (a : in bit_vector(7 downto"); }, "e",
+     true, false, 0, 1, 0},
+    {"header_cut_short_in_a_name", [] { return std::string("entity e is port (a : in bit; wi"); }, "e",
+     true, false, 1, 1, 0},
+    {"header_cut_short_in_a_mode", [] { return std::string("entity e is port (a : in bit; outpu : ou"); }, "e",
+     true, false, 1, 1, 0},
+    {"syntax_error_in_the_port_clause", [] { return std::string("entity e is port (a : in bit;; b : out bit); end;"); }, "e",
+     true, false, 1, 1, 0},
+    {"error_after_the_header", [] { return std::string("entity e is port (a : in bit); begin $ end;"); }, "e",
+     true, true, 1, 1, 0},
 };
 
 class Hostile : public testing::TestWithParam<HostileCase> {};
@@ -121,6 +150,7 @@ TEST_P(Hostile, FinishesWithDiagnostics) {
   const HostileCase& c = GetParam();
   Outcome o = read(c.text(), c.unit);
   EXPECT_EQ(o.found, c.found);
+  EXPECT_EQ(o.headerSound, c.headerSound);
   EXPECT_EQ(o.ports.size(), c.ports);
   EXPECT_EQ(o.errors, c.errors);
   size_t ranged = 0;
@@ -132,6 +162,22 @@ INSTANTIATE_TEST_SUITE_P(Vhdl, Hostile, testing::ValuesIn(kCases),
                          [](const testing::TestParamInfo<HostileCase>& info) {
                            return std::string(info.param.label);
                          });
+
+TEST(VhdlRobustness, FlatSumsOfAnyLengthEvaluate) {
+  for (size_t terms : {500u, 1001u, 20000u}) {
+    std::string sum = repeat("1 + ", terms - 1) + "1";
+    Outcome o = read("package p is constant N : natural := " + sum +
+                         "; end package;\nuse work.p.all;\n"
+                         "entity e is port (a : in bit_vector(" + sum + " downto N - N)); end;",
+                     "e");
+    ASSERT_EQ(o.ports.size(), 1u) << terms;
+    int32_t left = 0;
+    int32_t right = 0;
+    o.ports[0].getBounds(left, right);
+    EXPECT_EQ(left, static_cast<int32_t>(terms)) << terms;
+    EXPECT_EQ(o.warnings + o.errors, 0u) << terms;
+  }
+}
 
 const char* kSample =
     "library ieee; use ieee.std_logic_1164.all;\n"
