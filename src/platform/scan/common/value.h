@@ -3,11 +3,15 @@
 #pragma once
 
 #include <cstdint>
+#include <memory>
 #include <optional>
 #include <string>
 #include <variant>
+#include <vector>
 
 namespace scan {
+
+struct Composite;
 
 class Value {
  public:
@@ -16,17 +20,20 @@ class Value {
   static Value real(double v) { return Value(v); }
   static Value boolean(bool v) { return Value(v); }
   static Value string(std::string v) { return Value(std::move(v)); }
+  static Value composite(Composite v);
 
   bool isNone() const { return m_Data.index() == 0; }
   bool isInteger() const { return std::holds_alternative<int64_t>(m_Data); }
   bool isReal() const { return std::holds_alternative<double>(m_Data); }
   bool isBoolean() const { return std::holds_alternative<bool>(m_Data); }
   bool isString() const { return std::holds_alternative<std::string>(m_Data); }
+  bool isComposite() const { return std::holds_alternative<std::shared_ptr<const Composite>>(m_Data); }
 
   int64_t asInteger() const { return std::get<int64_t>(m_Data); }
   double asReal() const { return std::get<double>(m_Data); }
   bool asBoolean() const { return std::get<bool>(m_Data); }
   const std::string& asString() const { return std::get<std::string>(m_Data); }
+  const Composite& asComposite() const { return *std::get<std::shared_ptr<const Composite>>(m_Data); }
 
   /// An integer, or a boolean as 0/1; nothing for reals, strings and none.
   std::optional<int64_t> toInteger() const;
@@ -36,8 +43,23 @@ class Value {
  private:
   template <typename T>
   explicit Value(T v) : m_Data(std::move(v)) {}
-  std::variant<std::monostate, int64_t, double, bool, std::string> m_Data;
+  std::variant<std::monostate, int64_t, double, bool, std::string,
+               std::shared_ptr<const Composite>>
+      m_Data;
 };
+
+/// An array or record value. An array keeps its index range's left bound and direction; a
+/// record keeps its field names (normalized), one per element.
+struct Composite {
+  std::vector<Value> elements;
+  std::vector<std::string> fields;
+  int64_t left = 0;
+  bool ascending = true;
+};
+
+inline Value Value::composite(Composite v) {
+  return Value(std::shared_ptr<const Composite>(std::make_shared<Composite>(std::move(v))));
+}
 
 /// Checked integer arithmetic: false on overflow (or division by zero), result untouched.
 bool checkedAdd(int64_t a, int64_t b, int64_t& result);

@@ -27,10 +27,11 @@ enum class ExprKind : uint8_t {
   Unary,      ///< op a
   Binary,     ///< a op b
   Range,      ///< a to|downto b
-  Box,        ///< <> of an unconstrained index
+  Box,        ///< <> of an unconstrained index; a is the index subtype
   Open,       ///< open
   Others,     ///< others
-  Aggregate,  ///< (args): the elements of a positional aggregate, else none
+  Aggregate,  ///< (args): the elements in order, each an expression or a Named
+  Named,      ///< choices => a, the choices in args
 };
 
 enum class Op : uint8_t {
@@ -70,7 +71,7 @@ enum class Mode : uint8_t { In = 1, Out = 2, Inout = 3, Buffer = 4, Linkage = 5 
 
 enum class DeclKind : uint8_t {
   Constant, Generic, Port, Variable, Subtype, ArrayType, RangeType, EnumType, EnumLiteral,
-  RecordType, OtherType, Function,
+  RecordType, OtherType, Function, Alias,
 };
 
 /// One named declaration of a package, entity header or subprogram.
@@ -81,9 +82,11 @@ struct Decl {
   size_t offset = 0;
   Mode mode = Mode::In;
   SubtypeIndication subtype;       ///< objects, subtypes; element type of arrays
-  ExprId init = kNoExpr;           ///< default or initial value
+  ExprId init = kNoExpr;           ///< default or initial value; the aliased name of an alias
   std::vector<ExprId> indexRanges; ///< array types: one discrete range per dimension
   ExprId range = kNoExpr;          ///< range types
+  std::vector<std::string> fieldKeys;          ///< record types: normalized field names
+  std::vector<SubtypeIndication> fieldTypes;   ///< record types: one per field
   int64_t position = 0;            ///< enumeration literals; literal count of enum types
   size_t parameterCount = 0;       ///< functions
   size_t bodyOffset = 0;           ///< functions with a body: offset of `function`

@@ -62,8 +62,14 @@ bool Evaluator::eval(const EvalContext& c, ExprId id, Value& out) {
       return evalCall(c, e, out);
     case ExprKind::Attribute:
       return evalAttribute(c, e, out);
-    case ExprKind::Qualified:
-      return eval(c, e.b, out);
+    case ExprKind::Qualified: {
+      const Expr& mark = c.unit->arena[static_cast<size_t>(e.a)];
+      SubtypeIndication type;
+      if (mark.kind == ExprKind::Name) type.typeMark = {mark.text};
+      return evalAs(c, e.b, c.unit, &type, out);
+    }
+    case ExprKind::Aggregate:
+      return evalAggregate(c, e, nullptr, out);
     case ExprKind::Unary:
       return evalUnary(c, e, out);
     case ExprKind::Binary:
@@ -92,7 +98,20 @@ Evaluator::Found Evaluator::pick(UnitScope* unit, const std::string& key, size_t
   }
   f.unit = unit;
   f.decl = &unit->decls[chosen];
-  return f;
+  return followAlias(f, arity);
+}
+
+// An alias stands for what it names. One that names no declaration (a predefined type, a
+// record field) is kept: its target is evaluated or looked up by name where it is used.
+Evaluator::Found Evaluator::followAlias(Found f, size_t arity) {
+  constexpr int kMaxAliasChain = 32;
+  if (f.decl == nullptr || f.decl->kind != DeclKind::Alias) return f;
+  if (m_AliasHops >= kMaxAliasChain) return f;
+  ++m_AliasHops;
+  const Expr& target = f.unit->arena[static_cast<size_t>(f.decl->init)];
+  Found named = resolve(EvalContext{f.unit, nullptr}, target, arity);
+  --m_AliasHops;
+  return named ? named : f;
 }
 
 Evaluator::Found Evaluator::lookup(const EvalContext& c, const std::string& key, size_t arity) {
@@ -176,7 +195,7 @@ bool Evaluator::constantValue(UnitScope* unit, Decl& decl, Value& out) {
   decl.state = Decl::State::Busy;
   bool ok = false;
   if (decl.init != kNoExpr) {
-    ok = eval(EvalContext{unit, nullptr}, decl.init, out);
+    ok = evalAs(EvalContext{unit, nullptr}, decl.init, unit, &decl.subtype, out);
   } else if (decl.kind == DeclKind::Constant && unit->record->kind == UnitKind::Package) {
     UnitScope* body = m_Design.bodyOf(*unit);
     Found full = body ? pick(body, decl.key, kAnyArity) : Found{};
@@ -214,12 +233,16 @@ bool Evaluator::foundValue(const Found& f, std::string_view name, Value& out) {
       return true;
     case DeclKind::Function:
       return callFunction(f.unit, *f.decl, {}, out);
+    case DeclKind::Alias:
+      return eval(EvalContext{f.unit, nullptr}, f.decl->init, out);
     default:
       return failWith(quoted(name) + " is not a constant");
   }
 }
 
 bool Evaluator::evalName(const EvalContext& c, const Expr& e, Value& out) {
+  if (e.kind == ExprKind::Selected && isValuePrefix(c, c.unit->arena[static_cast<size_t>(e.a)]))
+    return selectField(c, e, out);
   Found f = resolve(c, e, kAnyArity);
   if (f.decl != nullptr && f.decl->kind == DeclKind::Function) f = resolve(c, e, 0);
   if (f) return foundValue(f, e.text, out);
@@ -245,9 +268,12 @@ bool Evaluator::evalCall(const EvalContext& c, const Expr& e, Value& out) {
   const Expr& prefix = c.unit->arena[static_cast<size_t>(e.a)];
   std::string_view text = c.unit->source->text().substr(prefix.begin, prefix.end - prefix.begin);
   Found f = resolve(c, prefix, e.args.size());
-  if (f.decl != nullptr && isObjectDecl(f.decl->kind)) return evalIndexed(c, f, e, out);
-  if (f.local != nullptr)
-    return failWith("indexing " + quoted(text) + " is not supported in bounds");
+  if (f.local != nullptr || (f.decl != nullptr && (isObjectDecl(f.decl->kind) ||
+                                                   f.decl->kind == DeclKind::Alias)) ||
+      (!f && prefix.kind != ExprKind::Name && isValuePrefix(c, prefix))) {
+    Value array;
+    return eval(c, e.a, array) && indexValue(c, e, array, out);
+  }
   std::vector<Value> args(e.args.size());
   for (size_t i = 0; i < e.args.size(); ++i)
     if (!eval(c, e.args[i], args[i])) return false;
@@ -268,26 +294,6 @@ bool Evaluator::evalCall(const EvalContext& c, const Expr& e, Value& out) {
   if (callBuiltinFunction(prefix.key, args, out, known)) return true;
   if (known) return failWith("invalid arguments to " + quoted(text));
   return failWith(quoted(text) + " is not declared");
-}
-
-// A constant table given by a positional aggregate, indexed by one constant expression.
-bool Evaluator::evalIndexed(const EvalContext& c, const Found& f, const Expr& call, Value& out) {
-  std::string_view text = c.unit->source->text().substr(call.begin, call.end - call.begin);
-  Decl& decl = *f.decl;
-  const Expr* init = decl.init == kNoExpr ? nullptr : &f.unit->arena[static_cast<size_t>(decl.init)];
-  if (decl.kind != DeclKind::Constant || init == nullptr || init->kind != ExprKind::Aggregate ||
-      init->args.empty() || call.args.size() != 1)
-    return failWith("indexing " + quoted(text) + " is not supported in bounds");
-  Value index;
-  RangeValue r;
-  if (!eval(c, call.args[0], index) || !declRange(f.unit, decl, r)) return false;
-  if (!index.isInteger()) return failWith("the index in " + quoted(text) + " is not an integer");
-  int64_t i = index.asInteger();
-  int64_t position = r.ascending ? i - r.left : r.left - i;
-  if (i < r.low() || i > r.high() || position < 0 ||
-      position >= static_cast<int64_t>(init->args.size()))
-    return failWith("the index in " + quoted(text) + " is out of range");
-  return eval(EvalContext{f.unit, nullptr}, init->args[static_cast<size_t>(position)], out);
 }
 
 // ---- operators ----

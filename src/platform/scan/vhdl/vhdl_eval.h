@@ -63,11 +63,37 @@ class Evaluator {
   };
   static constexpr size_t kAnyArity = static_cast<size_t>(-1);
 
+  /// What an aggregate's target type tells about its elements and bounds.
+  struct TargetType {
+    const Decl* record = nullptr;         ///< a record type: its fields
+    UnitScope* recordUnit = nullptr;
+    bool constrained = false;             ///< an array with known bounds
+    RangeValue bounds;
+    bool indexed = false;                 ///< an unconstrained array with a known index subtype
+    RangeValue index;
+    const SubtypeIndication* element = nullptr;  ///< array element subtype, when known
+    UnitScope* elementUnit = nullptr;
+  };
+
   bool failWith(std::string reason);
+  /// Evaluates `id` as a value of `subtype` (written in `typeUnit`): aggregates take their
+  /// bounds and field names from it. A null subtype evaluates without a target.
+  bool evalAs(const EvalContext& c, ExprId id, UnitScope* typeUnit,
+              const SubtypeIndication* subtype, Value& out);
+  bool describeType(UnitScope* unit, const SubtypeIndication& subtype, TargetType& out, int depth);
+  bool evalAggregate(const EvalContext& c, const Expr& e, const TargetType* type, Value& out);
+  bool evalRecordAggregate(const EvalContext& c, const Expr& e, const TargetType& type,
+                           Value& out);
+  bool evalElement(const EvalContext& c, ExprId id, const TargetType* type, Value& out);
+  bool indexValue(const EvalContext& c, const Expr& call, const Value& array, Value& out);
+  /// True when `prefix` names a value (an object, a call or a field of one) rather than a
+  /// package, so `prefix.name` selects a record field.
+  bool isValuePrefix(const EvalContext& c, const Expr& prefix);
+  bool selectField(const EvalContext& c, const Expr& e, Value& out);
+  bool evalImage(const EvalContext& c, const Expr& e, Value& out);
   bool eval(const EvalContext& c, ExprId id, Value& out);
   bool evalName(const EvalContext& c, const Expr& e, Value& out);
   bool evalCall(const EvalContext& c, const Expr& e, Value& out);
-  bool evalIndexed(const EvalContext& c, const Found& f, const Expr& call, Value& out);
   bool evalAttribute(const EvalContext& c, const Expr& e, Value& out);
   bool evalUnary(const EvalContext& c, const Expr& e, Value& out);
   bool evalBinary(const EvalContext& c, const Expr& e, Value& out);
@@ -80,6 +106,7 @@ class Evaluator {
   Found lookup(const EvalContext& c, const std::string& key, size_t arity);
   Found pick(UnitScope* unit, const std::string& key, size_t arity);
   Found resolve(const EvalContext& c, const Expr& nameExpr, size_t arity);
+  Found followAlias(Found f, size_t arity);
   Found resolveMark(const EvalContext& c, const std::vector<std::string_view>& typeMark);
 
   bool typeRange(const EvalContext& c, const std::vector<std::string_view>& typeMark,
@@ -87,6 +114,7 @@ class Evaluator {
   bool declRange(UnitScope* unit, Decl& decl, RangeValue& out);
   bool subtypeRange(const EvalContext& c, const SubtypeIndication& s, RangeValue& out);
   bool prefixRange(const EvalContext& c, const Expr& prefix, RangeValue& out);
+  bool compositeRange(const Value& array, std::string_view name, RangeValue& out);
   Shape shapeOfDecl(UnitScope* unit, const Decl& decl, RangeValue& out, const Expr*& failed,
                     int depth);
 
@@ -104,6 +132,7 @@ class Evaluator {
   std::string m_Reason;
   int m_Depth = 0;
   int m_Calls = 0;
+  int m_AliasHops = 0;
   uint64_t m_Steps = 0;
 };
 

@@ -114,19 +114,43 @@ bool Evaluator::declRange(UnitScope* unit, Decl& decl, RangeValue& out) {
           decl.init == kNoExpr)
         return false;
       m_Reason = saved;
-      if (!constantValue(unit, decl, v) || !v.isString()) return false;
+      if (!constantValue(unit, decl, v)) return false;
+      if (v.isComposite()) return compositeRange(v, decl.name, out);
+      if (!v.isString()) return false;
       int64_t n = static_cast<int64_t>(v.asString().size());
       bool isString = !decl.subtype.typeMark.empty() &&
                       equalsWord(decl.subtype.typeMark.back(), "string");
       out = isString ? RangeValue{1, n, true} : RangeValue{0, n - 1, true};
       return true;
     }
+    case DeclKind::Alias: {
+      const Expr& target = unit->arena[static_cast<size_t>(decl.init)];
+      if (target.kind == ExprKind::Name && builtinRange(target.key, out)) return true;
+      Value v;
+      if (!eval(c, decl.init, v)) return false;
+      if (v.isComposite()) return compositeRange(v, decl.name, out);
+      return failWith(quoted(decl.name) + " has no range");
+    }
     default:
       return failWith(quoted(decl.name) + " has no range");
   }
 }
 
+bool Evaluator::compositeRange(const Value& v, std::string_view name, RangeValue& out) {
+  const Composite& a = v.asComposite();
+  if (!a.fields.empty()) return failWith("record " + quoted(name) + " has no range");
+  int64_t n = static_cast<int64_t>(a.elements.size());
+  out = RangeValue{a.left, a.ascending ? a.left + n - 1 : a.left - n + 1, a.ascending};
+  return true;
+}
+
 bool Evaluator::prefixRange(const EvalContext& c, const Expr& prefix, RangeValue& out) {
+  if (prefix.kind == ExprKind::Selected && isValuePrefix(c, c.unit->arena[static_cast<size_t>(prefix.a)])) {
+    Value v;
+    if (!selectField(c, prefix, v)) return false;
+    if (v.isComposite()) return compositeRange(v, prefix.text, out);
+    return failWith(quoted(sourceText(c, prefix)) + " has no range");
+  }
   if (prefix.kind != ExprKind::Name && prefix.kind != ExprKind::Selected) {
     // A qualified array aggregate or string: its bounds follow from its length.
     Value v;
@@ -138,6 +162,7 @@ bool Evaluator::prefixRange(const EvalContext& c, const Expr& prefix, RangeValue
   }
   Found f = resolve(c, prefix, static_cast<size_t>(-1));
   if (f.local != nullptr) {
+    if (f.local->isComposite()) return compositeRange(*f.local, prefix.text, out);
     if (f.local->isString()) {
       out = RangeValue{0, static_cast<int64_t>(f.local->asString().size()) - 1, true};
       return true;
@@ -153,13 +178,15 @@ bool Evaluator::prefixRange(const EvalContext& c, const Expr& prefix, RangeValue
 bool Evaluator::evalAttribute(const EvalContext& c, const Expr& e, Value& out) {
   const Expr& prefix = c.unit->arena[static_cast<size_t>(e.a)];
   const std::string& attribute = e.key;
+  if (attribute == "image") return evalImage(c, e, out);
   if (attribute == "pos" || attribute == "val" || attribute == "succ" || attribute == "pred") {
     Value v;
     if (e.args.size() != 1 || !eval(c, e.args[0], v)) return false;
     if (v.isString() && v.asString().size() == 1)  // a character's position is its code
       v = Value::integer(static_cast<unsigned char>(v.asString()[0]));
-    if (!v.isInteger()) return failWith("cannot evaluate " + quoted(sourceText(c, e)));
-    int64_t n = v.asInteger();
+    std::optional<int64_t> position = v.toInteger();
+    if (!position) return failWith("cannot evaluate " + quoted(sourceText(c, e)));
+    int64_t n = *position;
     if (attribute == "succ" && !checkedAdd(n, 1, n)) return failWith("integer overflow");
     if (attribute == "pred" && !checkedSub(n, 1, n)) return failWith("integer overflow");
     out = Value::integer(n);
@@ -218,6 +245,15 @@ Evaluator::Shape Evaluator::shapeOfDecl(UnitScope* unit, const Decl& decl, Range
     case DeclKind::RecordType:
     case DeclKind::OtherType:
       return Shape::Scalar;
+    case DeclKind::Alias: {  // of a predefined type: the aliases of declared ones were followed
+      const Expr& target = unit->arena[static_cast<size_t>(decl.init)];
+      switch (builtinShape(target.kind == ExprKind::Name ? target.key : std::string())) {
+        case BuiltinShape::Scalar: return Shape::Scalar;
+        case BuiltinShape::UnconstrainedArray: return Shape::Unconstrained;
+        case BuiltinShape::NotBuiltin: return Shape::Unknown;
+      }
+      return Shape::Unknown;
+    }
     default:
       return Shape::Unknown;
   }

@@ -44,15 +44,22 @@ bool Evaluator::callFunction(UnitScope* unit, Decl& decl, const std::vector<Valu
     else if (fn->parameters[i].init == kNoExpr)
       return failWith("missing argument " + quoted(fn->parameters[i].name) + " to " +
                       quoted(decl.name));
-    else if (!eval(outer, fn->parameters[i].init, frame.parameters[i]))
+    else if (!evalAs(outer, fn->parameters[i].init, bodyUnit, &fn->parameters[i].subtype,
+                     frame.parameters[i]))
       return false;
   }
   EvalContext c{bodyUnit, &frame};
   for (size_t i = 0; i < fn->locals.size(); ++i) {
     const Decl& local = fn->locals[i];
+    if (local.kind == DeclKind::Alias) {
+      // An alias of an object is read once, as a constant; one of a type has no value.
+      std::string saved = m_Reason;
+      if (!eval(c, local.init, frame.locals[i])) m_Reason = saved;
+      continue;
+    }
     if (local.kind != DeclKind::Variable && local.kind != DeclKind::Constant) continue;
     if (local.init != kNoExpr) {
-      if (!eval(c, local.init, frame.locals[i])) return false;
+      if (!evalAs(c, local.init, bodyUnit, &local.subtype, frame.locals[i])) return false;
       continue;
     }
     // Without an initial value a scalar variable starts at its type's left bound.

@@ -384,6 +384,7 @@ bool Parser::parseDeclaration(std::vector<Decl>& out) {
   if (peekWord("type")) return parseTypeDeclaration(out);
   if (peekWord("function") || peekWord("procedure") || peekWord("pure") || peekWord("impure"))
     return parseSubprogram(out);
+  if (peekWord("alias")) return parseAlias(out);
   if (peekWord("component")) return skipToEndOf("component");
   if (peekWord("package")) {  // nested package or package instance
     take();
@@ -393,6 +394,30 @@ bool Parser::parseDeclaration(std::vector<Decl>& out) {
     return !m_Failed;
   }
   skipPast(';');
+  return !m_Failed;
+}
+
+// `alias name [: subtype] is name [signature];`. Aliases of operators and character
+// literals are skipped: no bound can name them.
+bool Parser::parseAlias(std::vector<Decl>& out) {
+  take();  // alias
+  if (!isName(peek())) {
+    skipPast(';');
+    return !m_Failed;
+  }
+  Token name = take();
+  Decl d;
+  d.kind = DeclKind::Alias;
+  d.key = normalizeName(name.text);
+  d.name = name.text;
+  d.offset = name.offset;
+  if (accept(':') && !parseSubtypeIndication(d.subtype)) return false;
+  if (!expectWord("is")) return false;
+  if (!isName(peek())) return failHere("expected the aliased name");
+  d.init = parseName();
+  if (d.init == kNoExpr) return false;
+  out.push_back(std::move(d));
+  skipPast(';');  // a signature of a subprogram alias
   return !m_Failed;
 }
 
@@ -451,8 +476,21 @@ bool Parser::parseTypeDeclaration(std::vector<Decl>& out) {
   }
   if (acceptWord("record")) {
     d.kind = DeclKind::RecordType;
+    while (!acceptWord("end")) {
+      size_t first = d.fieldKeys.size();
+      do {
+        if (!isName(peek())) return failHere("expected a field name");
+        d.fieldKeys.push_back(normalizeName(take().text));
+      } while (accept(','));
+      SubtypeIndication subtype;
+      if (!expect(':') || !parseSubtypeIndication(subtype) || !expect(';')) return false;
+      d.fieldTypes.resize(first);
+      d.fieldTypes.resize(d.fieldKeys.size(), subtype);
+    }
     out.push_back(std::move(d));
-    return skipToEndOf("record");
+    if (!expectWord("record")) return false;
+    if (isName(peek())) take();
+    return expect(';');
   }
   if (acceptWord("protected")) {
     out.push_back(std::move(d));
@@ -563,6 +601,7 @@ ExprId Parser::parseDiscreteRange() {
     if (peek().isSymbol("<>")) {
       Expr e;
       e.kind = ExprKind::Box;
+      e.a = left;
       e.begin = m_Arena[left].begin;
       e.end = peek().offset + 2;
       take();
@@ -722,7 +761,8 @@ ExprId Parser::parsePrimary() {
 }
 
 // `(e)` is a parenthesized expression; anything with a comma, a choice or a range is an
-// aggregate. Positional aggregates keep their elements, so constant tables can be indexed.
+// aggregate. Aggregates keep their elements, named ones as Named, so constant tables and
+// records can be read.
 ExprId Parser::parseParenthesized() {
   size_t begin = peek().offset;
   take();
@@ -731,30 +771,60 @@ ExprId Parser::parseParenthesized() {
     fail(begin, "expression is too deeply nested");
     return kNoExpr;
   }
-  ExprId inner = parseDiscreteRange();
-  bool aggregate = inner != kNoExpr && m_Arena[inner].kind == ExprKind::Range;
-  bool positional = !aggregate;
-  std::vector<ExprId> elements{inner};
-  while (inner != kNoExpr && !m_Failed &&
-         (peek().is(',') || peek().isSymbol("=>") || peek().is('|'))) {
+  std::vector<ExprId> elements;
+  uint16_t depth = 1;
+  bool aggregate = false;
+  for (;;) {
+    ExprId element = parseDiscreteRange();
+    std::vector<ExprId> choices;
+    bool named = false;
+    while (element != kNoExpr && !named && (peek().is('|') || peek().isSymbol("=>"))) {
+      choices.push_back(element);
+      named = peek().isSymbol("=>");
+      take();
+      element = named ? parseExpression() : parseDiscreteRange();
+    }
+    if (element != kNoExpr && !choices.empty() && !named) {
+      failHere("expected '=>'");
+      element = kNoExpr;
+    }
+    if (element != kNoExpr && named) {
+      Expr n;
+      n.kind = ExprKind::Named;
+      n.a = element;
+      n.begin = m_Arena[choices[0]].begin;
+      n.end = m_Arena[element].end;
+      n.depth = m_Arena[element].depth;
+      for (ExprId choice : choices) n.depth = std::max(n.depth, m_Arena[choice].depth);
+      ++n.depth;
+      n.args = std::move(choices);
+      element = add(std::move(n));
+    }
+    if (element == kNoExpr) {
+      --m_Depth;
+      return kNoExpr;
+    }
+    aggregate = aggregate || m_Arena[element].kind == ExprKind::Range ||
+                m_Arena[element].kind == ExprKind::Named;
+    depth = std::max(depth, m_Arena[element].depth);
+    elements.push_back(element);
+    if (!accept(',')) break;
     aggregate = true;
-    positional = positional && peek().is(',');
-    take();
-    inner = parseDiscreteRange();
-    if (positional) elements.push_back(inner);
   }
   --m_Depth;
-  if (inner == kNoExpr || !expect(')')) return kNoExpr;
+  if (!expect(')')) return kNoExpr;
   if (!aggregate) {
+    ExprId inner = elements[0];
     m_Arena[inner].begin = begin;
     m_Arena[inner].end = lastEnd();
     return inner;
   }
   Expr e;
   e.kind = ExprKind::Aggregate;
-  if (positional) e.args = std::move(elements);
+  e.args = std::move(elements);
   e.begin = begin;
   e.end = lastEnd();
+  e.depth = static_cast<uint16_t>(depth + 1);
   return add(std::move(e));
 }
 

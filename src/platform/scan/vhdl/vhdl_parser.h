@@ -61,6 +61,7 @@ class Parser {
   bool parseTypeMark(SubtypeIndication& out);
   bool parseDeclaration(std::vector<Decl>& out);
   bool parseTypeDeclaration(std::vector<Decl>& out);
+  bool parseAlias(std::vector<Decl>& out);
   bool parseSubprogram(std::vector<Decl>& out);
   bool parseStatements(FunctionBody& body, std::vector<int32_t>& list);
   bool parseStatement(FunctionBody& body, std::vector<int32_t>& list);

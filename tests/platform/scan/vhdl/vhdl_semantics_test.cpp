@@ -158,6 +158,65 @@ const SemanticsCase kCases[] = {
        "use work.q.all; entity e is port (a : in bit_vector(bits(255) - 1 downto 0); b : in bit_vector(bits(256) downto 0)); end;"}},
      "e",
      "a(7 downto 0) b(9 downto 0)"},
+    {"array_generics_and_constants",
+     {{"work",
+       "package t is type T_POSVEC is array (natural range <>) of positive;\n"
+       "  type IVEC is array (integer range <>) of integer;\n"
+       "  constant K : T_POSVEC(1 to 4) := (2 => 9, others => 1);\n"
+       "  constant D : T_POSVEC(3 downto 0) := (4, 3, 2, 1);\n"
+       "  constant I : IVEC := (5, 6); constant C : T_POSVEC := (2 | 4 => 3, 3 => 7); end;\n"
+       "use work.t.all;\n"
+       "entity e is generic (META_BITS : T_POSVEC := (0 => 8); W : T_POSVEC := (3, 5, 7));\n"
+       "  port (p_a : in bit_vector(META_BITS'length - 1 downto 0); p_b : in bit_vector(META_BITS(0) - 1 downto 0);\n"
+       "  p_c : in bit_vector(W(2) downto W'left); p_d : in bit_vector(W'high downto W'low);\n"
+       "  p_f : in bit_vector(K(2) downto K(4)); p_g : in bit_vector(D(3) downto D(0));\n"
+       "  p_h : in bit_vector(K'left to D'left); p_i : in bit_vector(I(-2147483647) downto 0);\n"
+       "  p_j : in bit_vector(C'high downto C'low); p_k : in bit_vector(C(3) downto C(4))); end;"}},
+     "e",
+     "p_a(0 downto 0) p_b(7 downto 0) p_c(7 downto 0) p_d(2 downto 0) p_f(9 downto 1) p_g(4 downto 1) p_h(1 to 3) "
+     "p_i(6 downto 0) p_j(4 downto 2) p_k(7 downto 3)"},
+    {"record_constants_aggregates_and_fields",
+     {{"work",
+       "package fix is type FixFormat_t is record S, I : integer; F : integer; end record;\n"
+       "  type fmt_arr is array (natural range <>) of FixFormat_t;\n"
+       "  constant F : FixFormat_t := (0, 4, 4);\n"
+       "  constant G : FixFormat_t := (F => 3, S => 1, I => 2);\n"
+       "  constant H : FixFormat_t := (S => 1, others => 5);\n"
+       "  constant FA : fmt_arr := ((0, 1, 2), (1, 2, 3));\n"
+       "  function size(fmt : FixFormat_t) return natural; end;\n"
+       "package body fix is function size(fmt : FixFormat_t) return natural is\n"
+       "  begin return fmt.S + fmt.I + fmt.F; end; end;\n"
+       "use work.fix.all;\n"
+       "entity e is generic (FMT : FixFormat_t := (1, 7, 8));\n"
+       "  port (p_a : in bit_vector(F.S + F.I + F.F - 1 downto 0); p_b : in bit_vector(size(G) - 1 downto 0);\n"
+       "  p_c : in bit_vector(size(FMT) - 1 downto 0); p_d : in bit_vector(H.F downto H.S);\n"
+       "  p_g : in bit_vector(FA(1).F downto FMT.S); p_h : in bit_vector(size(FixFormat_t'(2, 2, 2)) downto 0)); end;"}},
+     "e",
+     "p_a(7 downto 0) p_b(5 downto 0) p_c(15 downto 0) p_d(5 downto 1) p_g(3 downto 1) p_h(6 downto 0)"},
+    {"aliases_of_objects_and_types",
+     {{"work",
+       "package al is type FixFormat_t is record S, I, F : integer; end record;\n"
+       "  constant WIDTH : natural := 12; constant FMT : FixFormat_t := (1, 2, 3);\n"
+       "  alias W is WIDTH; alias W2 : natural is WIDTH; alias FI is FMT.I;\n"
+       "  subtype word_t is bit_vector(W - 1 downto 0); alias word is word_t; alias slv is bit_vector;\n"
+       "  function twice(n : natural) return natural; end;\n"
+       "package body al is function twice(n : natural) return natural is alias m is n;\n"
+       "  begin return m * 2; end; end;\n"
+       "use work.al.all;\n"
+       "entity e is port (p_a : in word; p_b : in slv(W2 downto 0); p_c : in bit_vector(word'length downto 1);\n"
+       "  p_d : in slv; p_f : in bit_vector(FI downto 0); p_g : in bit_vector(twice(W) downto 0)); end;"}},
+     "e",
+     "p_a(11 downto 0) p_b(12 downto 0) p_c(12 downto 1) p_d p_f(2 downto 0) p_g(24 downto 0)"},
+    {"image_attribute",
+     {{"work",
+       "package im is type state_t is (Idle, RUN_FAST);\n"
+       "  constant S : string := integer'image(1234); constant B : string := boolean'image(true);\n"
+       "  constant N : string := state_t'image(RUN_FAST); constant M : string := integer'image(-5) & \"x\"; end;\n"
+       "use work.im.all;\n"
+       "entity e is port (p_a : in bit_vector(S'length downto 1); p_b : in bit_vector(B'length downto 1);\n"
+       "  p_c : in bit_vector(boolean'pos(N = \"run_fast\") downto 0); p_d : in bit_vector(M'length downto 0)); end;"}},
+     "e",
+     "p_a(4 downto 1) p_b(4 downto 1) p_c(1 downto 0) p_d(3 downto 0)"},
 };
 
 class Semantics : public testing::TestWithParam<SemanticsCase> {};
