@@ -2,7 +2,9 @@
 // selection, and the 'image attribute. Bounds of real designs come from such constants
 // (width tables, fixed-point formats held in records).
 #include <algorithm>
+#include <cmath>
 #include <cstdio>
+#include <cstdlib>
 
 #include "platform/scan/vhdl/vhdl_eval.h"
 #include "platform/scan/vhdl/vhdl_parser.h"
@@ -25,6 +27,24 @@ std::string lowerCase(std::string_view text) {
   for (char& ch : out)
     if (ch >= 'A' && ch <= 'Z') ch = static_cast<char>(ch + 32);
   return out;
+}
+
+// The shortest digits that read back as `v`, written d.ddd with an exponent unless it is 0:
+// 2.5, 1.0e-3, -3.0, 1.2345675e5.
+std::string realImage(double v) {
+  if (v == 0) return "0.0";
+  if (!std::isfinite(v)) return v > 0 ? "inf" : v < 0 ? "-inf" : "nan";
+  char buffer[40];
+  for (int precision = 0; precision < 17; ++precision) {
+    std::snprintf(buffer, sizeof buffer, "%.*e", precision, v);
+    if (std::strtod(buffer, nullptr) == v) break;
+  }
+  std::string text(buffer);
+  size_t e = text.find('e');
+  std::string mantissa = text.substr(0, e);
+  long exponent = std::strtol(text.c_str() + e + 1, nullptr, 10);
+  if (mantissa.find('.') == std::string::npos) mantissa += ".0";
+  return exponent == 0 ? mantissa : mantissa + "e" + std::to_string(exponent);
 }
 
 }  // namespace
@@ -295,9 +315,7 @@ bool Evaluator::evalImage(const EvalContext& c, const Expr& e, Value& out) {
   } else if (v.isInteger()) {
     out = Value::string(std::to_string(v.asInteger()));
   } else if (v.isReal()) {
-    char buffer[40];
-    std::snprintf(buffer, sizeof buffer, "%.6e", v.asReal());
-    out = Value::string(buffer);
+    out = Value::string(realImage(v.asReal()));
   } else if (v.isString() && v.asString().size() == 1) {
     out = Value::string("'" + v.asString() + "'");
   } else {
