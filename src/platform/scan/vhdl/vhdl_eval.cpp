@@ -338,6 +338,10 @@ bool Evaluator::evalUnary(const EvalContext& c, const Expr& e, Value& out) {
 // A left-associative chain (a+b+c+...) is walked down its left operands and folded back up
 // in a loop, so its length costs no evaluation depth.
 bool Evaluator::evalBinary(const EvalContext& c, const Expr& top, Value& out) {
+  if (c.unit->arena[static_cast<size_t>(top.a)].kind != ExprKind::Binary) {
+    Value a;
+    return eval(c, top.a, a) && applyBinary(c, top, a, out);
+  }
   std::vector<const Expr*> chain{&top};
   for (;;) {
     const Expr& left = c.unit->arena[static_cast<size_t>(chain.back()->a)];

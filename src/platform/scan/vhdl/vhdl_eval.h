@@ -1,6 +1,7 @@
-// Constant evaluation of VHDL bounds: expressions over generics, package constants, types'
-// attributes, predefined and math_real functions, and user functions run by a small
-// interpreter with a step limit. Failures are values, with a reason for the message.
+// Constant evaluation of VHDL bounds: expressions over generics, package constants (array
+// and record ones too), types' attributes, predefined and math_real functions, and user
+// functions run by a small interpreter with a step limit. Failures are values, with a reason
+// for the message.
 #pragma once
 
 #include <cstdint>

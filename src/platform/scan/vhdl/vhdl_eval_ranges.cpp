@@ -152,12 +152,17 @@ bool Evaluator::prefixRange(const EvalContext& c, const Expr& prefix, RangeValue
     return failWith(quoted(sourceText(c, prefix)) + " has no range");
   }
   if (prefix.kind != ExprKind::Name && prefix.kind != ExprKind::Selected) {
-    // A qualified array aggregate or string: its bounds follow from its length.
+    // A qualified aggregate or string, or T'image(x) (a string indexed from 1): the bounds
+    // follow from the value.
     Value v;
+    bool image = prefix.kind == ExprKind::Attribute && prefix.key == "image";
     ExprId id = prefix.kind == ExprKind::Qualified ? prefix.b : kNoExpr;
-    if (id == kNoExpr || !eval(c, id, v) || !v.isString())
+    bool ok = image ? evalImage(c, prefix, v) : id != kNoExpr && eval(c, id, v);
+    if (ok && v.isComposite()) return compositeRange(v, sourceText(c, prefix), out);
+    if (!ok || !v.isString())
       return failWith("attribute prefix " + quoted(sourceText(c, prefix)) + " is not supported");
-    out = RangeValue{0, static_cast<int64_t>(v.asString().size()) - 1, true};
+    int64_t first = image ? 1 : 0;
+    out = RangeValue{first, first + static_cast<int64_t>(v.asString().size()) - 1, true};
     return true;
   }
   Found f = resolve(c, prefix, static_cast<size_t>(-1));

@@ -182,17 +182,21 @@ TEST(VhdlRobustness, FlatSumsOfAnyLengthEvaluate) {
 const char* kSample =
     "library ieee; use ieee.std_logic_1164.all;\n"
     "package k is constant W : natural := 4; subtype t is bit_vector(W-1 downto 0);\n"
-    "function f(x : natural) return natural; end package;\n"
+    "function f(x : natural) return natural;\n"
+    "type r is record x, y : natural; end record; constant RC : r := (x => 1, others => 2);\n"
+    "alias AL is RC; constant V : integer_vector := (0 => 1, 1 | 2 => 3); end package;\n"
     "package body k is function f(x : natural) return natural is variable r : natural := 0;\n"
     "begin while r < x loop r := r + 1; end loop; return r; end function; end package body;\n"
     "use work.k.all;\n"
     "entity s is generic (G : natural := f(3)); port (a : in t; b : out bit_vector(G downto 0);\n"
-    "  c : inout std_logic_vector(a'range); d : buffer integer range 0 to W); end entity s;\n";
+    "  c : inout std_logic_vector(a'range); d : buffer integer range 0 to W;\n"
+    "  e : out bit_vector(AL.y + V(2) downto integer'image(RC.x)'length)); end entity s;\n";
 
 TEST(VhdlRobustness, EveryPrefixOfAFileIsRead) {
   std::string full = kSample;
   Outcome whole = read(full, "s");
-  ASSERT_EQ(whole.ports.size(), 4u);
+  ASSERT_EQ(whole.ports.size(), 5u);
+  EXPECT_TRUE(whole.ports[4].hasRange());
   EXPECT_EQ(whole.errors, 0u);
   for (size_t n = 0; n < full.size(); ++n) read(full.substr(0, n), "s");
 }
@@ -205,7 +209,7 @@ TEST(VhdlRobustness, BinaryJunkIsSurvived) {
     // Splice real text in so the parser gets past the index now and then.
     junk.insert(junk.size() / 2, kSample);
     Outcome o = read(junk, "s");
-    EXPECT_LE(o.ports.size(), 4u);
+    EXPECT_LE(o.ports.size(), 5u);
   }
 }
 
