@@ -140,6 +140,20 @@ const HostileCase kCases[] = {
      true, false, 1, 1, 0},
     {"syntax_error_in_the_port_clause", [] { return std::string("entity e is port (a : in bit;; b : out bit); end;"); }, "e",
      true, false, 1, 1, 0},
+    {"alias_cycles",
+     [] {
+       return std::string("package p is alias a1 is a2; alias a2 is a1; alias t1 is t2; alias t2 is t1; end;\n"
+                          "use work.p.all; entity e is port (a : in bit_vector(a1 downto 0); b : in t1); end;");
+     },
+     "e", true, true, 2, 0, 0},
+    {"huge_and_self_referencing_aggregates",
+     [] {
+       return std::string("package p is type v is array (natural range <>) of integer;\n"
+                          "constant BIG : v := (0 to 2**30 => 0); constant SELF : v := (0 => SELF(0)); end;\n"
+                          "use work.p.all; entity e is port (a : in bit_vector(BIG(0) downto 0);\n"
+                          "b : in bit_vector(SELF(0) downto 0); c : in bit_vector(BIG'length downto 0)); end;");
+     },
+     "e", true, true, 3, 0, 0},
     {"error_after_the_header", [] { return std::string("entity e is port (a : in bit); begin $ end;"); }, "e",
      true, true, 1, 1, 0},
 };
