@@ -192,6 +192,11 @@ bool OutputFile::open(const char* path, Placement placement, std::string& error)
       error = std::strerror(EISDIR);
       return false;
     }
+    // Renaming over a read-only file would succeed where a plain open refuses to write it.
+    if (exists && S_ISREG(status.st_mode) && ::access(m_Path.c_str(), W_OK) != 0) {
+      error = std::strerror(errno);
+      return false;
+    }
     // When no file can be made in the folder (it is not writable, say) the target is still
     // written in place, as a plain open would.
     if (!exists || S_ISREG(status.st_mode))

@@ -203,6 +203,17 @@ TEST_F(FileTest, FailedWritesAndOpensSayWhy) {
   EXPECT_EQ(m_Dir.read("target"), "keep");
 }
 
+TEST_F(FileTest, ReadOnlyOutputIsRefusedNotReplaced) {
+  if (::geteuid() == 0) GTEST_SKIP() << "root may write any file";
+  ASSERT_TRUE(m_Dir.write("ro.txt", "keep"));
+  ASSERT_EQ(::chmod(m_Dir.file("ro.txt").c_str(), 0444), 0);
+  Host::OutputFile file;
+  std::string error;
+  EXPECT_FALSE(file.open(m_Dir.file("ro.txt").c_str(), Placement::Replace, error));
+  EXPECT_EQ(error, "Permission denied");
+  EXPECT_EQ(m_Dir.read("ro.txt"), "keep");
+}
+
 TEST_F(FileTest, RemoveWrittenTakesOnlyTheFileThisRunWrote) {
   ASSERT_TRUE(m_Dir.write("real", "old"));
   ASSERT_EQ(::symlink("real", m_Dir.file("link").c_str()), 0);
