@@ -1,14 +1,23 @@
 // Whole runs of the binary where the golden format cannot say enough: the trace file exists
 // only in debug mode once the unit is found, an unwritable trace file does not break the run
 // and a symlink is never followed to write it, a file-size limit fails the run cleanly,
-// links cannot make an input the output, -deleteonerror on the Tcl path, the script shell is
+// links cannot make an input the output, -deleteonerror on the Tcl path, an interrupted run
+// leaves the previous output and no temporary file, the script shell is
 // found beside tclsh, and the shipped demo keeps its reviewed outputs.
+#include <fcntl.h>
 #include <gtest/gtest.h>
+#include <signal.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
+#include <cerrno>
+#include <chrono>
 #include <cstdlib>
 #include <filesystem>
+#include <set>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "support/process.h"
@@ -174,6 +183,64 @@ TEST(FlowRun, DeleteOnErrorOnTheTclPathRemovesWhatTheScriptWrote) {
         {{"PATH", dir.file("bin") + ":" + (path != nullptr ? path : "/usr/bin:/bin")}});
     EXPECT_EQ(run.status, 1) << run.out << run.err;
     EXPECT_EQ(dir.read("work/out.txt"), deleteOnError ? "<missing>" : "partial\n");
+  }
+}
+
+std::set<std::string> listing(const ScratchDir& dir) {
+  std::set<std::string> names;
+  for (const auto& entry : std::filesystem::directory_iterator(dir.path()))
+    names.insert(entry.path().filename().string());
+  return names;
+}
+
+TEST(FlowRun, InterruptedRunLeavesThePreviousOutput) {
+  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
+  using namespace std::chrono_literals;
+  for (int number : {SIGINT, SIGTERM}) {
+    SCOPED_TRACE(number);
+    ScratchDir dir;
+    ASSERT_TRUE(dir.write("design.vhd", kDesign) && dir.write("out.txt", "previous"));
+    // A template fed through a FIFO holds the run in the middle of its expansion.
+    ASSERT_EQ(mkfifo(dir.file("t.txt").c_str(), 0600), 0);
+    const std::set<std::string> before = listing(dir);
+    std::vector<std::string> args = argsFor("top", "t.txt");
+    args.insert(args.begin(), binaryPath());
+    std::vector<char*> argv;
+    for (std::string& arg : args) argv.push_back(arg.data());
+    argv.push_back(nullptr);
+    const pid_t child = fork();
+    ASSERT_GE(child, 0);
+    if (child == 0) {
+      const int devNull = open("/dev/null", O_RDWR);
+      if (devNull < 0 || dup2(devNull, 1) < 0 || dup2(devNull, 2) < 0 ||
+          chdir(dir.path().c_str()) != 0)
+        _exit(127);
+      alarm(60);
+      execv(argv[0], argv.data());
+      _exit(127);
+    }
+    int writer = -1;
+    bool temporarySeen = false;
+    for (auto deadline = std::chrono::steady_clock::now() + 20s;
+         !temporarySeen && std::chrono::steady_clock::now() < deadline;) {
+      if (writer < 0) writer = open(dir.file("t.txt").c_str(), O_WRONLY | O_NONBLOCK);
+      if (writer >= 0 && listing(dir).size() > before.size()) temporarySeen = true;
+      std::this_thread::sleep_for(10ms);
+    }
+    if (writer >= 0) {
+      EXPECT_EQ(write(writer, "%module%\n", 9), 9);
+    }
+    std::this_thread::sleep_for(50ms);
+    kill(child, number);
+    int status = 0;
+    ASSERT_EQ(waitpid(child, &status, 0), child);
+    if (writer >= 0) close(writer);
+    EXPECT_TRUE(temporarySeen);
+    EXPECT_TRUE((WIFSIGNALED(status) && WTERMSIG(status) == number) ||
+                (WIFEXITED(status) && WEXITSTATUS(status) == 128 + number))
+        << status;
+    EXPECT_EQ(listing(dir), before);
+    EXPECT_EQ(dir.read("out.txt"), "previous");
   }
 }
 
