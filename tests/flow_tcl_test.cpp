@@ -110,7 +110,7 @@ const TclCase kCases[] = {
      .scriptKept = true},
     {.name = "DebugKeepsScript",
      .extraArgs = {"--a"},
-     .out = "In0: ? std_logic;\nInBus: ? std_logic_vector (2 DOWNTO 0);\n" + kSuccess,
+     .out = "In0: in std_logic;\nInBus: in std_logic_vector (2 DOWNTO 0);\n" + kSuccess,
      .scriptKept = true},
     {.name = "ScriptCannotBeCreated",
      .out = "Template file = \n" + kSuccess,

@@ -51,6 +51,10 @@ int ScanExtractor::Parse(Language language) {
   return static_cast<int>(m_Diagnostics->errorCount());
 }
 
+const std::vector<std::string>& ScanExtractor::unreadableFiles() const {
+  return m_Diagnostics->unreadableFiles();
+}
+
 int ScanExtractor::findDesignUnit(const char* library, const char* unit, DesignUnitSearch search) {
   m_UnitFound = false;
   m_UnitErrors = false;
