@@ -11,6 +11,10 @@
 /// What a port's declared type is, as far as a generated declaration cares.
 enum class PortTypeKind { Bit, BitVector, Integer, Record, Array, Enum, Interface, Other };
 
+/// The port's mode as declared, where the direction letter cannot tell it (buffer, linkage and
+/// ref are all written 'O'). FromLetter: the letter says it all.
+enum class PortMode { FromLetter, Buffer, Linkage, Ref };
+
 struct PortRecord {
   PortRecord(std::string_view name, int32_t left, int32_t right, char dir)
       : m_Name(name), m_Left(left), m_Right(right), m_Dir(dir) {}
@@ -38,6 +42,7 @@ struct PortRecord {
   std::string m_DeclaredType;
   /// Other when not known; the engine then treats the port by its bounds alone.
   PortTypeKind m_Kind = PortTypeKind::Other;
+  PortMode m_Mode = PortMode::FromLetter;
 
  private:
   std::optional<std::string> m_RangeProblem;
