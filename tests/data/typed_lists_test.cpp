@@ -87,4 +87,25 @@ TEST(PortRecord, BusAndMappedName) {
   EXPECT_EQ(port.m_Name, "data");
 }
 
+TEST(PortRecord, UnknownRangeKeepsItsProblemTextEvenWhenEmpty) {
+  PortRecord port("d", -1, -1, 'I');
+  EXPECT_FALSE(port.isRangeUnknown());
+  EXPECT_EQ(port.rangeProblem(), "");
+  EXPECT_EQ(port.m_Kind, PortTypeKind::Other);
+  EXPECT_EQ(port.m_DeclaredType, "");
+  port.setRangeUnknown(std::string("W\0x", 3));
+  EXPECT_TRUE(port.isRangeUnknown());
+  EXPECT_EQ(port.rangeProblem(), std::string("W\0x", 3));
+  PortRecord silent("e", -1, -1, 'I');
+  silent.setRangeUnknown("");
+  EXPECT_TRUE(silent.isRangeUnknown()) << "the state does not hang on the text";
+}
+
+TEST(TypedLists, DesignDataStartsWithoutGenericsOrContext) {
+  StbDataList data("p", "m", "f", ".e", "t", "", "title", "date");
+  EXPECT_EQ(data.m_Language, DesignLanguage::Vhdl);
+  EXPECT_TRUE(data.m_Generics.empty());
+  EXPECT_EQ(data.m_Context, "");
+}
+
 }  // namespace
