@@ -100,9 +100,9 @@ int runFrontEnd(int argc, char** argv) {
     return 0;
   }
   ArgumentVector arguments;
-  if (expandResponseFile(messageStream, argc, argv, arguments)) {
+  if (expandResponseFile(messageStream, argc, argv, arguments) != Expansion::Ready) {
     writeUsage(messageStream);
-    return 0;
+    return 1;
   }
   std::vector<char*> vector = arguments.pointers();
   const UT_CMDARGS parser(static_cast<int>(arguments.count()), vector.data(), kUsageText, nullptr,
