@@ -63,7 +63,12 @@ void onSignal(int number) {
   for (Slot& slot : g_Slots)
     if (slot.used) ::unlink(slot.path);
   // End with the signal's own status, as the caller of a killed program expects.
+  // The signal is blocked while its handler runs, so it is let through for the raise to end us.
   ::signal(number, SIG_DFL);
+  sigset_t own;
+  sigemptyset(&own);
+  sigaddset(&own, number);
+  ::sigprocmask(SIG_UNBLOCK, &own, nullptr);
   ::raise(number);
   ::_exit(128 + number);
 }
