@@ -211,7 +211,7 @@ int runFrontEnd(int argc, char** argv) {
     return 0;
   }
   ArgumentVector arguments;
-  if (expandResponseFile(messageStream, argc, argv, arguments)) {
+  if (expandResponseFile(messageStream, argc, argv, arguments) != Expansion::Ready) {
     writeUsage(messageStream);
     return 1;
   }

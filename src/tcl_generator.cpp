@@ -1,13 +1,14 @@
 // The Tcl path: writes a temporary driver script that defines the run's names and the port
 // lists as Tcl variables, appends the Tcl template's text, and runs the script shell `runscr`
-// on it.
+// on it, found beside this program or else on PATH.
+#include <cerrno>
 #include <cstdint>
 #include <cstdio>
-#include <cstdlib>
+#include <cstring>
 #include <filesystem>
-#include <memory>
 #include <string>
 #include <string_view>
+#include <system_error>
 
 #include "run_context.h"
 
@@ -15,27 +16,26 @@ namespace {
 
 constexpr const char* kScriptShell = "runscr";
 
-/// Collects what the script shell prints, so a failure can show the Tcl error to the user.
-class DerivedOutput : public Host::ChildOutput {
+/// Keeps the end of what the script shell prints, so a failure can show the Tcl error without
+/// holding the whole output of a script that prints without end.
+class OutputTail : public Host::ChildOutput {
  public:
-  DerivedOutput(std::string* collected, const int32_t* stopFlag)
-      : m_Collected(collected), m_StopFlag(stopFlag) {}
+  static constexpr size_t kKeptBytes = 64 * 1024;
 
-  bool OnOutput(const char* text) override {
-    if (!m_Stopped && text != nullptr) {
-      if (*m_StopFlag == 0)
-        m_Collected->append(text);
-      else
-        m_Stopped = true;
-    }
+  explicit OutputTail(std::string& tail) : m_Tail(tail) {}
+
+  bool OnOutput(std::string_view text) override {
+    m_Tail.append(text.substr(text.size() > kKeptBytes ? text.size() - kKeptBytes : 0));
+    m_Seen += text.size();
+    if (m_Tail.size() > kKeptBytes) m_Tail.erase(0, m_Tail.size() - kKeptBytes);
     return true;
   }
-  void OnEnd() override {}
+  /// How many bytes of the output are no longer kept.
+  size_t dropped() const { return m_Seen - m_Tail.size(); }
 
  private:
-  std::string* m_Collected;
-  const int32_t* m_StopFlag;
-  bool m_Stopped = false;
+  std::string& m_Tail;
+  size_t m_Seen = 0;
 };
 
 /// Backslash before every character Tcl would interpret inside a double-quoted word, so any
@@ -106,101 +106,83 @@ bool copyStream(std::FILE* from, std::FILE* to) {
   return std::ferror(from) == 0;
 }
 
-bool isExecutableFile(const std::filesystem::path& path) {
+/// The script's path in a form no program can read as an option: a relative $TMPDIR such as
+/// "-x" would otherwise make "-x/pinforge-....tcl".
+std::string unambiguousPath(const std::string& name) {
+  if (name.starts_with('/')) return name;
   std::error_code error;
-  const std::filesystem::file_status status = std::filesystem::status(path, error);
-  using std::filesystem::perms;
-  return !error && std::filesystem::is_regular_file(status) &&
-         (status.permissions() & (perms::owner_exec | perms::group_exec | perms::others_exec)) !=
-             perms::none;
+  const std::filesystem::path absolute = std::filesystem::absolute(name, error);
+  if (!error && absolute.string().starts_with('/')) return absolute.string();
+  return "./" + name;
 }
 
-bool onSearchPath(std::string_view program) {
-  const char* path = std::getenv("PATH");
-  if (path == nullptr) return false;
-  std::string_view rest = path;
-  while (true) {
-    const size_t colon = rest.find(':');
-    const std::string_view dir = rest.substr(0, colon);
-    if (isExecutableFile(std::filesystem::path(dir.empty() ? "." : dir) / program)) return true;
-    if (colon == std::string_view::npos) return false;
-    rest.remove_prefix(colon + 1);
-  }
-}
-
-/// A word of the command line, quoted when a blank or tab would split it.
-std::string commandWord(std::string_view word) {
-  if (word.find_first_of(" \t") == std::string_view::npos) return std::string(word);
-  return '"' + std::string(word) + '"';
-}
-
-/// The script shell as the command line names it: from PATH when it is there, else the one
-/// installed next to this program, so a fresh build runs Tcl templates without setup.
-std::string scriptShellCommand() {
-  if (onSearchPath(kScriptShell)) return kScriptShell;
-  const std::string exeDir = Host::File::executableDirectory();
-  if (exeDir.empty()) return kScriptShell;
-  const std::string besideUs = exeDir + '/' + kScriptShell;
-  return isExecutableFile(besideUs) ? commandWord(besideUs) : kScriptShell;
-}
-
-void reportCannotCreateScript(const std::string& scriptName) {
-  std::printf("Template file = %s\n", scriptName.c_str());
-  std::fflush(stdout);
-  std::unique_ptr<Host_MsgManData> messages =
-      Host_MsgManData::createObject("ProjectMgmt", "../src/stbparse", 330, "$Revision: 1.5 $");
-  messages->issueError(
-      "ERROR: ProjectMgmt(pinforge) - Unable to open temporary tcl template file\n");
+/// Removes the script and stops watching it.
+void discardScript(const std::string& name) {
+  Host::File::remove(name.c_str());
+  Host::Interrupt::forget(name);
 }
 
 }  // namespace
 
 bool RunContext::runTclGenerator() {
+  // A signal from here on removes the script and stops the script shell.
+  Host::Interrupt::install();
   std::string scriptName;
   std::FILE* script = Host::File::createTemporary(".tcl", scriptName);
   if (script == nullptr) {
-    reportCannotCreateScript(scriptName);
+    const int error = errno;
+    reportMessage("ERROR: ProjectMgmt(pinforge) - Unable to create the temporary tcl script in " +
+                      Host::File::temporaryDirectory() + ": " + std::strerror(error),
+                  Severity::Error);
     return false;
   }
+  scriptName = unambiguousPath(scriptName);
+  Host::Interrupt::removeOnSignal(scriptName);
   if (!writeAll(script, scriptHead(*this))) {
+    const int error = errno;
     std::fclose(script);
-    Host::File::remove(scriptName.c_str());
-    reportCannotCreateScript(scriptName);
-    return false;
-  }
-
-  std::FILE* tclTemplate = std::fopen(m_TemplateFileName.c_str(), "r");
-  if (tclTemplate == nullptr) {
-    std::fclose(script);
-    reportMessage("ERROR: ProjectMgmt(pinforge) - Unable to open/read tcl template file\n",
+    discardScript(scriptName);
+    reportMessage("ERROR: ProjectMgmt(pinforge) - Unable to write the temporary tcl script " +
+                      scriptName + ": " + std::strerror(error),
                   Severity::Error);
     return false;
   }
-  const bool copied = copyStream(tclTemplate, script);
-  std::fclose(tclTemplate);
+
+  std::FILE* tclTemplate = std::fopen(m_TemplateFileName.c_str(), "re");
+  const bool copied = tclTemplate != nullptr && copyStream(tclTemplate, script);
+  if (tclTemplate != nullptr) std::fclose(tclTemplate);
   if (std::fclose(script) != 0 || !copied) {
+    discardScript(scriptName);
     reportMessage("ERROR: ProjectMgmt(pinforge) - Unable to open/read tcl template file\n",
                   Severity::Error);
     return false;
   }
 
-  const std::string commandLine = scriptShellCommand() + ' ' + commandWord(scriptName);
-  Host_MsgManData::debugStub(("Command line is: " + commandLine + '\n').c_str());
-
-  std::string collected;
-  int32_t stopFlag = 0;
-  Host::Process process;
-  const int status = process.RunNoWindow(
-      commandLine.c_str(), std::make_unique<DerivedOutput>(&collected, &stopFlag), 0, true, true,
-      false);
+  const std::string shell = Host::Process::findProgram(kScriptShell);
+  Host_MsgManData::debugStub(("Command line is: " + shell + ' ' + scriptName + '\n').c_str());
+  std::string tail;
+  OutputTail receiver(tail);
+  const int status = shell.empty() ? -1 : Host::Process::run({shell, scriptName}, &receiver);
   if (status != 0) {
-    std::fwrite(collected.data(), 1, collected.size(), stderr);
+    // The script stays for inspection.
+    Host::Interrupt::forget(scriptName);
+    if (shell.empty())
+      reportMessage("ERROR: ProjectMgmt(pinforge) - The script shell runscr is neither beside "
+                    "pinforge nor in a folder on PATH",
+                    Severity::Error);
+    if (receiver.dropped() != 0)
+      std::fprintf(stderr, "[... %zu earlier bytes of the script's output not shown ...]\n",
+                   receiver.dropped());
+    std::fwrite(tail.data(), 1, tail.size(), stderr);
     reportMessage("ERROR: ProjectMgmt(pinforge)  Unable to invoke tcl file generator\n",
                   Severity::Error);
     return false;
   }
 
-  if (!m_Debug) Host::File::remove(scriptName.c_str());
+  if (m_Debug)
+    Host::Interrupt::forget(scriptName);
+  else
+    discardScript(scriptName);
   m_DesignData.reset();
   return !hasErrors();
 }

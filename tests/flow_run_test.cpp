@@ -67,10 +67,11 @@ TEST(FlowRun, TraceFileOnlyWhenDebuggingAFoundUnit) {
     }
     std::vector<std::string> args = argsFor(c.module, c.templateName);
     if (c.debug) args.push_back("--a");
-    const char* path = std::getenv("PATH");
-    const RunResult run = runPinforge(
-        args, dir.file("work"),
-        {{"PATH", dir.file("bin") + ":" + (path != nullptr ? path : "/usr/bin:/bin")}});
+    // runscr is taken from beside the program first, so the program runs from bin/ too.
+    std::error_code error;
+    ASSERT_TRUE(std::filesystem::copy_file(binaryPath(), dir.file("bin/pinforge"), error));
+    args.insert(args.begin(), dir.file("bin/pinforge"));
+    const RunResult run = runProgram(args, dir.file("work"));
     ASSERT_TRUE(run.started);
     EXPECT_EQ(run.status, c.status) << run.out << run.err;
     EXPECT_EQ(dir.read("work/out.txt"), c.output);

@@ -95,6 +95,8 @@ class File {
   static std::FILE* createTemporary(std::string_view suffix, std::string& name);
   /// The directory holding the running executable; empty when it cannot be found.
   static std::string executableDirectory();
+  /// The folder temporary files are created in: $TMPDIR when set and not empty, else /tmp.
+  static std::string temporaryDirectory();
   /// Identifies `path` by what it is, not how it is spelled: an existing file by its device
   /// and inode (symlinks followed, so "./x", a symlink and a hard link all match), a file yet
   /// to be created by its folder's identity and its last component. Empty when neither can
@@ -157,24 +159,30 @@ class OutputFile {
 class ChildOutput {
  public:
   virtual ~ChildOutput() = default;
-  /// One piece of the child's output (standard output and standard error). Returns true to
-  /// keep receiving.
-  virtual bool OnOutput(const char* text) = 0;
+  /// One piece of the child's output (standard output and standard error, as it arrives; any
+  /// byte, NUL included). Returns true to keep receiving.
+  virtual bool OnOutput(std::string_view text) = 0;
   /// Called once when the child has ended.
   virtual void OnEnd() {}
 };
 
 class Process {
  public:
-  /// Runs `commandLine` without a shell: the line is split into words at blanks and tabs
-  /// (double quotes group a word), the first word is looked up on PATH. The child's standard
-  /// output and standard error go to `receiver`; returns after the child has ended. Returns 0
-  /// only for a normal exit with code 0; otherwise the child's exit code, 128 plus the number
-  /// of the signal that killed it, or -1 when it could not be started (not found, for one).
-  /// Standard input is /dev/null; a NUL byte in the output ends a piece and is not passed on.
-  /// `flags` and the three booleans are accepted for compatibility.
-  int RunNoWindow(const char* commandLine, std::unique_ptr<ChildOutput> receiver,
-                  unsigned flags, bool hideWindow, bool captureOutput, bool detach);
+  /// The path of the program `name` (a bare file name): the one in the folder of this
+  /// executable when there is one, else the first in a PATH folder. Empty and relative PATH
+  /// entries are skipped, so nothing is ever taken from the current folder. Empty when none
+  /// is found.
+  static std::string findProgram(std::string_view name);
+
+  /// Runs the program at the path `argv[0]` (not looked up) with the arguments `argv[1..]`,
+  /// passed as they are, without a shell. The child starts in a process group of its own,
+  /// registered with Interrupt (whose handlers this installs) while it runs, so a signal to
+  /// this process stops it and all it started. It inherits no open file but its standard
+  /// streams: standard input is /dev/null, standard output and standard error go to
+  /// `receiver` (which may be null). Returns after the child has ended: 0 only for a normal
+  /// exit with code 0; otherwise the child's exit code, 128 plus the number of the signal that
+  /// killed it, or -1 when it could not be started.
+  static int run(const std::vector<std::string>& argv, ChildOutput* receiver);
 };
 
 /// What an interrupted run leaves behind. Once installed, SIGINT, SIGTERM and SIGHUP stop

@@ -93,6 +93,8 @@ StringBase File::tmpnam(const char* /*buffer*/) {
   return StringBase(std::move(name));
 }
 
+std::string File::temporaryDirectory() { return ::temporaryDirectory(); }
+
 std::FILE* File::createTemporary(std::string_view suffix, std::string& name) {
   if (suffix.find('/') != std::string_view::npos || suffix.find('\0') != std::string_view::npos ||
       suffix.size() > INT_MAX)
