@@ -96,7 +96,7 @@ TEST(KeywordTable, SortedPrefixFreeAndFoundIgnoringCase) {
   for (int i = 0; i < kKeywordCount; ++i) {
     const std::string_view word = keywordWord(i);
     ASSERT_FALSE(word.empty()) << i;
-    EXPECT_EQ(word[0], i < 26 ? '%' : '@') << word;
+    EXPECT_EQ(word[0], i < kVariableCount ? '%' : '@') << word;
     if (i > 0) {
       EXPECT_LT(keywordWord(i - 1), word);
     }
