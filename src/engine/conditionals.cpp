@@ -43,7 +43,8 @@ bool globMatches(std::string_view name, std::string_view pattern, bool foldCase)
     if (p < pattern.size() && pattern[p] == '*') {
       star = p++;
       resume = n;
-    } else if (p < pattern.size() && (pattern[p] == '?' || sameChar(pattern[p], name[n], foldCase))) {
+    } else if (p < pattern.size() &&
+               (pattern[p] == '?' || sameChar(pattern[p], name[n], foldCase))) {
       ++n;
       ++p;
     } else if (star != std::string_view::npos) {
@@ -111,7 +112,8 @@ std::optional<bool> Forge::hasMatchingPort(int kind, std::string_view pattern) {
     return known->second;
   bool found = false;
   for (const List_element* e = m_DataList->m_Head; e != nullptr && !found; e = e->m_Next) {
-    const auto* port = static_cast<const PortRecord*>(static_cast<const Object_element*>(e)->m_Object);
+    const auto* port =
+        static_cast<const PortRecord*>(static_cast<const Object_element*>(e)->m_Object);
     if (port == nullptr || compareSignalName(port->m_Name, pattern) != 0) continue;
     if (widthUnknown(selection, *port)) return std::nullopt;
     found = selection.selects(port->m_Dir, port->isBus());

@@ -187,8 +187,8 @@ INSTANTIATE_TEST_SUITE_P(
                        "not valid within @ITERATE@")},
         Row{"NestedInPortBody", &kVhdl, "@ITERATE@%PORT%@ITERATE@%GENERIC%@ENDITERATE@", ", ",
             errorAt(1, "@ITERATE@ may not occur inside an @ITERATE@ body.")},
-        Row{"Context", &kVhdl, "%context%entity", "library ieee;\nuse ieee.std_logic_1164.all;\nentity",
-            ""},
+        Row{"Context", &kVhdl, "%context%entity",
+            "library ieee;\nuse ieee.std_logic_1164.all;\nentity", ""},
         Row{"ContextKeepsCase", &kVerilog, "@UPCASE@%CONTEXT%", "import axi_pkg::*;\n", ""},
         Row{"ContextEmpty", &kEmpty, "[%context%]", "[]", ""}),
     rowName);
@@ -207,7 +207,8 @@ INSTANTIATE_TEST_SUITE_P(
             "[input|wire|clk], [input|logic [W-1:0]|d], [output|logic|q], [inout|wire|io], "
             "[|bus_if.slave|s], [ref|int|r]",
             ""},
-        Row{"WordsIgnoreCaseMode", &kVhdl, "@UPCASE@@ITERATE@%IPORT%@PORT_MODE@ @PORT_TYPE@@ENDITERATE@",
+        Row{"WordsIgnoreCaseMode", &kVhdl,
+            "@UPCASE@@ITERATE@%IPORT%@PORT_MODE@ @PORT_TYPE@@ENDITERATE@",
             "in std_ulogic, in std_logic, in std_ulogic_vector(WIDTH-1 downto 0)", ""},
         Row{"ExpandedBitsKeepType", &kVerilog,
             "@EXPANDBUS@@ITERATE@%IBUSPORT%@ITERATOR@:@PORT_TYPE@@ENDITERATE@",
