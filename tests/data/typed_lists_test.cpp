@@ -1,5 +1,4 @@
-// Typed lists and records: ownership of the carried objects, header values, port records and
-// the class names the typed lists report.
+// Typed lists and records: ownership of the carried objects, header values and port records.
 #include "data/typed_lists.h"
 
 #include <gtest/gtest.h>
@@ -31,19 +30,6 @@ TEST(TypedLists, OwningListFreesEveryObjectEvenAfterANullOne) {
     list.next();  // a walk in progress does not change what is freed
   }
   EXPECT_EQ(g_Alive, 0);
-}
-
-TEST(TypedLists, ClassNameIsThatOfTheObjectList) {
-  StbDataList data("p", "m", "f", ".e", "t", "", "title", "date");
-  TokList tokens;
-  const List* lists[] = {&data, &tokens};
-  for (const List* list : lists) {
-    EXPECT_STREQ(list->className(), "Object_list");
-    List* made = list->newList();
-    ASSERT_NE(made, nullptr);
-    EXPECT_STREQ(made->className(), "Object_list");
-    delete made;
-  }
 }
 
 TEST(TypedLists, HeaderValuesAreCopiedAndPortsComeBackInAppendOrder) {
@@ -99,13 +85,6 @@ TEST(PortRecord, UnknownRangeKeepsItsProblemTextEvenWhenEmpty) {
   PortRecord silent("e", -1, -1, 'I');
   silent.setRangeUnknown("");
   EXPECT_TRUE(silent.isRangeUnknown()) << "the state does not hang on the text";
-}
-
-TEST(TypedLists, DesignDataStartsWithoutGenericsOrContext) {
-  StbDataList data("p", "m", "f", ".e", "t", "", "title", "date");
-  EXPECT_EQ(data.m_Language, DesignLanguage::Vhdl);
-  EXPECT_TRUE(data.m_Generics.empty());
-  EXPECT_EQ(data.m_Context, "");
 }
 
 }  // namespace
