@@ -263,11 +263,29 @@ const Decl* Describer::genericWithoutValue(UnitScope& entity, const Expr& failed
   return nullptr;
 }
 
-std::string Describer::missingPackage(UnitScope& entity,
+std::string Describer::missingPackage(UnitScope& entity, const Expr* failed,
                                       const std::vector<std::string_view>& typeMark) {
   std::vector<std::vector<std::string>> named;
   for (const UseClause& use : entity.uses)
     if (!use.context) named.push_back(use.names);
+  // Selected names in the expression: pkg.NAME and lib.pkg.NAME.
+  std::vector<const Expr*> work;
+  if (failed != nullptr && inArena(entity.arena, *failed)) work.push_back(failed);
+  while (!work.empty()) {
+    const Expr& e = *work.back();
+    work.pop_back();
+    for (ExprId id : {e.a, e.b})
+      if (id != kNoExpr) work.push_back(&entity.arena[static_cast<size_t>(id)]);
+    for (ExprId arg : e.args) work.push_back(&entity.arena[static_cast<size_t>(arg)]);
+    if (e.kind != ExprKind::Selected) continue;
+    const Expr& prefix = entity.arena[static_cast<size_t>(e.a)];
+    if (prefix.kind == ExprKind::Name) {
+      if (entity.find(prefix.key) == nullptr) named.push_back({prefix.key, e.key});
+    } else if (prefix.kind == ExprKind::Selected) {
+      const Expr& library = entity.arena[static_cast<size_t>(prefix.a)];
+      if (library.kind == ExprKind::Name) named.push_back({library.key, prefix.key, e.key});
+    }
+  }
   if (typeMark.size() >= 2) {
     std::vector<std::string> mark;
     for (std::string_view part : typeMark) mark.push_back(normalizeName(part));
@@ -310,7 +328,7 @@ std::string Describer::failureHint(UnitScope& entity, const Expr* failed,
     }
   }
   if (reason.empty() || reason.find("is not declared") != std::string::npos) {
-    std::string package = missingPackage(entity, typeMark);
+    std::string package = missingPackage(entity, failed, typeMark);
     if (!package.empty())
       return "package '" + package + "' is not in any design file; add the file that declares it";
   }

@@ -60,7 +60,8 @@ class Describer {
   TypeInfo classify(UnitScope* unit, const SubtypeIndication& subtype, int depth);
   std::optional<std::string> literalText(const TypeInfo& type, const Value& value) const;
   const Decl* genericWithoutValue(UnitScope& entity, const Expr& failed) const;
-  std::string missingPackage(UnitScope& entity, const std::vector<std::string_view>& typeMark);
+  std::string missingPackage(UnitScope& entity, const Expr* failed,
+                             const std::vector<std::string_view>& typeMark);
 
   Design& m_Design;
   Evaluator& m_Evaluator;
