@@ -52,21 +52,23 @@ Decl* findGeneric(UnitScope& entity, const std::string& key) {
   return nullptr;
 }
 
-bool inArena(const ExprArena& arena, const Expr& e) {
-  for (const Expr& x : arena)
-    if (&x == &e) return true;
-  return false;
-}
-
 }  // namespace
 
-void Describer::applyOverrides(UnitScope& entity,
+void Describer::applyOverrides(UnitScope& entity, const std::vector<InterfaceText>& texts,
                                const std::vector<std::pair<std::string, std::string>>& overrides) {
   for (const auto& [name, text] : overrides) {
-    Decl* generic = findGeneric(entity, normalizeName(name));
-    if (generic == nullptr) continue;
+    std::string key = normalizeName(name);
     m_OverrideSources.push_back(SourceBuffer::fromText("-g " + name, text));
     const SourceBuffer& source = *m_OverrideSources.back();
+    Decl* generic = findGeneric(entity, key);
+    if (generic == nullptr) {
+      for (const InterfaceText& declared : texts)
+        if (declared.kind != InterfaceText::Kind::Object && normalizeName(declared.name) == key)
+          m_Diagnostics.error(source, 0,
+                              "-g " + name + ": generic '" + std::string(declared.name) +
+                                  "' is not a constant; -g gives values to constant generics only");
+      continue;
+    }
     auto scope = std::make_unique<UnitScope>();
     scope->record = entity.record;
     scope->source = &source;
@@ -117,14 +119,16 @@ std::vector<ScanGeneric> Describer::generics(UnitScope& entity,
     }
     generic.typeText = text.typeText;
     generic.defaultText = text.defaultText;
-    if (text.kind == InterfaceText::Kind::Object) {
-      for (Decl& decl : entity.decls) {
-        Value value;
-        if (decl.offset != text.offset || decl.kind != DeclKind::Generic) continue;
-        if (m_Evaluator.constant(&entity, decl, value))
-          generic.value = literalText(classify(&entity, decl.subtype, 0), value);
-        break;
-      }
+    const std::vector<size_t>* named = text.kind == InterfaceText::Kind::Object
+                                           ? entity.find(normalizeName(text.name))
+                                           : nullptr;
+    for (size_t i = 0; named != nullptr && i < named->size(); ++i) {
+      Decl& decl = entity.decls[(*named)[i]];
+      Value value;
+      if (decl.offset != text.offset || decl.kind != DeclKind::Generic) continue;
+      if (m_Evaluator.constant(&entity, decl, value))
+        generic.value = literalText(classify(&entity, decl.subtype, 0), value);
+      break;
     }
     out.push_back(std::move(generic));
   }
@@ -237,7 +241,6 @@ ScanPort::Kind Describer::portKind(UnitScope& entity, const SubtypeIndication& s
 // Follows the names of `failed` and of the defaults of the generics it uses, so a width
 // taken from a generic whose default uses another generic names the one to give.
 const Decl* Describer::genericWithoutValue(UnitScope& entity, const Expr& failed) const {
-  if (!inArena(entity.arena, failed)) return nullptr;  // a package's range sees no generics
   std::vector<const Expr*> work{&failed};
   std::vector<const Decl*> seen;
   while (!work.empty()) {
@@ -270,7 +273,7 @@ std::string Describer::missingPackage(UnitScope& entity, const Expr* failed,
     if (!use.context) named.push_back(use.names);
   // Selected names in the expression: pkg.NAME and lib.pkg.NAME.
   std::vector<const Expr*> work;
-  if (failed != nullptr && inArena(entity.arena, *failed)) work.push_back(failed);
+  if (failed != nullptr) work.push_back(failed);
   while (!work.empty()) {
     const Expr& e = *work.back();
     work.pop_back();
@@ -302,16 +305,24 @@ std::string Describer::missingPackage(UnitScope& entity, const Expr* failed,
   return "";
 }
 
-const SourceBuffer* Describer::sourceOf(UnitScope& entity, const SubtypeIndication& subtype,
-                                        const Expr& failed) {
-  if (inArena(entity.arena, failed)) return entity.source;
+UnitScope* Describer::ownerOf(UnitScope& entity, const SubtypeIndication& subtype,
+                              const Expr& failed) {
+  // The evaluator names the first index range, or the range constraint, of a subtype
+  // along the port's type; comparing addresses with those few candidates is enough.
+  auto holds = [&failed](UnitScope& unit, const std::vector<ExprId>& index, ExprId range) {
+    if (!index.empty() && &unit.arena[static_cast<size_t>(index[0])] == &failed) return true;
+    return range != kNoExpr && &unit.arena[static_cast<size_t>(range)] == &failed;
+  };
+  if (holds(entity, subtype.indexConstraint, subtype.rangeConstraint)) return &entity;
   UnitScope* unit = &entity;
   const SubtypeIndication* s = &subtype;
   for (int depth = 0; depth <= kMaxTypeChain && s->valid(); ++depth) {
     auto [owner, decl] = m_Evaluator.declarationOf(EvalContext{unit, nullptr}, s->typeMark);
     if (decl == nullptr) return nullptr;
-    if (inArena(owner->arena, failed)) return owner->source;
+    if (decl->kind == DeclKind::ArrayType)
+      return holds(*owner, decl->indexRanges, kNoExpr) ? owner : nullptr;
     if (decl->kind != DeclKind::Subtype) return nullptr;
+    if (holds(*owner, decl->subtype.indexConstraint, decl->subtype.rangeConstraint)) return owner;
     unit = owner;
     s = &decl->subtype;
   }

@@ -21,11 +21,14 @@ class Describer {
   Describer(Design& design, Evaluator& evaluator, Diagnostics& diagnostics)
       : m_Design(design), m_Evaluator(evaluator), m_Diagnostics(diagnostics) {}
 
-  /// Gives each generic of `entity` named in `overrides` (names ignore case) the value of
-  /// its VHDL expression before anything reads it. Names that match no generic are left to
-  /// the caller. A value that cannot be evaluated is reported as an error, and the generic
-  /// then fails every evaluation with that reason instead of falling back to its default.
-  void applyOverrides(UnitScope& entity,
+  /// Gives each constant generic of `entity` named in `overrides` (names ignore case) the
+  /// value of its VHDL expression before anything reads it; the expression sees the entity's
+  /// use clauses and the generics' values as they stand at that point, in command-line
+  /// order. Names that match no generic of `texts` are left to the caller; naming a type,
+  /// package or subprogram generic is an error. A value that cannot be evaluated is reported
+  /// as an error, and the generic then fails every evaluation with that reason instead of
+  /// falling back to its default.
+  void applyOverrides(UnitScope& entity, const std::vector<InterfaceText>& texts,
                       const std::vector<std::pair<std::string, std::string>>& overrides);
 
   /// The generics of `entity` in declaration order, from their texts; source lines are
@@ -35,14 +38,15 @@ class Describer {
   /// The kind of a port of `subtype`, declared in `entity`.
   ScanPort::Kind portKind(UnitScope& entity, const SubtypeIndication& subtype);
 
-  /// The source holding `failed`, an expression met while evaluating a port of `subtype`:
-  /// the entity's or that of a package along the type's subtypes. Null when none is found.
-  const SourceBuffer* sourceOf(UnitScope& entity, const SubtypeIndication& subtype,
-                               const Expr& failed);
+  /// The unit whose expressions hold `failed`, an expression the evaluator named for a
+  /// port of `subtype`: the entity, or a package along the type's subtypes. Null when it is
+  /// none of those.
+  UnitScope* ownerOf(UnitScope& entity, const SubtypeIndication& subtype, const Expr& failed);
 
   /// Why a port range failed and how to fix it: a generic without a value (and the `-g` to
   /// give), a package no design file declares, else the evaluator's `reason`. `failed` is
-  /// the expression that could not be evaluated, when known; `typeMark` the port's type.
+  /// the expression that could not be evaluated when it is one of the entity's (null
+  /// otherwise); `typeMark` the port's type.
   std::string failureHint(UnitScope& entity, const Expr* failed,
                           const std::vector<std::string_view>& typeMark,
                           const std::string& reason);

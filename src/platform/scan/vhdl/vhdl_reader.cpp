@@ -4,6 +4,7 @@
 
 #include <algorithm>
 #include <optional>
+#include <unordered_map>
 
 #include "platform/scan/common/diagnostics.h"
 #include "platform/scan/vhdl/vhdl_header_text.h"
@@ -115,30 +116,33 @@ std::string VhdlReader::contextOf(const UnitRecord& unit) const {
 bool VhdlReader::readUnit(UnitDescription& unit) {
   if (m_Selected == nullptr) return true;
   UnitScope* scope = m_Design.entity(*m_Selected);
+  HeaderText header = readHeaderText(scope->source->text(), m_Selected->offset);
   if (m_OverridesApplied != scope) {
-    m_Describer.applyOverrides(*scope, m_Settings.genericOverrides);
+    m_Describer.applyOverrides(*scope, header.generics, m_Settings.genericOverrides);
     m_OverridesApplied = scope;
   }
-  HeaderText header = readHeaderText(scope->source->text(), m_Selected->offset);
   LineCounter lines(scope->source->text());
   unit.generics = m_Describer.generics(*scope, header.generics);
   for (size_t i = 0; i < unit.generics.size(); ++i)
     unit.generics[i].sourceLine = lines.lineOf(header.generics[i].offset);
   unit.context = contextOf(*m_Selected);
-  for (const Decl& decl : scope->decls)
-    if (decl.kind == DeclKind::Port)
-      unit.ports.push_back(readPort(*scope, decl, header.ports, lines.lineOf(decl.offset)));
+  std::unordered_map<size_t, const InterfaceText*> texts;
+  for (const InterfaceText& text : header.ports) texts.emplace(text.offset, &text);
+  for (const Decl& decl : scope->decls) {
+    if (decl.kind != DeclKind::Port) continue;
+    auto text = texts.find(decl.offset);
+    unit.ports.push_back(readPort(*scope, decl, text == texts.end() ? nullptr : text->second,
+                                  lines.lineOf(decl.offset)));
+  }
   return true;
 }
 
-ScanPort VhdlReader::readPort(UnitScope& entity, const Decl& decl,
-                              const std::vector<InterfaceText>& texts, int line) {
+ScanPort VhdlReader::readPort(UnitScope& entity, const Decl& decl, const InterfaceText* text,
+                              int line) {
   const SourceBuffer& source = *entity.source;
   std::string typeName = decl.subtype.valid() ? std::string(decl.subtype.typeMark.back()) : "";
   ScanPort port(std::string(decl.name), typeName, static_cast<int>(decl.mode), line);
-  port.setDeclaredType(typeName);
-  for (const InterfaceText& text : texts)
-    if (text.offset == decl.offset) port.setDeclaredType(text.typeText);
+  port.setDeclaredType(text ? text->typeText : typeName);
   RangeValue range;
   const Expr* failed = nullptr;
   std::string name(decl.name);
@@ -161,18 +165,19 @@ ScanPort VhdlReader::readPort(UnitScope& entity, const Decl& decl,
                             "port '" + name + "' has an unconstrained type; no range reported");
       break;
     case Evaluator::Shape::Failed: {
-      const SourceBuffer* holder =
-          failed ? m_Describer.sourceOf(entity, decl.subtype, *failed) : nullptr;
-      std::string_view text =
-          holder ? holder->text().substr(failed->begin, failed->end - failed->begin) : "";
-      std::string what = holder ? oneLine(text) : std::string("its range");
+      // The expression may be a package's, in another file.
+      UnitScope* owner = failed ? m_Describer.ownerOf(entity, decl.subtype, *failed) : nullptr;
+      std::string_view text = owner ? owner->source->text() : std::string_view();
+      std::string what = owner ? oneLine(text.substr(failed->begin, failed->end - failed->begin))
+                               : std::string("its range");
       m_Diagnostics.warning(source, decl.offset,
                             "port '" + name + "': cannot evaluate " + what + " (" + reason +
                                 "); no range reported");
       std::string expression =
-          holder ? normalizedText(holder->text(), failed->begin, failed->end) : "its range";
+          owner ? normalizedText(text, failed->begin, failed->end) : std::string("its range");
+      const Expr* own = owner == &entity ? failed : nullptr;
       port.setRangeUnknown("port '" + name + "': cannot evaluate " + expression + ": " +
-                           m_Describer.failureHint(entity, failed, decl.subtype.typeMark, reason));
+                           m_Describer.failureHint(entity, own, decl.subtype.typeMark, reason));
       break;
     }
     case Evaluator::Shape::Unknown: {

@@ -34,8 +34,7 @@ class VhdlReader final : public LanguageReader {
   const DesignIndex& index() const { return m_Index; }
 
  private:
-  ScanPort readPort(UnitScope& entity, const Decl& decl, const std::vector<InterfaceText>& texts,
-                    int line);
+  ScanPort readPort(UnitScope& entity, const Decl& decl, const InterfaceText* text, int line);
   std::string contextOf(const UnitRecord& unit) const;
 
   Diagnostics& m_Diagnostics;

@@ -3,6 +3,7 @@
 // and the listing of every unit read.
 #include <gtest/gtest.h>
 
+#include <cstdio>
 #include <string>
 #include <utility>
 #include <vector>
@@ -21,22 +22,32 @@ struct Described {
   bool found = false;
   scan::UnitDescription unit;
   std::vector<ScanUnitInfo> units;
+  std::string messages;
 };
 
 // Reads `texts` (file i is "f<i>.vhd" in library work) and describes `unit`.
 Described describe(const std::vector<std::string>& texts, const char* unit,
                    const Overrides& overrides = {}) {
-  scan::Diagnostics diagnostics(nullptr);
-  ScanSettings settings;
-  settings.genericOverrides = overrides;
-  scan::vhdl::VhdlReader reader(diagnostics, settings);
-  for (size_t i = 0; i < texts.size(); ++i)
-    reader.indexSource(scan::SourceBuffer::fromText("f" + std::to_string(i) + ".vhd", texts[i]),
-                       "work");
+  std::FILE* log = std::tmpfile();
   Described out;
-  out.found = reader.selectUnit("work", unit);
-  if (out.found) reader.readUnit(out.unit);
-  out.units = reader.listUnits();
+  {
+    scan::Diagnostics diagnostics(log);
+    ScanSettings settings;
+    settings.genericOverrides = overrides;
+    scan::vhdl::VhdlReader reader(diagnostics, settings);
+    for (size_t i = 0; i < texts.size(); ++i)
+      reader.indexSource(
+          scan::SourceBuffer::fromText("f" + std::to_string(i) + ".vhd", texts[i]), "work");
+    out.found = reader.selectUnit("work", unit);
+    if (out.found) reader.readUnit(out.unit);
+    out.units = reader.listUnits();
+  }
+  if (log != nullptr) {
+    std::rewind(log);
+    char buffer[4096];
+    for (size_t n; (n = std::fread(buffer, 1, sizeof buffer, log)) > 0;) out.messages.append(buffer, n);
+    std::fclose(log);
+  }
   return out;
 }
 
@@ -284,6 +295,30 @@ TEST(VhdlDescription, UnevaluableRangesAreUnknownWithTheFix) {
     EXPECT_EQ(rangeOf(*p), c.range);
     EXPECT_FALSE(p->hasRange());
   }
+}
+
+TEST(VhdlDescription, OverrideMistakesAreErrors) {
+  const char* kEntity =
+      "entity e is generic (type T; WIDTH : natural := 4);\n"
+      "  port (d : in bit_vector(WIDTH-1 downto 0)); end;\n";
+  struct Case {
+    Overrides overrides;
+    const char* message;
+  };
+  const Case cases[] = {
+      {{{"WIDTH", "nope"}}, "-g WIDTH:1:1: error: -g WIDTH: cannot evaluate the value: 'nope' is not declared"},
+      {{{"width", "3 4"}}, "-g width:1:3: error: -g width: unexpected '4' after the value"},
+      {{{"WIDTH", ")"}}, "-g WIDTH:1:1: error: "},
+      {{{"t", "integer"}},
+       "-g t:1:1: error: -g t: generic 'T' is not a constant; -g gives values to constant "
+       "generics only"},
+  };
+  for (const Case& c : cases) {
+    SCOPED_TRACE(c.message);
+    Described d = describe({kEntity}, "e", c.overrides);
+    EXPECT_NE(d.messages.find(c.message), std::string::npos) << d.messages;
+  }
+  EXPECT_EQ(describe({kEntity}, "e", {{"WIDTH", "2"}, {"OTHER", "1"}}).messages, "");
 }
 
 TEST(VhdlDescription, InterfaceTextsAsWrittenWithBlanksNormalised) {
