@@ -258,9 +258,10 @@ const Decl* Describer::genericWithoutValue(UnitScope& entity, const Expr& failed
         std::find(seen.begin(), seen.end(), generic) != seen.end())
       continue;
     seen.push_back(generic);
-    bool overridden =
-        std::find(m_Overridden.begin(), m_Overridden.end(), generic) != m_Overridden.end();
-    if (generic->init == kNoExpr && !overridden) return generic;
+    // A failed -g value names itself in the reason.
+    if (std::find(m_Overridden.begin(), m_Overridden.end(), generic) != m_Overridden.end())
+      continue;
+    if (generic->init == kNoExpr) return generic;
     push(generic->init);
   }
   return nullptr;
