@@ -419,4 +419,26 @@ TEST(VhdlDescription, TruncatedHeadersDescribeWhatWasRead) {
   }
 }
 
+TEST(VhdlDescription, ReachesTheExtractorWithItsSettings) {
+  ScanExtractor extractor;
+  ScanSettings settings;
+  settings.genericOverrides = {{"width", "5"}, {"NOPE", "1"}, {"Depth", "1"}};
+  extractor.configure(settings);
+  extractor.addDesignFile("work", vhdl_test::fixture("describe_top.vhd").c_str(),
+                          ScanExtractor::Vhdl);
+  testing::internal::CaptureStderr();
+  extractor.Parse(ScanExtractor::Vhdl);
+  ASSERT_EQ(extractor.findDesignUnit("work", "DESCRIBE_OPEN", ScanExtractor::SearchAllLibraries),
+            0);
+  ScanPortList* ports = extractor.getPorts();
+  testing::internal::GetCapturedStderr();
+  ASSERT_EQ(ports->size(), 3u);
+  EXPECT_EQ(rangeOf(*ports->firstPort()), "4 downto 0");
+  EXPECT_EQ(extractor.getContext(), "library ieee;\nuse ieee.std_logic_1164.all;");
+  ASSERT_EQ(extractor.getGenerics().size(), 2u);
+  EXPECT_EQ(extractor.getGenerics()[1].value.value_or("<none>"), "1");
+  EXPECT_EQ(extractor.unknownOverrides(), std::vector<std::string>{"NOPE"});
+  EXPECT_EQ(extractor.listUnits().size(), 3u);
+}
+
 }  // namespace
