@@ -98,9 +98,13 @@ std::vector<ScanUnitInfo> VhdlReader::listUnits() const {
       lines.emplace(source.text());
     }
     std::string_view name = unitNameAt(source.text(), record.offset);
-    out.push_back(ScanUnitInfo{record.library, kindName(record.kind),
-                               name.empty() ? record.name : std::string(name), source.path(),
-                               lines->lineOf(record.offset)});
+    ScanUnitInfo info;
+    info.library = record.library;
+    info.kind = kindName(record.kind);
+    info.name = name.empty() ? record.name : std::string(name);
+    info.file = source.path();
+    info.line = lines->lineOf(record.offset);
+    out.push_back(std::move(info));
   }
   return out;
 }
