@@ -11,6 +11,7 @@
 
 #include "platform/scan/common/diagnostics.h"
 #include "platform/scan/verilog/verilog_reader.h"
+#include "platform/scan/verilog/verilog_text.h"
 
 namespace {
 
@@ -374,17 +375,17 @@ struct SearchCase {
 TEST(VerilogCommandLineTest, IncludeFoldersAndMacros) {
   const std::vector<SearchCase> cases = {
       {"IncludeFolderBeforeTheEnvironment",
-       {fixture("include_first")},
-       "include_second",
+       {fixture("search/first")},
+       "search/second",
        {{"DEFINED_WIDTH", "3"}},
        {"a in '[`DESC_WIDTH-1:0]' vector [5:0]", "b in '[`DEFINED_WIDTH-1:0]' vector [2:0]"}},
       {"EnvironmentAlone",
        {},
-       "include_second",
+       "search/second",
        {{"DEFINED_WIDTH", "2 + 2"}},
        {"a in '[`DESC_WIDTH-1:0]' vector [9:0]", "b in '[`DEFINED_WIDTH-1:0]' vector [3:0]"}},
       {"MacroWithoutTextIsOne",
-       {fixture("include_second"), fixture("include_first")},
+       {fixture("search/second"), fixture("search/first")},
        "",
        {{"DEFINED_WIDTH", std::nullopt}},
        {"a in '[`DESC_WIDTH-1:0]' vector [9:0]", "b in '[`DEFINED_WIDTH-1:0]' vector [0:0]"}},
@@ -396,7 +397,7 @@ TEST(VerilogCommandLineTest, IncludeFoldersAndMacros) {
     ScanSettings settings;
     settings.includeDirectories = c.includeDirectories;
     settings.macros = c.macros;
-    Read result = read({{"include_order.v"}, "", "include_order", settings});
+    Read result = read({{"search/include_order.v"}, "", "include_order", settings});
     ASSERT_TRUE(result.found);
     EXPECT_EQ(result.ports, c.ports);
   }
@@ -458,6 +459,21 @@ TEST(VerilogListingTest, EveryUnitInFileOrder) {
                               "work module r t.sv:2",
                               "work module described t.sv:4",
                           }));
+}
+
+TEST(VerilogWrittenTextTest, DropsCommentsAndKeepsLiteralsAndEscapedNames) {
+  const std::vector<std::pair<std::string, std::string>> cases = {
+      {"  logic\t[W-1:0]\r\n ", "logic [W-1:0]"},
+      {"\"a // b /* c */\"  // d", "\"a // b /* c */\""},
+      {"\"q\\\" //\"  +  1", "\"q\\\" //\" + 1"},
+      {"\\bus[0]  [3:0]", "\\bus[0] [3:0]"},
+      {"a /* one\ntwo */b", "a b"},
+      {"x /* never closed", "x"},
+      {"\"never closed", "\"never closed"},
+      {std::string("n\0m", 3), std::string("n\0m", 3)},
+      {"", ""},
+  };
+  for (const auto& [text, want] : cases) EXPECT_EQ(scan::verilog::normaliseWritten(text), want);
 }
 
 }  // namespace
