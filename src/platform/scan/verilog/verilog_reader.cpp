@@ -165,7 +165,9 @@ bool VerilogReader::readUnit(UnitDescription& unit) {
 // expression that uses it follows. Names that are no parameter are the extractor's to report.
 bool VerilogReader::applyOverrides(UnitModel& model, UnitReader& reader) {
   bool ok = true;
-  for (const auto& [name, text] : m_Settings.genericOverrides) {
+  for (const auto& override : m_Settings.genericOverrides) {
+    const std::string& name = override.first;
+    const std::string& text = override.second;
     auto declared = std::find_if(model.parameters.begin(), model.parameters.end(),
                                  [&](const ParameterDeclaration& p) { return p.name == name; });
     auto parameter = model.scope.parameters.find(name);

@@ -519,6 +519,7 @@ std::vector<std::string> UnitReader::readImports(const std::vector<Place>& place
 
 bool UnitReader::readValue(const SourceBuffer& buffer, bool isType, ExprPtr& value,
                            std::shared_ptr<TypeSpec>& type) {
+  size_t errors = m_Diagnostics.errorCount();
   MacroTable macros = m_Macros.replay(m_Macros.logSize());
   Preprocessor pre(&m_Diagnostics, macros, m_Sources);
   pre.start(buffer, 0, 0);
@@ -533,7 +534,8 @@ bool UnitReader::readValue(const SourceBuffer& buffer, bool isType, ExprPtr& val
   if (!parser.failed() && !tokens.atEnd())
     parser.fail("unexpected '" + std::string(tokens.peek().text.substr(0, 40)) +
                 "' after the value");
-  if (!parser.failed()) return true;
+  // The lexer reports what it skipped (an unterminated string or comment) on its own.
+  if (!parser.failed()) return m_Diagnostics.errorCount() == errors;
   const Token& at = parser.errorAt();
   if (at.source)
     m_Diagnostics.error(*at.source, at.offset, parser.errorText());

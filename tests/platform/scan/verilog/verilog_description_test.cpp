@@ -443,6 +443,27 @@ TEST(VerilogCommandLineTest, BadValuesAreErrorsNamingTheSwitch) {
   EXPECT_EQ(result.ports, std::vector<std::string>{"a in '[W:0]' vector [1:0]"});
 }
 
+TEST(VerilogCommandLineTest, HostileValuesEndInMessages) {
+  const std::vector<std::string> values = {
+      std::string("1\0", 2), "`NO_SUCH_MACRO", std::string(100000, '('), "\"open", "1 /* open"};
+  for (const std::string& value : values) {
+    SCOPED_TRACE(value.substr(0, 20));
+    ScanSettings settings;
+    settings.genericOverrides = {{"W", value}};
+    settings.macros = {{"LINES", "1 +\n 2"}, {"OTHER", value}};
+    Read result = read({{},
+                        "module m #(parameter W = 1) (input [W:0] a, input [`LINES:0] b);\n"
+                        "endmodule\n",
+                        "m",
+                        settings});
+    ASSERT_TRUE(result.found);
+    EXPECT_FALSE(result.ok);
+    EXPECT_FALSE(result.messages.empty());
+    ASSERT_EQ(result.ports.size(), 2u);
+    EXPECT_EQ(result.ports[1], "b in '[`LINES:0]' vector [3:0]");
+  }
+}
+
 TEST(VerilogListingTest, EveryUnitInFileOrder) {
   Read result = read({{"described.sv"},
                       "program p; endprogram\nmacromodule r (input a); endmodule\n"
