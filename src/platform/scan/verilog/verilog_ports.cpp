@@ -206,10 +206,9 @@ class PortBuilder {
     if (!problem.empty()) port.setRangeUnknown(problem);
     if (range.present) {
       if (!fitsBound(range.left) || !fitsBound(range.right)) {
-        std::string text = "the range of port '" + name + "' does not fit 32-bit bounds";
-        warn(source, offset, text);
-        port.setRangeUnknown("port '" + name + "': " + rangeText(range) + " does not fit " +
-                             "32-bit bounds");
+        warn(source, offset, "the range of port '" + name + "' does not fit 32-bit bounds");
+        port.setRangeUnknown("port '" + name + "': " + rangeText(range) +
+                             " does not fit 32-bit bounds");
       } else {
         port.setRange(static_cast<int32_t>(range.left), static_cast<int32_t>(range.right),
                       range.left < range.right);
@@ -249,8 +248,7 @@ class PortBuilder {
       const TypeSpec* found =
           depth > 32 ? nullptr : m_Evaluator.findType(current->scope, current->name, *scope, owner);
       if (!found) return Kind::Other;
-      if (owner->typedefs.count(current->name) && owner->unpackedTypedefs.count(current->name))
-        return Kind::Array;
+      if (owner->unpackedTypedefs.count(current->name)) return Kind::Array;
       current = found;
       scope = owner;
     }

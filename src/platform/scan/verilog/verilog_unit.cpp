@@ -116,11 +116,7 @@ void readImports(Parser& parser, Scope& scope, std::vector<std::string>* written
       return;
     }
   } while (tokens.acceptSymbol(","));
-  if (!parser.expectSymbol(";")) return;
-  if (written) {
-    if (text.back() == ' ') text.pop_back();
-    written->push_back(text + ";");
-  }
+  if (parser.expectSymbol(";") && written) written->push_back(text + ";");
 }
 
 // A type written as a value (`parameter type T = word_t`, `-g T=...`): a bare type name is
