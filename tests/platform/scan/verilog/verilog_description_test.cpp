@@ -242,6 +242,27 @@ const std::vector<DescriptionCase>& descriptionCases() {
        {"W 'int' = '4 + 1' -> 5 @2"},
        {"a in 'logic [W-1 :0]' vector [4:0]"},
        ""},
+      {"FifoHeaderAsFoundInTheWild",
+       {{},
+        "module fifo #(\n"
+        "  parameter int unsigned DEPTH = 8,\n"
+        "  parameter bit FALL_THROUGH = 1'b0,\n"
+        "  parameter type dtype = logic [7:0],\n"
+        "  parameter int unsigned ADDR_DEPTH = (DEPTH > 1) ? $clog2(DEPTH) : 1\n"
+        ") (\n"
+        "  input  logic clk_i,\n"
+        "  input  dtype data_i,\n"
+        "  output logic [ADDR_DEPTH-1:0] usage_o\n"
+        ");\n"
+        "endmodule\n",
+        "fifo",
+        overrides({{"DEPTH", "32"}})},
+       {"DEPTH 'int unsigned' = '8' -> 32 @2", "FALL_THROUGH 'bit' = '1'b0' -> 0 @3",
+        "dtype type 'type' = 'logic [7:0]' -> none @4",
+        "ADDR_DEPTH 'int unsigned' = '(DEPTH > 1) ? $clog2(DEPTH) : 1' -> 5 @5"},
+       {"clk_i in 'logic' bit -", "data_i in 'dtype' vector [7:0]",
+        "usage_o out 'logic [ADDR_DEPTH-1:0]' vector [4:0]"},
+       ""},
       {"SelectsAndConcatenationsHaveTheirEvaluatedRange",
        {{},
         "module m (.p(x[5:2]), .q({x, y}), y);\n"
