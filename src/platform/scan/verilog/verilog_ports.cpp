@@ -237,8 +237,9 @@ class PortBuilder {
 
   ScanPort::Kind kindOf(const TypeSpec& type, bool unpacked) {
     using Kind = ScanPort::Kind;
-    if (unpacked) return Kind::Array;
+    // An array of interfaces is still connected by name, as an interface.
     if (type.isInterface) return Kind::Interface;
+    if (unpacked) return Kind::Array;
     size_t dims = 0;
     const TypeSpec* current = &type;
     Scope* scope = &m_Model.scope;

@@ -198,7 +198,7 @@ const std::vector<DescriptionCase>& descriptionCases() {
        ""},
       {"InterfacePortsOfAnInterfaceNoFileDeclares",
        {{},
-        "module m (input clk, output logic o, bus_if m, bus_if.slave s, interface i);\n"
+        "module m (input clk, output logic o, bus_if m, bus_if.slave s [2], interface i);\n"
         "endmodule\n",
         "m",
         {}},
