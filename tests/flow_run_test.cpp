@@ -178,10 +178,11 @@ TEST(FlowRun, DeleteOnErrorOnTheTclPathRemovesWhatTheScriptWrote) {
     ASSERT_TRUE(dir.write("work/design.vhd", kDesign) && dir.write("work/t.tcl", "\n"));
     std::vector<std::string> args = argsFor("top", "t.tcl");
     if (deleteOnError) args.push_back("-deleteonerror");
-    const char* path = std::getenv("PATH");
-    const RunResult run = runPinforge(
-        args, dir.file("work"),
-        {{"PATH", dir.file("bin") + ":" + (path != nullptr ? path : "/usr/bin:/bin")}});
+    // runscr is taken from beside the program first, so the program runs from bin/ too.
+    std::error_code error;
+    ASSERT_TRUE(std::filesystem::copy_file(binaryPath(), dir.file("bin/pinforge"), error));
+    args.insert(args.begin(), dir.file("bin/pinforge"));
+    const RunResult run = runProgram(args, dir.file("work"));
     EXPECT_EQ(run.status, 1) << run.out << run.err;
     EXPECT_EQ(dir.read("work/out.txt"), deleteOnError ? "<missing>" : "partial\n");
   }

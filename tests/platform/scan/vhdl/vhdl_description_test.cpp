@@ -331,7 +331,7 @@ TEST(VhdlDescription, InterfaceTextsAsWrittenWithBlanksNormalised) {
        "           pure function f return natural is g);\n"
        "  port (signal x, y : inout (resolved) std_ulogic_vector(1 downto 0) bus := \"00\";\n"
        "        z : resolved std_ulogic; \\Odd  Name\\ : out bit;\n"
-       "        t : in bit"},
+       "        t : in bit"},  // cut off before its ';': never a port
       "e");
   ASSERT_TRUE(d.found);
   using K = ScanGeneric::Kind;
@@ -346,7 +346,7 @@ TEST(VhdlDescription, InterfaceTextsAsWrittenWithBlanksNormalised) {
   EXPECT_EQ(types, (std::vector<std::string>{
                        "x: (resolved) std_ulogic_vector(1 downto 0)",
                        "y: (resolved) std_ulogic_vector(1 downto 0)", "z: resolved std_ulogic",
-                       "\\Odd  Name\\: bit", "t: bit"}));
+                       "\\Odd  Name\\: bit"}));
 }
 
 TEST(VhdlDescription, ContextClauseOfTheUnitOnly) {
