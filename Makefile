@@ -40,7 +40,7 @@ fuzz:
 	sh tools/fuzz.sh $(FUZZ_BUILD) $(FUZZ_SECONDS)
 
 demo: build
-	sh examples/demo.sh $(BUILD)/pinforge
+	sh examples/demo.sh $(BUILD)/pinforge $(BUILD)/demo
 
 install: build
 	cmake --install $(BUILD) --prefix $(PREFIX)

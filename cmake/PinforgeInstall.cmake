@@ -13,8 +13,8 @@ set(PINFORGE_INSTALL_FOLDERS
   ${CMAKE_INSTALL_MANDIR}/man1
   ${CMAKE_INSTALL_DATADIR}/bash-completion/completions)
 
-# Runs before anything is copied: which of the destination folders (and their parents below
-# the prefix) exist already.
+# Runs before anything is copied: which of the destination folders and their parents exist
+# already.
 install(CODE "set(PINFORGE_FOLDERS \"${PINFORGE_INSTALL_FOLDERS}\")" COMPONENT pinforge)
 install(CODE [[
   set(pinforge_root "$ENV{DESTDIR}${CMAKE_INSTALL_PREFIX}")
@@ -23,10 +23,15 @@ install(CODE [[
     if(NOT IS_ABSOLUTE "${folder}")
       set(folder "${pinforge_root}/${folder}")
     endif()
-    while(NOT folder STREQUAL pinforge_root AND NOT folder STREQUAL "/" AND NOT folder STREQUAL "")
+    # Up to the root: a prefix that does not exist yet is created by the install too.
+    cmake_path(SET folder NORMALIZE "${folder}")
+    string(REGEX REPLACE "(.)/+$" "\\1" folder "${folder}")
+    set(parent "")
+    while(NOT folder STREQUAL parent)
       if(IS_DIRECTORY "${folder}")
         list(APPEND pinforge_existing "${folder}")
       endif()
+      set(parent "${folder}")
       get_filename_component(folder "${folder}" DIRECTORY)
     endwhile()
   endforeach()
@@ -45,8 +50,8 @@ install(FILES tools/pinforge-completion.bash
         DESTINATION ${CMAKE_INSTALL_DATADIR}/bash-completion/completions RENAME pinforge
         COMPONENT pinforge)
 
-# Runs after everything is copied: every folder above an installed file, up to the prefix,
-# that did not exist before is ours. An earlier install's record is kept, so installing twice
+# Runs after everything is copied: every folder above an installed file that did not exist
+# before is ours. An earlier install's record is kept, so installing twice
 # still uninstalls cleanly.
 install(CODE "set(PINFORGE_BUILD_DIR \"${CMAKE_BINARY_DIR}\")" COMPONENT pinforge)
 install(CODE [[
@@ -61,11 +66,14 @@ install(CODE [[
   endif()
   foreach(file IN LISTS CMAKE_INSTALL_MANIFEST_FILES)
     get_filename_component(folder "${file}" DIRECTORY)
-    while(NOT folder STREQUAL pinforge_root AND NOT folder STREQUAL "/" AND NOT folder STREQUAL "")
+    cmake_path(SET folder NORMALIZE "${folder}")
+    set(parent "")
+    while(NOT folder STREQUAL parent)
       list(FIND pinforge_existing "${folder}" existed)
       if(existed EQUAL -1)
         list(APPEND created "${folder}")
       endif()
+      set(parent "${folder}")
       get_filename_component(folder "${folder}" DIRECTORY)
     endwhile()
   endforeach()
