@@ -87,16 +87,17 @@ done
 mkdir -p "$scratch/own"
 : >"$scratch/own/my_table.tmpl"
 : >"$scratch/own/my_script.tcl"
+# Runs in the scratch folder, whose file names begin with none of the words completed here.
 complete_words() {
-  PATH="$prefix/bin:$PATH" PINFORGE_TEMPLATE_PATH="$scratch/own" bash --norc --noprofile -c '
+  (cd "$scratch" && PATH="$prefix/bin:$PATH" PINFORGE_TEMPLATE_PATH="$scratch/own" bash --norc --noprofile -c '
     source "$1/share/bash-completion/completions/pinforge" || exit 1
     shift
     COMP_WORDS=("$@")
     COMP_CWORD=$(($# - 1))
     _pinforge
-    printf "%s\n" "${COMPREPLY[@]}"' complete "$prefix" "$@"
+    printf "%s\n" "${COMPREPLY[@]}"' complete "$prefix" "$@")
 }
-offered=$(cd "$scratch" && complete_words pinforge -template '')
+offered=$(complete_words pinforge -template '')
 for template in "${templates[@]}" my_table.tmpl my_script.tcl; do
   name=${template%.tmpl}
   name=${name%.tcl}
