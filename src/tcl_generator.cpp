@@ -1,6 +1,6 @@
-// The Tcl path: writes a temporary driver script that defines the run's names and the port
-// lists as Tcl variables, appends the Tcl template's text, and runs the script shell `runscr`
-// on it, found beside this program or else on PATH.
+// The Tcl path: writes a temporary driver script that defines the run's names and the design
+// data (ports, generics, declared types, context) as Tcl variables, appends the Tcl template's
+// text, and runs the script shell `runscr` on it, found beside this program or else on PATH.
 #include <cerrno>
 #include <cstdint>
 #include <cstdio>
@@ -11,6 +11,7 @@
 #include <system_error>
 
 #include "run_context.h"
+#include "tcl_driver_script.h"
 
 namespace {
 
@@ -39,58 +40,79 @@ class OutputTail : public Host::ChildOutput {
 };
 
 /// Backslash before every character Tcl would interpret inside a double-quoted word, so any
-/// name or path arrives verbatim and none can run a command.
+/// name or path arrives verbatim and none can run a command. A carriage return and ^Z are
+/// written as escapes: Tcl reads a script file with CR/LF translation and ends it at a ^Z.
 std::string tclEscaped(std::string_view text) {
   std::string result;
   result.reserve(text.size());
   for (char c : text) {
+    if (c == '\r') {
+      result += "\\r";
+      continue;
+    }
+    if (c == '\x1a') {
+      result += "\\032";
+      continue;
+    }
     if (c == '\\' || c == '"' || c == '$' || c == '[' || c == ']') result += '\\';
     result += c;
   }
   return result;
 }
 
-void appendSetLine(std::string& script, std::string_view variable, const Host::StringBase& value) {
+void appendSetLine(std::string& script, std::string_view variable, std::string_view value) {
   script += "set ";
   script += variable;
   script += " \"";
-  script += tclEscaped(value.view());
+  script += tclEscaped(value);
   script += "\"\n";
 }
 
-std::string scriptHead(const RunContext& context) {
-  std::string script =
-      "# This file drives input variables to the tcl template file\n"
-      "#   given below in the \"source\" command.\n";
-  appendSetLine(script, "ModuleName", context.m_ModuleName);
-  appendSetLine(script, "ProjectName", context.m_ProjectName);
-  appendSetLine(script, "ProjectFile", context.m_ProjectFileName);
-  appendSetLine(script, "ProjectName", context.m_ProjectName);
-  appendSetLine(script, "OutputFileName", context.m_OutputFileName);
-  appendSetLine(script, "InputFileName", context.m_InputFileName);
-  appendSetLine(script, "TemplateFileName", context.m_TemplateFileName);
-  appendSetLine(script, "ErrorFileName", context.m_ErrorFileName);
-  appendSetLine(script, "LibLocation", context.m_LibLocation);
-  script += "\n# Port Definitions\n";
+/// " \"text\"": one list item, escaped.
+std::string quotedItem(std::string_view text) { return " \"" + tclEscaped(text) + '"'; }
 
-  std::string names = "set PortName [ list ";
-  std::string lefts = "set LeftRange [ list ";
-  std::string rights = "set RightRange [ list ";
-  std::string dirs = "set PortDir [ list ";
-  int32_t count = 0;
-  StbDataList& ports = *context.m_DesignData;
-  for (PortRecord* port = ports.first(); ports.hasCurrent(); port = ports.next()) {
-    names += " \"" + tclEscaped(port->m_Name) + '"';
-    lefts += ' ' + std::to_string(port->m_Left);
-    rights += ' ' + std::to_string(port->m_Right);
-    dirs += " \"";
-    dirs += port->m_Dir;
-    dirs += '"';
-    ++count;
+/// One bound as a list item: empty when the range could not be evaluated, so a template that
+/// computes with it fails instead of using a wrong width.
+std::string boundItem(const PortRecord& port, int32_t bound) {
+  return port.isRangeUnknown() ? std::string(" \"\"") : ' ' + std::to_string(bound);
+}
+
+std::string listLine(std::string_view variable, const std::string& items) {
+  std::string line = "set ";
+  line += variable;
+  line += " [ list " + items + " ]\n";
+  return line;
+}
+
+/// The generics, the declared port types, the context and the language, behind everything
+/// the script held before them.
+std::string designDetails(StbDataList& design) {
+  std::string names;
+  std::string types;
+  std::string defaults;
+  std::string values;
+  for (const GenericRecord& generic : design.m_Generics) {
+    names += quotedItem(generic.m_Name);
+    types += quotedItem(generic.m_Type);
+    defaults += quotedItem(generic.m_Default);
+    values += quotedItem(generic.m_Value);
   }
-  for (const std::string* list : {&names, &lefts, &rights, &dirs}) script += *list + " ]\n";
-  script += "set TotalPorts " + std::to_string(count) + '\n';
-  return script;
+  std::string portTypes;
+  for (PortRecord* port = design.first(); design.hasCurrent(); port = design.next())
+    portTypes += quotedItem(port->m_DeclaredType);
+
+  std::string text = "\n# Generic Definitions\n";
+  text += listLine("GenericName", names);
+  text += listLine("GenericType", types);
+  text += listLine("GenericDefault", defaults);
+  text += listLine("GenericValue", values);
+  text += "set TotalGenerics " + std::to_string(design.m_Generics.size()) + '\n';
+  text += "\n# Declared Types and Context\n";
+  text += listLine("PortType", portTypes);
+  appendSetLine(text, "Context", design.m_Context);
+  appendSetLine(text, "Language",
+                design.m_Language == DesignLanguage::Verilog ? "verilog" : "vhdl");
+  return text;
 }
 
 bool writeAll(std::FILE* stream, std::string_view text) {
@@ -124,6 +146,44 @@ void discardScript(const std::string& name) {
 
 }  // namespace
 
+std::string tclDriverScriptHead(const RunContext& context) {
+  std::string script =
+      "# This file drives input variables to the tcl template file\n"
+      "#   given below in the \"source\" command.\n";
+  appendSetLine(script, "ModuleName", context.m_ModuleName.view());
+  appendSetLine(script, "ProjectName", context.m_ProjectName.view());
+  appendSetLine(script, "ProjectFile", context.m_ProjectFileName.view());
+  appendSetLine(script, "ProjectName", context.m_ProjectName.view());
+  appendSetLine(script, "OutputFileName", context.m_OutputFileName.view());
+  appendSetLine(script, "InputFileName", context.m_InputFileName.view());
+  appendSetLine(script, "TemplateFileName", context.m_TemplateFileName.view());
+  appendSetLine(script, "ErrorFileName", context.m_ErrorFileName.view());
+  appendSetLine(script, "LibLocation", context.m_LibLocation.view());
+  script += "\n# Port Definitions\n";
+
+  std::string names;
+  std::string lefts;
+  std::string rights;
+  std::string dirs;
+  int32_t count = 0;
+  StbDataList& ports = *context.m_DesignData;
+  for (PortRecord* port = ports.first(); ports.hasCurrent(); port = ports.next()) {
+    names += quotedItem(port->m_Name);
+    lefts += boundItem(*port, port->m_Left);
+    rights += boundItem(*port, port->m_Right);
+    dirs += " \"";
+    dirs += port->m_Dir;
+    dirs += '"';
+    ++count;
+  }
+  script += listLine("PortName", names);
+  script += listLine("LeftRange", lefts);
+  script += listLine("RightRange", rights);
+  script += listLine("PortDir", dirs);
+  script += "set TotalPorts " + std::to_string(count) + '\n';
+  return script + designDetails(ports);
+}
+
 bool RunContext::runTclGenerator() {
   // A signal from here on removes the script and stops the script shell.
   Host::Interrupt::install();
@@ -138,7 +198,7 @@ bool RunContext::runTclGenerator() {
   }
   scriptName = unambiguousPath(scriptName);
   Host::Interrupt::removeOnSignal(scriptName);
-  if (!writeAll(script, scriptHead(*this))) {
+  if (!writeAll(script, tclDriverScriptHead(*this))) {
     const int error = errno;
     std::fclose(script);
     discardScript(scriptName);
