@@ -10,6 +10,9 @@ namespace {
 
 constexpr size_t kMaxSteps = 1000000;
 constexpr int kMaxDepth = 200;
+// Expression nesting, parameters defined through parameters and nested statements all use
+// the native stack; this bound keeps hostile input well inside it, sanitizers included.
+constexpr int kMaxNesting = 1000;
 
 bool isComparison(const std::string& op) {
   return op == "==" || op == "!=" || op == "===" || op == "!==" || op == "==?" || op == "!=?" ||
@@ -43,6 +46,16 @@ uint64_t lowMask(int64_t width) {
   return width >= 64 ? ~uint64_t{0} : (uint64_t{1} << width) - 1;
 }
 
+class NestingGuard {
+ public:
+  explicit NestingGuard(int& nesting) : m_Nesting(nesting) { ++m_Nesting; }
+  ~NestingGuard() { --m_Nesting; }
+  bool tooDeep() const { return m_Nesting > kMaxNesting; }
+
+ private:
+  int& m_Nesting;
+};
+
 }  // namespace
 
 bool Evaluator::fail(std::string text) {
@@ -68,6 +81,7 @@ bool Evaluator::evaluate(const Expr& expr, Scope& scope, Value& out) {
   m_Error.clear();
   m_Steps = 0;
   m_Depth = 0;
+  m_Nesting = 0;
   return eval(expr, scope, nullptr, out);
 }
 
@@ -445,6 +459,8 @@ bool Evaluator::runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flo
   if (++m_Steps > kMaxSteps)
     return fail("constant function did not finish within " + std::to_string(kMaxSteps) +
                 " steps");
+  NestingGuard nesting(m_Nesting);
+  if (nesting.tooDeep()) return fail("evaluation is nested too deeply");
   auto truth = [&](const ExprPtr& condition, bool& result) {
     Value v;
     int64_t i = 0;
@@ -551,6 +567,8 @@ bool Evaluator::runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flo
 
 bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out) {
   if (++m_Steps > kMaxSteps) return fail("evaluation did not finish within the step limit");
+  NestingGuard nesting(m_Nesting);
+  if (nesting.tooDeep()) return fail("evaluation is nested too deeply");
   switch (expr.kind) {
     case Expr::Kind::Number:
       if (expr.unknown) return fail("a literal with x or z bits has no numeric value");
@@ -641,9 +659,29 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
     case Expr::Kind::Binary:
       break;
   }
+  // A long left-associative chain (a + b + c + ...) is one deep left spine: walk it with a
+  // loop and recurse only into the right operands, which the parser keeps shallow.
+  std::vector<const Expr*> spine;
+  const Expr* leftmost = &expr;
+  while (leftmost->kind == Expr::Kind::Binary) {
+    spine.push_back(leftmost);
+    leftmost = leftmost->args[0].get();
+  }
+  Value acc;
+  if (!eval(*leftmost, scope, locals, acc)) return false;
+  for (auto node = spine.rbegin(); node != spine.rend(); ++node) {
+    Value result;
+    if (!binary(**node, acc, scope, locals, result)) return false;
+    acc = std::move(result);
+  }
+  out = std::move(acc);
+  return true;
+}
+
+bool Evaluator::binary(const Expr& expr, const Value& a, Scope& scope, Locals* locals,
+                       Value& out) {
   const std::string& op = expr.op;
-  Value a, b;
-  if (!eval(*expr.args[0], scope, locals, a)) return false;
+  Value b;
   if (op == "&&" || op == "||") {  // short-circuit, as constant functions rely on it
     int64_t x = 0;
     bool left = a.isReal() ? a.asReal() != 0 : (toInteger(a, x) && x != 0);

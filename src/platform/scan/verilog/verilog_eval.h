@@ -31,6 +31,8 @@ class Evaluator {
   enum class Flow { Normal, Return };
 
   bool eval(const Expr& expr, Scope& scope, Locals* locals, Value& out);
+  /// Applies the binary operator `expr` to the value `a` of its left operand.
+  bool binary(const Expr& expr, const Value& a, Scope& scope, Locals* locals, Value& out);
   bool evalName(const Expr& expr, Scope& scope, Locals* locals, Value& out);
   bool evalParameter(const std::string& name, Parameter& parameter, Scope& owner, Value& out);
   bool evalSystem(const Expr& expr, Scope& scope, Locals* locals, Value& out);
@@ -52,6 +54,7 @@ class Evaluator {
   std::string m_Error;
   size_t m_Steps = 0;
   int m_Depth = 0;
+  int m_Nesting = 0;
   std::string m_ReturnName;
 };
 

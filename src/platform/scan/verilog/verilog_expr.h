@@ -17,6 +17,12 @@ struct Expr;
 using ExprPtr = std::shared_ptr<const Expr>;
 
 struct Expr {
+  Expr() = default;
+  Expr(const Expr&) = default;
+  Expr& operator=(const Expr&) = default;
+  /// Frees the subtree with a loop: a chain of 25,000 operators must not recurse as deep.
+  ~Expr();
+
   enum class Kind {
     Number,     ///< integer literal; `unknown` when it holds x or z bits
     Real,
@@ -45,6 +51,22 @@ struct Expr {
   const SourceBuffer* source = nullptr;
   size_t offset = 0;
 };
+
+inline Expr::~Expr() {
+  std::vector<ExprPtr> pending = std::move(args);
+  while (!pending.empty()) {
+    ExprPtr next = std::move(pending.back());
+    pending.pop_back();
+    // Only a node nobody else holds is freed now; take its children first so its own
+    // destructor finds none. Every node is made non-const, so casting the constness away is
+    // sound.
+    if (next.use_count() == 1) {
+      std::vector<ExprPtr>& children = const_cast<Expr&>(*next).args;
+      for (ExprPtr& child : children) pending.push_back(std::move(child));
+      children.clear();
+    }
+  }
+}
 
 struct Dimension {
   ExprPtr left;

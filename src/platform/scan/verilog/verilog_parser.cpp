@@ -269,8 +269,12 @@ ExprPtr Parser::unary() {
 }
 
 ExprPtr Parser::postfix(ExprPtr base) {
-  for (;;) {
+  for (int selects = 0;; ++selects) {
     const Token& next = m_Tokens.peek();
+    if (selects > kMaxDepth) {  // each select nests the tree one level deeper
+      fail("expression nested too deeply");
+      return nullptr;
+    }
     if (next.isSymbol("[")) {
       Token at = m_Tokens.take();
       auto select = std::const_pointer_cast<Expr>(make(Expr::Kind::Select, at));

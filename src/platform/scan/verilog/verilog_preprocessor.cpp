@@ -348,9 +348,11 @@ void Preprocessor::include(const Token& token) {
   std::string name(start, static_cast<size_t>(p - start));
   lexer().setPosition(p < end && *p == close ? p + 1 : p);
   restOfLine();
-  const SourceBuffer* file = m_Sources.findInclude(name, lexer().file());
+  std::string reason;
+  const SourceBuffer* file = m_Sources.findInclude(name, lexer().file(), reason);
   if (!file) {
-    error(token, "cannot find include file \"" + name + "\"");
+    error(token, reason.empty() ? "cannot find include file \"" + name + "\""
+                                : "cannot read include file \"" + name + "\": " + reason);
     return;
   }
   size_t depth = 0;

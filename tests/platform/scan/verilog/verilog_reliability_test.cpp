@@ -1,0 +1,137 @@
+// Hostile and truncated Verilog that must end in the right ports, the right verdict on the
+// selected unit's header and the exact messages: huge flat expressions and parameter chains
+// (generated here), header errors of every kind, and the evaluator's width rules.
+#include <gtest/gtest.h>
+
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <cstdio>
+#include <fstream>
+#include <string>
+#include <vector>
+
+#include "platform/scan/common/diagnostics.h"
+#include "platform/scan/verilog/verilog_reader.h"
+
+namespace {
+
+struct Outcome {
+  std::vector<std::string> messages;  ///< first line of every message
+  std::vector<std::string> ports;     ///< "name" or "name[left:right]"
+  bool headerOk = false;              ///< readUnit's verdict
+};
+
+Outcome read(const std::string& text) {
+  Outcome outcome;
+  std::FILE* sink = std::tmpfile();
+  {
+    scan::Diagnostics diagnostics(sink, 1000);
+    scan::verilog::VerilogReader reader(diagnostics);
+    reader.indexText("t.v", text, "work");
+    if (reader.selectUnit("work", "m")) {
+      scan::UnitDescription unit;
+      outcome.headerOk = reader.readUnit(unit);
+      for (const ScanPort& port : unit.ports) {
+        std::string shown = port.name();
+        if (port.hasRange()) {
+          int32_t left = 0, right = 0;
+          port.getBounds(left, right);
+          shown += "[" + std::to_string(left) + ":" + std::to_string(right) + "]";
+        }
+        outcome.ports.push_back(shown);
+      }
+    }
+  }
+  std::rewind(sink);
+  char line[4096];
+  while (std::fgets(line, sizeof line, sink)) {
+    std::string text(line);
+    if (!text.empty() && text.back() == '\n') text.pop_back();
+    if (text.rfind("  ", 0) != 0) outcome.messages.push_back(text);
+  }
+  std::fclose(sink);
+  return outcome;
+}
+
+std::string joined(const std::string& piece, const std::string& separator, size_t count) {
+  std::string out;
+  for (size_t i = 0; i < count; ++i) out += (i ? separator : "") + piece;
+  return out;
+}
+
+std::string parameterChain(size_t count) {
+  std::string text = "module m(output [P" + std::to_string(count - 1) + ":0] a);\n";
+  text += "localparam P0 = 0;\n";
+  for (size_t i = 1; i < count; ++i)
+    text += "localparam P" + std::to_string(i) + " = P" + std::to_string(i - 1) + " + 1;\n";
+  return text + "endmodule\n";
+}
+
+struct Case {
+  const char* label;
+  std::string text;
+  std::vector<std::string> ports;
+  bool headerOk;
+  std::vector<std::string> messages;
+};
+
+class VerilogReliabilityTest : public testing::TestWithParam<Case> {};
+
+TEST_P(VerilogReliabilityTest, ReadsAsExpected) {
+  Outcome outcome = read(GetParam().text);
+  EXPECT_EQ(outcome.ports, GetParam().ports);
+  EXPECT_EQ(outcome.headerOk, GetParam().headerOk);
+  EXPECT_EQ(outcome.messages, GetParam().messages);
+}
+
+std::string label(const testing::TestParamInfo<Case>& info) { return info.param.label; }
+
+INSTANTIATE_TEST_SUITE_P(
+    DeepInput, VerilogReliabilityTest,
+    testing::Values(
+        Case{"FlatSumOf500IsNotNesting",
+             "module m(input [" + joined("1", "+", 500) + ":0] a); endmodule\n", {"a[500:0]"},
+             true, {}},
+        Case{"FlatSumOf200000", "module m(input [" + joined("1", " + ", 200000) + ":0] a);\n" +
+                                    "localparam U = " + joined("2", "*", 200000) + ";\nendmodule\n",
+             {"a[200000:0]"}, true, {}},
+        Case{"ShortParameterChain", parameterChain(100), {"a[99:0]"}, true, {}},
+        Case{"ParameterChainOf20000", parameterChain(20000), {"a"}, true,
+             {"t.v:1:28: warning: cannot evaluate the range of port 'a': evaluation is nested "
+              "too deeply"}},
+        Case{"SelectChain",
+             "module m(input [P" + joined("[0]", "", 100000) + ":0] a); endmodule\n", {}, true,
+             {"t.v:1:1221: error: expression nested too deeply"}}),
+    label);
+
+// A FIFO would block the open until a writer came; it is refused as a design file and as an
+// include target alike.
+TEST(VerilogFifoTest, FifoDesignFileAndIncludeAreRefused) {
+  std::string dir = testing::TempDir() + "/vfifo_" + std::to_string(::getpid());
+  ASSERT_EQ(::mkdir(dir.c_str(), 0700), 0);
+  std::string fifo = dir + "/f.vh";
+  ASSERT_EQ(::mkfifo(fifo.c_str(), 0600), 0);
+  std::ofstream(dir + "/top.v") << "`include \"f.vh\"\nmodule m(input a); endmodule\n";
+  std::FILE* sink = std::tmpfile();
+  bool found = false;
+  {
+    scan::Diagnostics diagnostics(sink, 1000);
+    scan::verilog::VerilogReader reader(diagnostics);
+    reader.indexFiles({{"work", fifo}, {"work", dir + "/top.v"}});
+    found = reader.selectUnit("work", "m");
+  }
+  std::rewind(sink);
+  std::string printed;
+  char line[4096];
+  while (std::fgets(line, sizeof line, sink))
+    if (std::string(line).rfind("  ", 0) != 0) printed += line;
+  std::fclose(sink);
+  EXPECT_TRUE(found);
+  EXPECT_EQ(printed, fifo + ": error: cannot read the file: not a regular file\n" + dir +
+                         "/top.v:1:1: error: cannot read include file \"f.vh\": not a regular "
+                         "file\n");
+  for (const char* name : {"/f.vh", "/top.v", ""}) std::remove((dir + name).c_str());
+}
+
+}  // namespace
