@@ -56,7 +56,9 @@ std::string_view trim(std::string_view s) {
 }  // namespace
 
 Preprocessor::Preprocessor(Diagnostics* diagnostics, MacroTable& macros, SourceStore& sources)
-    : m_Diagnostics(diagnostics), m_Macros(macros), m_Sources(sources) {}
+    : m_Diagnostics(diagnostics ? diagnostics : &m_Quiet),
+      m_Macros(macros),
+      m_Sources(sources) {}
 
 Preprocessor::~Preprocessor() = default;
 
@@ -78,7 +80,7 @@ void Preprocessor::setCoarse(bool coarse) {
 }
 
 void Preprocessor::error(const Token& at, std::string_view text) {
-  if (m_Diagnostics && at.source) m_Diagnostics->error(*at.source, at.offset, text);
+  if (at.source) m_Diagnostics->error(*at.source, at.offset, text);
 }
 
 bool Preprocessor::next(Token& token) {
@@ -105,7 +107,7 @@ void Preprocessor::popFrame() {
   if (frame.file) {
     while (m_Conditionals.size() > frame.conditionalBase) {
       const Conditional& open = m_Conditionals.back();
-      if (m_Diagnostics && open.source)
+      if (open.source)
         m_Diagnostics->error(*open.source, open.offset,
                              "unterminated `" + std::string(open.directive) +
                                  ": no `endif before the end of the file");

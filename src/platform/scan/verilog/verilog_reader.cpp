@@ -76,8 +76,11 @@ bool VerilogReader::readUnit(UnitDescription& unit) {
   reader.readUnit(*m_Selected, model);
   Evaluator evaluator(*this);
   LineCounter lines;
+  // Ranges that cannot be evaluated are warnings; an error here is a header in error, such
+  // as a non-ANSI port without a declaration.
+  size_t errorsBefore = m_Diagnostics.errorCount();
   unit.ports = buildPorts(model, evaluator, *m_Index, m_Diagnostics, lines);
-  return true;
+  return model.headerErrors == 0 && m_Diagnostics.errorCount() == errorsBefore;
 }
 
 Scope* VerilogReader::package(const std::string& name) {

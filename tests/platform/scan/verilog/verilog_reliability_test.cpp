@@ -101,8 +101,57 @@ INSTANTIATE_TEST_SUITE_P(
              {"t.v:1:28: warning: cannot evaluate the range of port 'a': evaluation is nested "
               "too deeply"}},
         Case{"SelectChain",
-             "module m(input [P" + joined("[0]", "", 100000) + ":0] a); endmodule\n", {}, true,
+             "module m(input [P" + joined("[0]", "", 100000) + ":0] a); endmodule\n", {}, false,
              {"t.v:1:1221: error: expression nested too deeply"}}),
+    label);
+
+INSTANTIATE_TEST_SUITE_P(
+    HeaderErrors, VerilogReliabilityTest,
+    testing::Values(
+        Case{"Clean", "module m(input a, output [3:0] b); endmodule\n", {"a", "b[3:0]"}, true,
+             {}},
+        Case{"SyntaxErrorInParameters", "module m #(parameter W = ) (input a); endmodule\n", {},
+             false, {"t.v:1:26: error: expected an expression but found ')'"}},
+        Case{"SyntaxErrorInPorts", "module m(input a, output [3:0 b); endmodule\n", {"a"},
+             false, {"t.v:1:31: error: expected ']' but found 'b'"}},
+        Case{"UnterminatedStringInPorts", "module m(input a, output \"b);\nendmodule\n", {"a"},
+             false,
+             {"t.v:1:26: error: unterminated string", "t.v:1:26: error: expected a port name"}},
+        Case{"UnterminatedCommentSwallowsPorts", "module m(input a, /* output b);\nendmodule\n",
+             {"a"}, false,
+             {"t.v:1:19: error: unterminated comment",
+              "t.v:1:1: error: missing endmodule for module 'm'"}},
+        Case{"NulByteInPorts", std::string("module m(input a,\0 output b); endmodule\n", 41),
+             {"a"}, false, {"t.v:1:18: error: expected a port name"}},
+        Case{"DeepNestingInPorts",
+             "module m(input [" + joined("(", "", 1000) + "1" + joined(")", "", 1000) +
+                 ":0] a); endmodule\n",
+             {}, false, {"t.v:1:217: error: expression nested too deeply"}},
+        Case{"RecursiveMacroInPorts", "`define A `A\nmodule m(input [`A:0] a); endmodule\n", {},
+             false,
+             {"t.v:2:17: error: macro `A expands too deeply (recursive definition?)",
+              "t.v:2:19: error: expected an expression but found ':'"}},
+        Case{"TruncatedAfterAPort", "module m(input wire a, outpu", {"a"}, false,
+             {"t.v:1:1: error: missing endmodule for module 'm'"}},
+        Case{"TruncatedInAType", "module m(input wi", {}, false,
+             {"t.v:1:1: error: missing endmodule for module 'm'"}},
+        Case{"TruncatedNonAnsiList", "module m(a, b", {}, false,
+             {"t.v:1:1: error: missing endmodule for module 'm'",
+              "t.v:1:10: error: port 'a' has no input, output or inout declaration"}},
+        Case{"NonAnsiDeclarationError", "module m(a, b);\ninput a;\noutput [3:0 b;\nendmodule\n",
+             {"a", "b"}, false, {"t.v:3:13: error: expected ']' but found 'b'"}},
+        Case{"NonAnsiDeclarationJunk", "module m(a);\ninput a b;\nendmodule\n", {}, false,
+             {"t.v:1:10: error: port 'a' has no input, output or inout declaration"}},
+        Case{"ErrorInAnotherUnit",
+             "module other(input [ a); endmodule\nmodule m(input a); endmodule\n", {"a"}, true,
+             {}},
+        Case{"RecursiveMacroInAnotherUnit",
+             "`define A `A\nmodule other(input [`A:0] a); endmodule\n"
+             "module m(input a); endmodule\n",
+             {"a"}, true,
+             {"t.v:2:21: error: macro `A expands too deeply (recursive definition?)"}},
+        Case{"ErrorInTheBodyOnly", "module m(input a);\nassign x = (;\nendmodule\n", {"a"}, true,
+             {}}),
     label);
 
 // A FIFO would block the open until a writer came; it is refused as a design file and as an
