@@ -135,9 +135,8 @@ void readParameters(Parser& parser, Scope& scope) {
       return;
     }
     std::string name(tokens.take().text);
-    std::vector<Dimension> unpacked;
-    parser.dimensions(unpacked);
     Parameter parameter;
+    parser.dimensions(parameter.unpacked);
     parameter.type = type;
     parameter.isType = isType;
     if (tokens.acceptSymbol("=")) {

@@ -154,6 +154,55 @@ INSTANTIATE_TEST_SUITE_P(
              {}}),
     label);
 
+INSTANTIATE_TEST_SUITE_P(
+    Fidelity, VerilogReliabilityTest,
+    testing::Values(
+        Case{"IntUnsignedWraps",
+             "module m #(parameter int unsigned NoRules = 32'd0)\n"
+             "  (input [NoRules-1:0] a, input [NoRules:0] b, input [NoRules-1:NoRules-4] c);\n"
+             "endmodule\n",
+             {"a", "b[0:0]", "c"}, true,
+             {"t.v:2:24: warning: port 'a': its bounds do not fit in 32 bits; no range reported",
+              "t.v:2:76: warning: port 'c': its bounds do not fit in 32 bits; no range reported"}},
+        Case{"SizedLiteralParameterWraps",
+             "module m(input [N-1:0] a, input [S-1:0] b);\nlocalparam N = 8'd0, S = 8'sd0;\n"
+             "endmodule\n",
+             {"a", "b[-1:0]"}, true,
+             {"t.v:1:24: warning: port 'a': its bounds do not fit in 32 bits; no range reported"}},
+        Case{"TypedParameterTruncates",
+             "module m #(parameter [3:0] U = 20, parameter signed [3:0] S = 15, int I = 32'hFFFF_FFFF)"
+             "\n  (input [U:0] a, input [S:-2] b, input [I:-2] c); endmodule\n",
+             {"a[4:0]", "b[-1:-2]", "c[-1:-2]"}, true, {}},
+        Case{"ParameterArrays",
+             "module m #(parameter int W[2] = '{8, 16})\n"
+             "  (input [W[1]-1:0] a, input [W[0]-1:0] b, output [T[2]:T[3]] c,\n"
+             "   output [K[1]:K[2]] d, output [R[3]:0] e);\n"
+             "localparam [7:0] T [0:3] = '{1, 2, 300, 8};\n"
+             "localparam int K [4] = '{default: 3, 1: 5};\n"
+             "localparam int R [3:0] = '{4{6}};\n"
+             "endmodule\n",
+             {"a[15:0]", "b[7:0]", "c[44:8]", "d[5:3]", "e[6:0]"}, true, {}},
+        Case{"ParameterArrayOutOfRange",
+             "module m(input [T[4]:0] a);\nlocalparam int T [0:3] = '{1, 2, 3, 4};\nendmodule\n",
+             {"a"}, true,
+             {"t.v:1:25: warning: cannot evaluate the range of port 'a': index 4 is outside "
+              "parameter array 'T'"}},
+        Case{"BitSelectsInConstantFunctions",
+             "module m(input [f(2):0] a, input [f(0)-1:0] b);\n"
+             "function automatic integer f(input integer n);\n"
+             "  reg [7:0] x;\n"
+             "  begin x = 0; x[n] = 1'b1; x[7:6] = 2'b11; x[1 +: 1] = x[n]; f = x; end\n"
+             "endfunction\nendmodule\n",
+             {"a[198:0]", "b[194:0]"}, true, {}},
+        Case{"BoundBeyond64Bits",
+             "module m(input [64'h1_0000_0000:0] a, input [80'h1_0000_0000_0000_0000:0] b);\n"
+             "endmodule\n",
+             {"a", "b"}, true,
+             {"t.v:1:36: warning: port 'a': its bounds do not fit in 32 bits; no range reported",
+              "t.v:1:75: warning: cannot evaluate the range of port 'b': the literal does not "
+              "fit in 64 bits"}}),
+    label);
+
 // A FIFO would block the open until a writer came; it is refused as a design file and as an
 // include target alike.
 TEST(VerilogFifoTest, FifoDesignFileAndIncludeAreRefused) {
