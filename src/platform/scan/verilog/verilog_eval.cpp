@@ -335,7 +335,8 @@ bool Evaluator::evalElement(const Expr& select, const std::string& name, Paramet
   const Expr* element = nullptr;
   size_t at = static_cast<size_t>(position);
   if (pattern->op == "{") {
-    if (pattern->args.size() > 1) element = pattern->args[1 + at % (pattern->args.size() - 1)].get();
+    size_t items = pattern->args.size() - 1;
+    if (items > 0) element = pattern->args[1 + at % items].get();
   } else if (pattern->op == ":") {
     for (size_t k = 0; k + 1 < pattern->args.size() && !element; k += 2) {
       Value key;
@@ -570,7 +571,8 @@ bool Evaluator::assignSelect(const Stmt& stmt, const Value& v, Scope& scope, Loc
   selectBits(stmt.selectOp, i, j, stmt.indexEnd != nullptr, low, width);
   if (low < 0 || low >= 64 || width <= 0) return fail("bit select out of range");
   uint64_t mask = lowMask(width) << low;
-  uint64_t bits = (static_cast<uint64_t>(old) & ~mask) | ((static_cast<uint64_t>(value) << low) & mask);
+  uint64_t bits =
+      (static_cast<uint64_t>(old) & ~mask) | ((static_cast<uint64_t>(value) << low) & mask);
   int w = target->second.unsignedWidth();
   target->second = w ? unsignedValue(bits, w) : Value::integer(static_cast<int64_t>(bits));
   return true;

@@ -577,6 +577,11 @@ void Parser::enumBody(TypeSpec& type) {
 }
 
 bool Parser::dataType(TypeSpec& type) {
+  DepthGuard guard(m_Depth);  // struct members and enum bases nest types in types
+  if (guard.tooDeep()) {
+    fail("data type nested too deeply");
+    return false;
+  }
   bool read = false;
   for (;;) {
     const Token& token = m_Tokens.peek();

@@ -136,7 +136,8 @@ class PortBuilder {
     ScanPort port(name, typeName, direction, static_cast<int>(line));
     if (range.present) {
       if (!fitsBound(range.left) || !fitsBound(range.right)) {
-        warn(source, offset, "port '" + name + "': its bounds do not fit in 32 bits; no range reported");
+        warn(source, offset,
+             "port '" + name + "': its bounds do not fit in 32 bits; no range reported");
       } else {
         port.setRange(static_cast<int32_t>(range.left), static_cast<int32_t>(range.right),
                       range.left < range.right);

@@ -100,6 +100,10 @@ INSTANTIATE_TEST_SUITE_P(
         Case{"ParameterChainOf20000", parameterChain(20000), {"a"}, true,
              {"t.v:1:28: warning: cannot evaluate the range of port 'a': evaluation is nested "
               "too deeply"}},
+        Case{"NestedStructs",
+             "module m(input " + joined("struct packed { ", "", 100000) + "logic a; " +
+                 joined("} b; ", "", 99999) + "} x); endmodule\n",
+             {}, false, {"t.v:1:6416: error: data type nested too deeply"}},
         Case{"SelectChain",
              "module m(input [P" + joined("[0]", "", 100000) + ":0] a); endmodule\n", {}, false,
              {"t.v:1:1221: error: expression nested too deeply"}}),
@@ -170,7 +174,8 @@ INSTANTIATE_TEST_SUITE_P(
              {"a", "b[-1:0]"}, true,
              {"t.v:1:24: warning: port 'a': its bounds do not fit in 32 bits; no range reported"}},
         Case{"TypedParameterTruncates",
-             "module m #(parameter [3:0] U = 20, parameter signed [3:0] S = 15, int I = 32'hFFFF_FFFF)"
+             "module m #(parameter [3:0] U = 20, parameter signed [3:0] S = 15,\n"
+             "           parameter int I = 32'hFFFF_FFFF)"
              "\n  (input [U:0] a, input [S:-2] b, input [I:-2] c); endmodule\n",
              {"a[4:0]", "b[-1:-2]", "c[-1:-2]"}, true, {}},
         Case{"ParameterArrays",
