@@ -130,7 +130,7 @@ INSTANTIATE_TEST_SUITE_P(
         Case{"DeepNestingInPorts",
              "module m(input [" + joined("(", "", 1000) + "1" + joined(")", "", 1000) +
                  ":0] a); endmodule\n",
-             {}, false, {"t.v:1:217: error: expression nested too deeply"}},
+             {}, false, {"t.v:1:216: error: expression nested too deeply"}},
         Case{"RecursiveMacroInPorts", "`define A `A\nmodule m(input [`A:0] a); endmodule\n", {},
              false,
              {"t.v:2:17: error: macro `A expands too deeply (recursive definition?)",
