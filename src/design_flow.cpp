@@ -133,7 +133,10 @@ bool runTemplateEngine(RunContext& context) {
   {
     Forge forge(context.m_OutputStream, context.m_TemplateStream, context.m_DebugStream,
                 context.m_DesignData.get());
+    forge.setTemplateName(context.m_TemplateFileName.view());
     forge.processTemplate();
+    for (const std::string& warning : forge.warnings())
+      context.reportMessage("WARNING: " + warning, RunContext::Severity::Warning);
     std::string message;
     if (forge.getResult(message) != 0) {
       std::string text = "FATAL: ";
