@@ -7,6 +7,8 @@
 #include <unistd.h>
 
 #include <filesystem>
+#include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -172,6 +174,71 @@ TEST(RegisterLibraries, EachFileGoesToTheLibraryOfItsOwnOccurrence) {
     EXPECT_EQ(context.m_LibraryName.str(), test.library);
     EXPECT_EQ(context.m_InputFileName.str(), test.input);
   }
+}
+
+/// A parser over `args` (without the program name) and the usage text of the program.
+struct ParsedLine {
+  explicit ParsedLine(std::vector<std::string> args) : words(std::move(args)) {
+    words.insert(words.begin(), "pinforge");
+    for (std::string& word : words) argv.push_back(word.data());
+    argv.push_back(nullptr);
+    parser = std::make_unique<UT_CMDARGS>(static_cast<int>(words.size()), argv.data(), kUsageText,
+                                          nullptr, 0);
+  }
+  std::vector<std::string> words;
+  std::vector<char*> argv;
+  std::unique_ptr<UT_CMDARGS> parser;
+};
+
+TEST(ReadScanSettings, EveryOccurrenceInOrderAndMalformedOnesReported) {
+  using Overrides = std::vector<std::pair<std::string, std::string>>;
+  using Macros = std::vector<std::pair<std::string, std::optional<std::string>>>;
+  const struct {
+    std::vector<std::string> args;
+    bool wellFormed;
+    Overrides overrides;
+    Macros macros;
+    std::vector<std::string> includes;
+    uint32_t errors;
+  } cases[] = {
+      {{}, true, {}, {}, {}, 0},
+      {{"-g", "WIDTH=8", "-D", "SYNTH", "-g", "name=a=b", "-I", "inc", "-D", "W=", "-I", "x y"},
+       true,
+       {{"WIDTH", "8"}, {"name", "a=b"}},
+       {{"SYNTH", std::nullopt}, {"W", ""}},
+       {"inc", "x y"},
+       0},
+      {{"-g", "W", "-g", "=1", "-g", "X=", "-g", "Y=2", "-D", "=3"},
+       false,
+       {{"Y", "2"}},
+       {},
+       {},
+       4},
+  };
+  for (const auto& c : cases) {
+    ParsedLine line(c.args);
+    ASSERT_FALSE(line.parser->iserror());
+    RunContext context;
+    testing::internal::CaptureStdout();
+    EXPECT_EQ(readScanSettings(context, *line.parser), c.wellFormed);
+    testing::internal::GetCapturedStdout();
+    EXPECT_EQ(context.m_ScanSettings.genericOverrides, c.overrides);
+    EXPECT_EQ(context.m_ScanSettings.macros, c.macros);
+    EXPECT_EQ(context.m_ScanSettings.includeDirectories, c.includes);
+    EXPECT_EQ(context.m_ErrorCount, c.errors);
+  }
+}
+
+TEST(UsageOf, TheDeclarationAsTheUsageTextWritesIt) {
+  for (const auto& [name, declared] : std::vector<std::pair<std::string, std::string>>{
+           {"-lib", "-lib <libname> {<vhdfile>}"},
+           {"-prj", "-prj <project>"},
+           {"-o", "-o <stbfile>"},
+           {"-g", "-g <name>=<value>"},
+           {"--a", "--a"},
+           {"-a", ""},
+           {"-missing", ""}})
+    EXPECT_EQ(usageOf(name), declared) << name;
 }
 
 }  // namespace
