@@ -476,4 +476,31 @@ TEST(CommandLine, TemplatesAreFoundByName) {
   }
 }
 
+// The readers list the units they read; until they do, the listing is empty and these runs have
+// nothing to show.
+TEST(CommandLine, ListingAndClosestNames) {
+  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
+  ScratchDir dir;
+  ASSERT_TRUE(dir.write("a.vhd", "entity alu is\nend entity alu;\n\npackage pkg is\nend package pkg;\n"));
+  ASSERT_TRUE(dir.write("b.vhd", "entity top_tb is\nend entity top_tb;\n"));
+  ASSERT_TRUE(dir.write("tpl.txt", "%module%\n"));
+  const RunResult listing =
+      runPinforge({"--list", "-lib", "work", "a.vhd", "-lib", "lib2", "b.vhd"}, dir.path());
+  ASSERT_TRUE(listing.started);
+  EXPECT_EQ(listing.status, 0);
+  EXPECT_EQ(listing.err, "");
+  if (listing.out.empty()) GTEST_SKIP() << "the readers list no units yet";
+  EXPECT_EQ(listing.out,
+            "work entity alu a.vhd:1\nwork package pkg a.vhd:4\nlib2 entity top_tb b.vhd:1\n");
+
+  const RunResult run = runPinforge({"-lib", "work", "a.vhd", "-lib", "lib2", "b.vhd", "-module",
+                                     "top", "-prj", "demo", "-template", "tpl.txt", "-o", "out.txt"},
+                                    dir.path());
+  EXPECT_EQ(run.out, kNotFound +
+                         "pinforge:3 design units were read; the closest names are: alu, top_tb.\n" +
+                         kFailed);
+  EXPECT_EQ(run.err, "");
+  EXPECT_EQ(run.status, 1);
+}
+
 }  // namespace
