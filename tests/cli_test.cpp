@@ -126,8 +126,22 @@ std::string sameFile(const std::string& what) {
   return "FATAL ERROR: The " + what + "; nothing was written.\n";
 }
 
+/// The line a run adds after "not found" for a design whose only unit is "other", once the
+/// readers list the units they read; empty while they list none.
+std::string otherHint() {
+  static const std::string hint = [] {
+    ScratchDir dir;
+    if (!dir.write("other.vhd", kOther)) return std::string("<scratch folder failed>");
+    const RunResult run = runPinforge({"--list", "-lib", "work", "other.vhd"}, dir.path());
+    return run.out.empty()
+               ? std::string()
+               : std::string("pinforge:1 design unit was read; the closest name is: other.\n");
+  }();
+  return hint;
+}
+
 std::vector<Row> rows() {
-  const std::string notFound = kNotFound + kFailed;
+  const std::string notFound = kNotFound + otherHint() + kFailed;
   std::vector<Row> rows = {
       {"no arguments", {}, "", kUsage, 0},
       {"unreadable response file", {"@missing.rsp", "-lib", "work"}, "", kMissingRsp + kUsage, 1},
@@ -242,11 +256,11 @@ std::vector<Row> rows() {
       {"empty response file", {"@run.rsp"}, kFailed,
        missing({kNoLib, kNoModule, kNoPrj, kNoTemplate, kNoOutput}), 1, {}, ""},
       {"response file words are literal", {"@run.rsp"},
-       "pinforge:Declaration (Module @top) not found.\n" + kFailed, "", 1, {},
+       "pinforge:Declaration (Module @top) not found.\n" + otherHint() + kFailed, "", 1, {},
        "-lib work other.vhd -module @top -prj demo -template tpl.txt -o out.txt\n"},
       {"verilog design", {"-lang", "verilog", "-lib", "work", "other.v", "-module", "top", "-prj",
                           "demo", "-template", "tpl.txt", "-o", "out.txt"},
-       kNotFound + "forge(verilog) completed with errors.\n", "", 1},
+       kNotFound + otherHint() + "forge(verilog) completed with errors.\n", "", 1},
   };
   const auto unknownLanguage = [](const std::string& value) {
     return "pinforge:WARNING: -lang " + value +
