@@ -104,6 +104,14 @@ for template in "${templates[@]}" my_table.tmpl my_script.tcl; do
   name=${name%.tcl}
   printf '%s\n' "$offered" | grep -qxF -- "$name" || fail "completion does not offer template $name"
 done
+# A program that cannot be run: the names come from the folders the completion file knows.
+offered=$(complete_words no-such-pinforge -template '')
+for template in "${templates[@]}" my_table.tmpl; do
+  name=${template%.tmpl}
+  name=${name%.tcl}
+  printf '%s\n' "$offered" | grep -qxF -- "$name" \
+    || fail "completion without a runnable program does not offer template $name"
+done
 offered=$(complete_words pinforge -lib work x.vhd -template my_)
 [ "$(printf '%s\n' "$offered" | sort | tr '\n' ' ')" = "my_script my_table " ] \
   || fail "completion of -template my_ offers: $offered"
