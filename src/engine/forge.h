@@ -49,6 +49,9 @@ class Forge {
   /// Records, as the first error, that the template needs the range of `port`, which the
   /// design could not evaluate; the message carries the port's problem text uncut.
   void reportRangeError(const PortRecord& port);
+  /// A template wrote the value of a generic that has none: writing nothing would leave a
+  /// generic map or constant that does not compile, reported as success.
+  void reportValueError(const GenericRecord& generic);
   /// True once an error has been recorded.
   bool failed() const { return m_Status != kStatusOk; }
   /// The template's name as the user gave it; warnings name the template by it.

@@ -79,7 +79,7 @@ const Design kVhdl{
      {"n", -1, -1, 'N', "", K::Other}},
     {{"WIDTH", "natural", "8", "16"},
      {"MODE", "string", "\"fast\"", "\"fast\""},
-     {"INIT", "std_logic_vector(WIDTH-1 downto 0)", "(others => '0')", ""}},
+     {"INIT", "std_logic_vector(WIDTH-1 downto 0)", "(others => '0')", "(others => '0')"}},
     "library ieee;\nuse ieee.std_logic_1164.all;\n"};
 
 const Design kVerilog{
@@ -152,14 +152,14 @@ INSTANTIATE_TEST_SUITE_P(
             "@SET SIGDELIM=;\n@@ITERATE@%GENERIC%@ITERATOR@ : @GENERIC_TYPE@ := "
             "@GENERIC_DEFAULT@ -- @GENERIC_VALUE@@ENDITERATE@",
             "WIDTH : natural := 8 -- 16;\nMODE : string := \"fast\" -- \"fast\";\n"
-            "INIT : std_logic_vector(WIDTH-1 downto 0) := (others => '0') -- ",
+            "INIT : std_logic_vector(WIDTH-1 downto 0) := (others => '0') -- (others => '0')",
             ""},
         Row{"VerilogParameterList", &kVerilog,
             "#(@ITERATE@%generic%.@ITERATOR@(@GENERIC_VALUE@)@ENDITERATE@)", "#(.W(8), .T(4))",
             ""},
         Row{"NamesTakeCaseValuesDoNot", &kVhdl,
             "@UPCASE@@ITERATE@%GENERIC%@LOWCASE@@ITERATOR@=@GENERIC_VALUE@@ENDITERATE@",
-            "width=16, mode=\"fast\", init=", ""},
+            "width=16, mode=\"fast\", init=(others => '0')", ""},
         Row{"NoGenericNoPass", &kEmpty, "x@ITERATE@%GENERIC%y@ENDITERATE@z", "xz", ""},
         Row{"IfHas", &kVhdl,
             "@IFHAS GENERIC=WIDTH@1@ENDIF@@IFHAS GENERIC=width@2@ENDIF@"
@@ -238,6 +238,8 @@ const Design kDeclared{DesignLanguage::Verilog,
                         {"P", "", "4", "4"}},
                        ""};
 
+const Design kEmptyValue{DesignLanguage::Verilog, {}, {{"W", "", "", ""}}, ""};
+
 // `word` as the innermost of `depth` nested blocks inside a generic iteration.
 std::string nestedInGenericBody(const std::string& word, int depth) {
   std::string text = "@ITERATE@%GENERIC%";
@@ -262,6 +264,10 @@ INSTANTIATE_TEST_SUITE_P(
         Row{"NoDefault", &kDeclared,
             "@ITERATE@%GENERIC%@IFNDEFAULT@-g @ITERATOR@=@GENERIC_VALUE@@ENDIF@@ENDITERATE@",
             ", -g DEPTH=16, ", ""},
+        Row{"ValueNobodyGave", &kEmptyValue, "x\n@ITERATE@%GENERIC%@ITERATOR@ => @GENERIC_VALUE@@ENDITERATE@",
+            "x\nW => ",
+            "Error - Template file line 2 needs the value of generic W, which has neither a "
+            "default nor a -g value; give one with -g W=VALUE\n"},
         Row{"VerilogParameterTypes", &kDeclared,
             "@ITERATE@%GENERIC%parameter @IFTYPED@@GENERIC_TYPE@ @ENDIF@@ITERATOR@@ENDITERATE@",
             "parameter natural WIDTH, parameter positive DEPTH, parameter P", ""},
