@@ -123,15 +123,16 @@ bool isTclTemplate(const std::string& name) {
   return std::filesystem::exists(sourceDir() + "/templates/" + name + ".tcl");
 }
 
-/// A tool's full path; empty after recording a skip or (under CI=true) a failure.
-std::string needTool(const std::string& name, bool& skipped) {
+/// A tool's full path. When it is missing, empty, and the name is kept in `missingTool` (or,
+/// under CI=true, a failure is recorded).
+std::string needTool(const std::string& name, std::string& missingTool) {
   std::string path = findTool(name);
   if (path.empty()) {
     const char* ci = std::getenv("CI");
     if (ci != nullptr && std::string(ci) == "true") {
       ADD_FAILURE() << name << " is not installed, and CI needs every template checked";
     } else {
-      skipped = true;
+      missingTool = name;
     }
   }
   return path;
@@ -182,8 +183,9 @@ unsigned pngDimension(const std::string& png, size_t offset) {
   return value;
 }
 
-void checkGhdl(const ScratchDir& dir, const Case& c, const std::string& output, bool& skipped) {
-  const std::string ghdl = needTool("ghdl", skipped);
+void checkGhdl(const ScratchDir& dir, const Case& c, const std::string& output,
+                std::string& missingTool) {
+  const std::string ghdl = needTool("ghdl", missingTool);
   if (ghdl.empty()) return;
   std::string unit = output;
   std::string top = c.top;
@@ -195,20 +197,17 @@ void checkGhdl(const ScratchDir& dir, const Case& c, const std::string& output, 
     if (c.check == Check::GhdlComponent) {
       ASSERT_TRUE(generate(dir, "vhdl_component", c.args, "component.txt", component));
     }
-    const std::string body = dir.read(output);
-    const bool isDeclaration = c.templateName == std::string("vhdl_component") ||
-                               c.templateName == std::string("vhdl_signals");
-    std::string instance;
-    if (isDeclaration) {
+    // A declaration template is checked by the instance that needs it, and the reverse.
+    std::string instance = dir.read(output);
+    if (c.templateName == std::string("vhdl_component") ||
+        c.templateName == std::string("vhdl_signals")) {
       const char* instanceTemplate =
           c.check == Check::GhdlComponent ? "vhdl_component_instance" : "vhdl_instance";
       ASSERT_TRUE(generate(dir, instanceTemplate, c.args, "instance.txt", instance));
-    } else {
-      instance = body;
     }
     parent = context + "\nentity tl_parent is\nend entity tl_parent;\n\n"
-             "architecture a of tl_parent is\n" + component + signals + "begin\n" + instance +
-             "end architecture a;\n";
+             "architecture a of tl_parent is\n" + component + signals + "\nbegin\n" +
+             instance + "end architecture a;\n";
     ASSERT_TRUE(dir.write("tl_parent.vhd", parent));
     unit = "tl_parent.vhd";
     top = "tl_parent";
@@ -230,7 +229,8 @@ void checkGhdl(const ScratchDir& dir, const Case& c, const std::string& output, 
   }
 }
 
-void checkSv(const ScratchDir& dir, const Case& c, const std::string& output, bool& skipped) {
+void checkSv(const ScratchDir& dir, const Case& c, const std::string& output,
+             std::string& missingTool) {
   std::string unit = output;
   std::string top = c.top;
   if (c.check == Check::SvInstance) {
@@ -245,7 +245,7 @@ void checkSv(const ScratchDir& dir, const Case& c, const std::string& output, bo
   if (c.check == Check::SvInstance && files.front() != "tl_sv_pkg.sv")
     files.insert(files.begin(), "tl_sv_pkg.sv");
   files.push_back(unit);
-  const std::string verilator = needTool("verilator", skipped);
+  const std::string verilator = needTool("verilator", missingTool);
   if (!verilator.empty()) {
     // The testbench states its timeunit and the fixtures do not.
     std::vector<std::string> argv = {verilator, "--lint-only", "--timing", "-Wno-TIMESCALEMOD",
@@ -254,15 +254,16 @@ void checkSv(const ScratchDir& dir, const Case& c, const std::string& output, bo
     expectRuns(argv, dir);
   }
   if (!c.icarus) return;
-  const std::string iverilog = needTool("iverilog", skipped);
+  const std::string iverilog = needTool("iverilog", missingTool);
   if (iverilog.empty()) return;
   std::vector<std::string> argv = {iverilog, "-g2012", "-o", "sim.vvp", "-s", top};
   argv.insert(argv.end(), files.begin(), files.end());
   expectRuns(argv, dir);
 }
 
-void checkData(const ScratchDir& dir, const Case& c, const std::string& output, bool& skipped) {
-  const std::string python = needTool("python3", skipped);
+void checkData(const ScratchDir& dir, const Case& c, const std::string& output,
+               std::string& missingTool) {
+  const std::string python = needTool("python3", missingTool);
   if (python.empty()) return;
   if (c.check == Check::Python) {
     const std::string module = std::filesystem::path(output).stem().string();
@@ -283,10 +284,10 @@ void checkData(const ScratchDir& dir, const Case& c, const std::string& output, 
   EXPECT_EQ(run.output, c.names);
 }
 
-void checkSvg(const ScratchDir& dir, const std::string& output, bool& skipped) {
-  const std::string xmllint = needTool("xmllint", skipped);
+void checkSvg(const ScratchDir& dir, const std::string& output, std::string& missingTool) {
+  const std::string xmllint = needTool("xmllint", missingTool);
   if (!xmllint.empty()) expectRuns({xmllint, "--noout", output}, dir);
-  const std::string rsvg = needTool("rsvg-convert", skipped);
+  const std::string rsvg = needTool("rsvg-convert", missingTool);
   if (rsvg.empty()) return;
   expectRuns({rsvg, "-o", "symbol.png", output}, dir);
   const std::string svg = dir.read(output);
@@ -300,9 +301,9 @@ class TemplateLibrary : public ::testing::TestWithParam<Case> {};
 TEST_P(TemplateLibrary, MatchesReviewedOutputAndItsConsumerAcceptsIt) {
   const Case& c = GetParam();
   if (pinforge_test::binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
-  bool skipped = false;
-  if (isTclTemplate(c.templateName) && needTool("tclsh", skipped).empty()) {
-    if (skipped) GTEST_SKIP() << "tclsh is not installed";
+  std::string missingTool;
+  if (isTclTemplate(c.templateName) && needTool("tclsh", missingTool).empty()) {
+    if (!missingTool.empty()) GTEST_SKIP() << "tclsh is not installed";
     return;
   }
   ScratchDir dir;
@@ -324,15 +325,15 @@ TEST_P(TemplateLibrary, MatchesReviewedOutputAndItsConsumerAcceptsIt) {
     case Check::None: break;
     case Check::GhdlTop:
     case Check::GhdlInstance:
-    case Check::GhdlComponent: checkGhdl(dir, c, c.expected, skipped); break;
+    case Check::GhdlComponent: checkGhdl(dir, c, c.expected, missingTool); break;
     case Check::SvTop:
-    case Check::SvInstance: checkSv(dir, c, c.expected, skipped); break;
+    case Check::SvInstance: checkSv(dir, c, c.expected, missingTool); break;
     case Check::Python:
     case Check::JsonNames:
-    case Check::CsvNames: checkData(dir, c, c.expected, skipped); break;
-    case Check::Svg: checkSvg(dir, c.expected, skipped); break;
+    case Check::CsvNames: checkData(dir, c, c.expected, missingTool); break;
+    case Check::Svg: checkSvg(dir, c.expected, missingTool); break;
   }
-  if (skipped) GTEST_SKIP() << "a tool that checks this output is not installed";
+  if (!missingTool.empty()) GTEST_SKIP() << missingTool << " is not installed";
 }
 
 INSTANTIATE_TEST_SUITE_P(Bundled, TemplateLibrary, ::testing::ValuesIn(cases()),
