@@ -104,6 +104,10 @@ class Forge {
   /// current generic has default text, or whether the current generic or `port` (null outside
   /// a port iteration) has declared type text.
   bool doIfDeclared(int index, const PortRecord* port);
+  /// @IFKIND kinds@ / @IFNKIND kinds@: tests the declared kind of the current port of an
+  /// iteration against a '|'-separated list of kind names (bit, vector, integer, record,
+  /// array, enum, interface, other), ignoring case.
+  bool doIfKind(std::string_view token, bool isIfKind, const PortRecord* port);
   bool doEndIf();
   /// Opens a block kept (value 2) or dropped (value 1), opened by keyword `index` on the
   /// current line.

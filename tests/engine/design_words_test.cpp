@@ -136,6 +136,8 @@ TEST_P(DesignWordsTest, WritesWholeOutputAndResult) {
 
 std::string rowName(const ::testing::TestParamInfo<Row>& info) { return info.param.name; }
 
+const Design kOnePort{DesignLanguage::Vhdl, {{"Clk_In", -1, -1, 'I', "", K::Other}}, {}, ""};
+
 const std::string kGenericOnly = " may only occur inside an @ITERATE@%GENERIC% body.";
 const std::string kPortsOnly = " may only occur inside an @ITERATE@ over ports.";
 
@@ -216,6 +218,16 @@ INSTANTIATE_TEST_SUITE_P(
             "d_7_:logic [W-1:0], d_6_:logic [W-1:0], d_5_:logic [W-1:0], d_4_:logic [W-1:0], "
             "d_3_:logic [W-1:0], d_2_:logic [W-1:0], d_1_:logic [W-1:0], d_0_:logic [W-1:0]",
             ""},
+        Row{"IfKind", &kVhdl,
+            "@SET SIGDELIM=@@ITERATE@%SIGNAL%@IFKIND integer|Record@i@ENDIF@"
+            "@IFNKIND bit|VECTOR|integer|record@n@ENDIF@@IFKIND enum@e@ENDIF@@ENDITERATE@",
+            "inein", ""},
+        Row{"IfKindOutside", &kVhdl, "@IFKIND bit@@ENDIF@", "",
+            errorAt(1, "@IFKIND and @IFNKIND" + kPortsOnly)},
+        Row{"IfKindUnknownName", &kOnePort, "@ITERATE@%PORT%@IFKIND bits@@ENDIF@@ENDITERATE@", "",
+            errorAt(1, "Invalid syntax for @IFKIND or @IFNKIND directive, must be of the form:\n"
+                       "@IFKIND KIND|KIND@ with KIND one of bit, vector, integer, record, array, "
+                       "enum, interface, other")},
         Row{"TypeOutside", &kVhdl, "x\n@PORT_TYPE@", "x\n", errorAt(2, "@PORT_TYPE@" + kPortsOnly)},
         Row{"ModeOutside", &kVhdl, "@PORT_MODE@", "", errorAt(1, "@PORT_MODE@" + kPortsOnly)},
         Row{"TypeDecKeepsDeclaredTypeOfNonBitPorts", &kVhdl,
@@ -297,7 +309,6 @@ INSTANTIATE_TEST_SUITE_P(
             errorAt(1, "Keyword: @IFDEFAULT x@ is not a valid Variable or Directive name.")}),
     rowName);
 
-const Design kOnePort{DesignLanguage::Vhdl, {{"Clk_In", -1, -1, 'I', "", K::Other}}, {}, ""};
 const std::string kIfPortForm = errorAt(
     1, "Invalid syntax for @IFPORT or @IFNPORT directive, must be of the form:\n@IFPORT PATTERN@");
 const std::string kIfPortAlternative = errorAt(
