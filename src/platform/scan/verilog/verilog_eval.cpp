@@ -128,14 +128,8 @@ const TypeSpec* Evaluator::findType(const std::string& package, const std::strin
 }
 
 bool Evaluator::typeWidth(const TypeSpec& type, Scope& scope, int64_t& width) {
-  if (++m_Depth > kMaxDepth) {
-    --m_Depth;
-    return fail("type definitions nested too deeply");
-  }
-  struct Leave {
-    int& depth;
-    ~Leave() { --depth; }
-  } leave{m_Depth};
+  DepthGuard guard(m_Depth, limits::kVerilogDefinitionNesting);
+  if (guard.tooDeep()) return fail("type definitions nested too deeply");
   int64_t element = 1;
   switch (type.base) {
     case TypeSpec::Base::Implicit:

@@ -45,8 +45,8 @@ uint64_t unsignedPower(uint64_t base, uint64_t exponent) {
 }  // namespace
 
 bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out) {
-  if (++m_Steps > kMaxSteps) return fail("evaluation did not finish within the step limit");
-  NestingGuard nesting(m_Nesting);
+  if (++m_Steps > limits::kVerilogEvalSteps) return fail("evaluation did not finish within the step limit");
+  DepthGuard nesting(m_Nesting, limits::kVerilogEvalNesting);
   if (nesting.tooDeep()) return fail("evaluation is nested too deeply");
   switch (expr.kind) {
     case Expr::Kind::Number:

@@ -34,10 +34,10 @@ bool Evaluator::run(const std::vector<Stmt>& body, Scope& scope, Locals& locals,
 }
 
 bool Evaluator::runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flow) {
-  if (++m_Steps > kMaxSteps)
-    return fail("constant function did not finish within " + std::to_string(kMaxSteps) +
+  if (++m_Steps > limits::kVerilogEvalSteps)
+    return fail("constant function did not finish within " + std::to_string(limits::kVerilogEvalSteps) +
                 " steps");
-  NestingGuard nesting(m_Nesting);
+  DepthGuard nesting(m_Nesting, limits::kVerilogEvalNesting);
   if (nesting.tooDeep()) return fail("evaluation is nested too deeply");
   auto truth = [&](const ExprPtr& condition, bool& result) {
     Value v;

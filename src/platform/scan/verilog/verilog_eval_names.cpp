@@ -248,7 +248,7 @@ bool Evaluator::evalCall(const Expr& expr, Scope& scope, Locals* locals, Value& 
   if (expr.args.size() != function->inputs.size())
     return fail("function '" + expr.name + "' takes " + std::to_string(function->inputs.size()) +
                 " argument(s)");
-  if (m_Depth >= kMaxDepth) return fail("function calls nested too deeply");
+  if (m_Depth >= limits::kVerilogDefinitionNesting) return fail("function calls nested too deeply");
   Locals frame;
   for (size_t i = 0; i < expr.args.size(); ++i) {
     Value v;

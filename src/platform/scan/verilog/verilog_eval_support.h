@@ -1,4 +1,4 @@
-// What the evaluator's files share: its limits, bit masks and the unsigned values Verilog
+// What the evaluator's files share: bit masks, selects and the unsigned values Verilog
 // operators produce. Internal to the evaluator; nothing outside verilog_eval*.cpp includes it.
 #pragma once
 
@@ -6,15 +6,10 @@
 #include <cstdint>
 #include <string>
 
+#include "platform/scan/common/reader_limits.h"
 #include "platform/scan/common/value.h"
 
 namespace scan::verilog {
-
-constexpr size_t kMaxSteps = 1000000;
-constexpr int kMaxDepth = 200;
-// Expression nesting, parameters defined through parameters and nested statements all use
-// the native stack; this bound keeps hostile input well inside it, sanitizers included.
-constexpr int kMaxNesting = 1000;
 
 inline uint64_t lowMask(int64_t width) {
   return width >= 64 ? ~uint64_t{0} : (uint64_t{1} << width) - 1;
@@ -41,15 +36,5 @@ inline Value unsignedValue(uint64_t bits, int64_t width) {
   int w = width >= 64 ? 64 : static_cast<int>(width);
   return Value::unsignedInteger(static_cast<int64_t>(bits & lowMask(w)), w);
 }
-
-class NestingGuard {
- public:
-  explicit NestingGuard(int& nesting) : m_Nesting(nesting) { ++m_Nesting; }
-  ~NestingGuard() { --m_Nesting; }
-  bool tooDeep() const { return m_Nesting > kMaxNesting; }
-
- private:
-  int& m_Nesting;
-};
 
 }  // namespace scan::verilog

@@ -35,7 +35,7 @@ bool isUnaryOperator(const Token& token) {
 }  // namespace
 
 ExprPtr Parser::expression() {
-  DepthGuard guard(m_Depth);
+  DepthGuard guard(m_Depth, limits::kVerilogSyntaxNesting);
   if (guard.tooDeep()) {
     fail("expression nested too deeply");
     return nullptr;
@@ -74,7 +74,7 @@ ExprPtr Parser::binary(int minPrecedence) {
 }
 
 ExprPtr Parser::unary() {
-  DepthGuard guard(m_Depth);
+  DepthGuard guard(m_Depth, limits::kVerilogSyntaxNesting);
   if (guard.tooDeep()) {
     fail("expression nested too deeply");
     return nullptr;
@@ -95,7 +95,7 @@ ExprPtr Parser::unary() {
 ExprPtr Parser::postfix(ExprPtr base) {
   for (int selects = 0;; ++selects) {
     const Token& next = m_Tokens.peek();
-    if (selects > kMaxDepth) {  // each select nests the tree one level deeper
+    if (selects > limits::kVerilogSyntaxNesting) {  // each select nests the tree one level deeper
       fail("expression nested too deeply");
       return nullptr;
     }

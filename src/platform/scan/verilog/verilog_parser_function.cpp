@@ -87,7 +87,7 @@ bool Parser::assignment(Stmt& stmt) {
 
 // Reads one statement into `out`; false when the function uses something unsupported.
 bool Parser::statement(Function& function, std::vector<Stmt>& out) {
-  DepthGuard guard(m_Depth);
+  DepthGuard guard(m_Depth, limits::kVerilogSyntaxNesting);
   if (guard.tooDeep()) {
     fail("statements nested too deeply");
     return false;

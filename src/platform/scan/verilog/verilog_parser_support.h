@@ -1,12 +1,11 @@
-// What the parser's files share: the nesting limit every recursive entry checks and the words
-// that start a data type. Internal to the parser; only verilog_parser*.cpp include it.
+// What the parser's files share: the words that start a data type, and the nesting guard
+// every recursive entry takes. Internal to the parser; only verilog_parser*.cpp include it.
 #pragma once
 
+#include "platform/scan/common/reader_limits.h"
 #include "platform/scan/verilog/verilog_keywords.h"
 
 namespace scan::verilog {
-
-constexpr int kMaxDepth = 400;
 
 inline bool isTypeWord(Word word) {
   switch (word) {
@@ -18,15 +17,5 @@ inline bool isTypeWord(Word word) {
       return false;
   }
 }
-
-class DepthGuard {
- public:
-  explicit DepthGuard(int& depth) : m_Depth(depth) { ++m_Depth; }
-  ~DepthGuard() { --m_Depth; }
-  bool tooDeep() const { return m_Depth > kMaxDepth; }
-
- private:
-  int& m_Depth;
-};
 
 }  // namespace scan::verilog

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <cstdlib>
 
+#include "platform/scan/common/ascii.h"
 #include "platform/scan/common/diagnostics.h"
 #include "platform/scan/common/source_buffer.h"
 #include "platform/scan/vhdl/vhdl_literal.h"
@@ -12,11 +13,8 @@
 namespace scan::vhdl {
 
 std::string normalizeName(std::string_view name) {
-  std::string out(name);
-  if (!out.empty() && out[0] == '\\') return out;
-  for (char& c : out)
-    if (c >= 'A' && c <= 'Z') c = static_cast<char>(c + 32);
-  return out;
+  if (!name.empty() && name[0] == '\\') return std::string(name);
+  return asciiLowered(name);
 }
 
 std::string quoted(std::string_view text) {

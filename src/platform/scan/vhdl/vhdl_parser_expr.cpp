@@ -6,21 +6,14 @@
 #include <cstdlib>
 
 #include "platform/scan/common/diagnostics.h"
+#include "platform/scan/common/reader_limits.h"
 #include "platform/scan/common/source_buffer.h"
 #include "platform/scan/vhdl/vhdl_literal.h"
 
 namespace scan::vhdl {
-namespace {
-
-// Parentheses and statements may nest this deep; real designs stay far below.
-constexpr int kMaxNesting = 200;
-// An operator chain such as a+b+c+... builds a tree this deep at most.
-constexpr uint16_t kMaxTreeDepth = 1000;
-
-}  // namespace
 
 ExprId Parser::add(Expr e) {
-  if (e.depth > kMaxTreeDepth) {
+  if (e.depth > limits::kVhdlTreeDepth) {
     fail(e.begin, "expression is too deeply nested");
     return kNoExpr;
   }
@@ -86,9 +79,9 @@ ExprId Parser::parseDiscreteRange() {
 
 ExprId Parser::parseExpression() {
   if (m_Failed) return kNoExpr;
-  if (++m_Depth > kMaxNesting) {
+  DepthGuard guard(m_Depth, limits::kVhdlSyntaxNesting);
+  if (guard.tooDeep()) {
     fail(peek().offset, "expression is too deeply nested");
-    --m_Depth;
     return kNoExpr;
   }
   size_t begin = peek().offset;
@@ -110,7 +103,6 @@ ExprId Parser::parseExpression() {
     take();
     left = binary(op, left, parseRelation());
   }
-  --m_Depth;
   return left;
 }
 
@@ -238,8 +230,8 @@ ExprId Parser::parsePrimary() {
 ExprId Parser::parseParenthesized() {
   size_t begin = peek().offset;
   take();
-  if (++m_Depth > kMaxNesting) {
-    --m_Depth;
+  DepthGuard guard(m_Depth, limits::kVhdlSyntaxNesting);
+  if (guard.tooDeep()) {
     fail(begin, "expression is too deeply nested");
     return kNoExpr;
   }
@@ -272,10 +264,7 @@ ExprId Parser::parseParenthesized() {
       n.args = std::move(choices);
       element = add(std::move(n));
     }
-    if (element == kNoExpr) {
-      --m_Depth;
-      return kNoExpr;
-    }
+    if (element == kNoExpr) return kNoExpr;
     aggregate = aggregate || m_Arena[element].kind == ExprKind::Range ||
                 m_Arena[element].kind == ExprKind::Named;
     depth = std::max(depth, m_Arena[element].depth);
@@ -283,7 +272,6 @@ ExprId Parser::parseParenthesized() {
     if (!accept(',')) break;
     aggregate = true;
   }
-  --m_Depth;
   if (!expect(')')) return kNoExpr;
   if (!aggregate) {
     ExprId inner = elements[0];
@@ -362,8 +350,8 @@ ExprId Parser::parseName() {
       id = add(std::move(a));
     } else if (peek().is('(')) {
       take();
-      if (++m_Depth > kMaxNesting) {
-        --m_Depth;
+      DepthGuard guard(m_Depth, limits::kVhdlSyntaxNesting);
+      if (guard.tooDeep()) {
         fail(begin, "expression is too deeply nested");
         return kNoExpr;
       }
@@ -378,14 +366,10 @@ ExprId Parser::parseName() {
           take();
         }
         ExprId arg = parseDiscreteRange();
-        if (arg == kNoExpr) {
-          --m_Depth;
-          return kNoExpr;
-        }
+        if (arg == kNoExpr) return kNoExpr;
         c.depth = std::max(c.depth, static_cast<uint16_t>(m_Arena[arg].depth + 1));
         c.args.push_back(arg);
       } while (accept(','));
-      --m_Depth;
       if (!expect(')')) return kNoExpr;
       c.end = lastEnd();
       id = add(std::move(c));
