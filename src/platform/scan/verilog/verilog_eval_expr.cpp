@@ -9,26 +9,28 @@
 namespace scan::verilog {
 namespace {
 
-bool isComparison(const std::string& op) {
-  return op == "==" || op == "!=" || op == "===" || op == "!==" || op == "==?" || op == "!=?" ||
-         op == "<" || op == "<=" || op == ">" || op == ">=";
+bool isComparison(Op op) { return op >= Op::Equal && op <= Op::GreaterEqual; }
+
+// !=, !== and !=?: this evaluator has no x or z bits, so all three are plain inequality.
+bool isInequality(Op op) {
+  return op == Op::NotEqual || op == Op::CaseNotEqual || op == Op::WildNotEqual;
 }
 
-bool compare(const std::string& op, double a, double b) {
-  if (op == "<") return a < b;
-  if (op == "<=") return a <= b;
-  if (op == ">") return a > b;
-  if (op == ">=") return a >= b;
-  if (op[0] == '!') return a != b;
+bool compare(Op op, double a, double b) {
+  if (op == Op::Less) return a < b;
+  if (op == Op::LessEqual) return a <= b;
+  if (op == Op::Greater) return a > b;
+  if (op == Op::GreaterEqual) return a >= b;
+  if (isInequality(op)) return a != b;
   return a == b;
 }
 
-bool compare(const std::string& op, int64_t a, int64_t b) {
-  if (op == "<") return a < b;
-  if (op == "<=") return a <= b;
-  if (op == ">") return a > b;
-  if (op == ">=") return a >= b;
-  if (op[0] == '!') return a != b;
+bool compare(Op op, int64_t a, int64_t b) {
+  if (op == Op::Less) return a < b;
+  if (op == Op::LessEqual) return a <= b;
+  if (op == Op::Greater) return a > b;
+  if (op == Op::GreaterEqual) return a >= b;
+  if (isInequality(op)) return a != b;
   return a == b;
 }
 
@@ -125,34 +127,34 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
     case Expr::Kind::Unary: {
       Value operand;
       if (!eval(*expr.args[0], scope, locals, operand)) return false;
-      const std::string& op = expr.op;
-      if (operand.isReal() && (op == "-" || op == "+")) {
-        out = Value::real(op == "-" ? -operand.asReal() : operand.asReal());
+      Op op = expr.op;
+      if (operand.isReal() && (op == Op::Minus || op == Op::Plus)) {
+        out = Value::real(op == Op::Minus ? -operand.asReal() : operand.asReal());
         return true;
       }
       int64_t v = 0;
       if (!toInteger(operand, v)) return false;
       uint64_t u = static_cast<uint64_t>(v);
-      if (int w = operand.unsignedWidth(); w && (op == "+" || op == "-" || op == "~")) {
-        out = unsignedValue(op == "+" ? u : op == "-" ? uint64_t{0} - u : ~u, w);
+      if (int w = operand.unsignedWidth(); w && (op == Op::Plus || op == Op::Minus || op == Op::BitNot)) {
+        out = unsignedValue(op == Op::Plus ? u : op == Op::Minus ? uint64_t{0} - u : ~u, w);
         return true;
       }
-      if (int w = operand.unsignedWidth(); w && (op == "&" || op == "~&")) {
+      if (int w = operand.unsignedWidth(); w && (op == Op::BitAnd || op == Op::BitNand)) {
         bool all = u == lowMask(w);
-        out = Value::integer(op == "&" ? all : !all);
+        out = Value::integer(op == Op::BitAnd ? all : !all);
         return true;
       }
       int64_t r = 0;
-      if (op == "+") r = v;
-      else if (op == "-") {
+      if (op == Op::Plus) r = v;
+      else if (op == Op::Minus) {
         if (!checkedSub(0, v, r)) return fail("arithmetic overflow");
-      } else if (op == "!") r = v == 0;
-      else if (op == "~") r = ~v;
-      else if (op == "&") r = u == ~uint64_t{0};
-      else if (op == "~&") r = u != ~uint64_t{0};
-      else if (op == "|") r = u != 0;
-      else if (op == "~|") r = u == 0;
-      else if (op == "^") r = std::popcount(u) & 1;
+      } else if (op == Op::LogicalNot) r = v == 0;
+      else if (op == Op::BitNot) r = ~v;
+      else if (op == Op::BitAnd) r = u == ~uint64_t{0};
+      else if (op == Op::BitNand) r = u != ~uint64_t{0};
+      else if (op == Op::BitOr) r = u != 0;
+      else if (op == Op::BitNor) r = u == 0;
+      else if (op == Op::BitXor) r = std::popcount(u) & 1;
       else r = !(std::popcount(u) & 1);
       out = Value::integer(r);
       return true;
@@ -181,52 +183,52 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
 
 // Unsigned operands make the operation unsigned at the wider operand's width (an integer
 // counts 32 bits), wrapping as Verilog does: with N = 32'd0, N - 1 is 4294967295.
-bool Evaluator::unsignedBinary(const std::string& op, const Value& a, const Value& b, int64_t x,
+bool Evaluator::unsignedBinary(Op op, const Value& a, const Value& b, int64_t x,
                                int64_t y, Value& out) {
-  bool selfSized = op == "<<" || op == ">>" || op == "<<<" || op == ">>>" || op == "**";
+  bool selfSized = op == Op::ShiftLeft || op == Op::ShiftRight || op == Op::ArithShiftLeft || op == Op::ArithShiftRight || op == Op::Power;
   int width = selfSized ? a.unsignedWidth() : std::max(operandWidth(a), operandWidth(b));
   uint64_t mask = lowMask(width);
   uint64_t ux = static_cast<uint64_t>(x) & mask, uy = static_cast<uint64_t>(y) & mask;
   if (isComparison(op)) {
-    bool result = op == "<"    ? ux < uy
-                  : op == "<=" ? ux <= uy
-                  : op == ">"  ? ux > uy
-                  : op == ">=" ? ux >= uy
-                  : op[0] == '!' ? ux != uy
+    bool result = op == Op::Less    ? ux < uy
+                  : op == Op::LessEqual ? ux <= uy
+                  : op == Op::Greater  ? ux > uy
+                  : op == Op::GreaterEqual ? ux >= uy
+                  : isInequality(op) ? ux != uy
                                  : ux == uy;
     out = Value::integer(result);
     return true;
   }
   uint64_t r = 0;
-  if (op == "+") r = ux + uy;
-  else if (op == "-") r = ux - uy;
-  else if (op == "*") r = ux * uy;
-  else if (op == "/" || op == "%") {
+  if (op == Op::Plus) r = ux + uy;
+  else if (op == Op::Minus) r = ux - uy;
+  else if (op == Op::Times) r = ux * uy;
+  else if (op == Op::Divide || op == Op::Modulo) {
     if (uy == 0) return fail("division by zero");
-    r = op == "/" ? ux / uy : ux % uy;
-  } else if (op == "**") {
+    r = op == Op::Divide ? ux / uy : ux % uy;
+  } else if (op == Op::Power) {
     if (y < 0 && !b.unsignedWidth()) r = ux == 1 ? 1 : 0;
     else r = unsignedPower(ux, static_cast<uint64_t>(y));
-  } else if (op == "<<" || op == "<<<") r = y < 0 || y >= 64 ? 0 : ux << y;
-  else if (op == ">>" || op == ">>>") r = y < 0 || y >= 64 ? 0 : ux >> y;
-  else if (op == "&") r = ux & uy;
-  else if (op == "|") r = ux | uy;
-  else if (op == "^") r = ux ^ uy;
-  else if (op == "~^" || op == "^~") r = ~(ux ^ uy);
-  else return fail("unsupported operator '" + op + "'");
+  } else if (op == Op::ShiftLeft || op == Op::ArithShiftLeft) r = y < 0 || y >= 64 ? 0 : ux << y;
+  else if (op == Op::ShiftRight || op == Op::ArithShiftRight) r = y < 0 || y >= 64 ? 0 : ux >> y;
+  else if (op == Op::BitAnd) r = ux & uy;
+  else if (op == Op::BitOr) r = ux | uy;
+  else if (op == Op::BitXor) r = ux ^ uy;
+  else if (op == Op::BitXnor || op == Op::BitXnorAlt) r = ~(ux ^ uy);
+  else return fail("unsupported operator '" + std::string(operatorText(op)) + "'");
   out = unsignedValue(r, width);
   return true;
 }
 
 bool Evaluator::binary(const Expr& expr, const Value& a, Scope& scope, Locals* locals,
                        Value& out) {
-  const std::string& op = expr.op;
+  Op op = expr.op;
   Value b;
-  if (op == "&&" || op == "||") {  // short-circuit, as constant functions rely on it
+  if (op == Op::LogicalAnd || op == Op::LogicalOr) {  // short-circuit, as constant functions rely on it
     int64_t x = 0;
     bool left = a.isReal() ? a.asReal() != 0 : (toInteger(a, x) && x != 0);
     if (!m_Error.empty()) return false;
-    if (op == "&&" ? !left : left) {
+    if (op == Op::LogicalAnd ? !left : left) {
       out = Value::integer(left ? 1 : 0);
       return true;
     }
@@ -239,29 +241,29 @@ bool Evaluator::binary(const Expr& expr, const Value& a, Scope& scope, Locals* l
   if (!eval(*expr.args[1], scope, locals, b)) return false;
   if (a.isString() && b.isString() && isComparison(op)) {
     bool equal = a.asString() == b.asString();
-    out = Value::integer(op[0] == '!' ? !equal : equal);
+    out = Value::integer(isInequality(op) ? !equal : equal);
     return true;
   }
   if (a.isReal() || b.isReal()) {
     std::optional<double> x = a.toReal(), y = b.toReal();
-    if (!x || !y) return fail("operator '" + op + "' needs numbers");
+    if (!x || !y) return fail("operator '" + std::string(operatorText(op)) + "' needs numbers");
     if (isComparison(op)) {
       out = Value::integer(compare(op, *x, *y));
       return true;
     }
-    if (op == "+") out = Value::real(*x + *y);
-    else if (op == "-") out = Value::real(*x - *y);
-    else if (op == "*") out = Value::real(*x * *y);
-    else if (op == "/") {
+    if (op == Op::Plus) out = Value::real(*x + *y);
+    else if (op == Op::Minus) out = Value::real(*x - *y);
+    else if (op == Op::Times) out = Value::real(*x * *y);
+    else if (op == Op::Divide) {
       if (*y == 0) return fail("division by zero");
       out = Value::real(*x / *y);
-    } else if (op == "**") out = Value::real(std::pow(*x, *y));
-    else return fail("operator '" + op + "' needs integers");
+    } else if (op == Op::Power) out = Value::real(std::pow(*x, *y));
+    else return fail("operator '" + std::string(operatorText(op)) + "' needs integers");
     return true;
   }
   int64_t x = 0, y = 0, r = 0;
   if (!toInteger(a, x) || !toInteger(b, y)) return false;
-  bool selfSized = op == "<<" || op == ">>" || op == "<<<" || op == ">>>" || op == "**";
+  bool selfSized = op == Op::ShiftLeft || op == Op::ShiftRight || op == Op::ArithShiftLeft || op == Op::ArithShiftRight || op == Op::Power;
   if (selfSized ? a.unsignedWidth() != 0 : a.unsignedWidth() || b.unsignedWidth())
     return unsignedBinary(op, a, b, x, y, out);
   if (isComparison(op)) {
@@ -270,27 +272,27 @@ bool Evaluator::binary(const Expr& expr, const Value& a, Scope& scope, Locals* l
   }
   uint64_t ux = static_cast<uint64_t>(x);
   bool ok = true;
-  if (op == "+") ok = checkedAdd(x, y, r);
-  else if (op == "-") ok = checkedSub(x, y, r);
-  else if (op == "*") ok = checkedMul(x, y, r);
-  else if (op == "/") {
+  if (op == Op::Plus) ok = checkedAdd(x, y, r);
+  else if (op == Op::Minus) ok = checkedSub(x, y, r);
+  else if (op == Op::Times) ok = checkedMul(x, y, r);
+  else if (op == Op::Divide) {
     if (y == 0) return fail("division by zero");
     ok = checkedDiv(x, y, r);
-  } else if (op == "%") {
+  } else if (op == Op::Modulo) {
     if (y == 0) return fail("division by zero");
     r = y == -1 ? 0 : x % y;
-  } else if (op == "**") {
+  } else if (op == Op::Power) {
     if (y < 0) r = x == 1 ? 1 : x == -1 ? (y % 2 ? -1 : 1) : 0;
     else ok = checkedPow(x, y, r);
-  } else if (op == "<<" || op == "<<<") r = y < 0 || y >= 64 ? 0 : static_cast<int64_t>(ux << y);
-  else if (op == ">>") r = y < 0 || y >= 64 ? 0 : static_cast<int64_t>(ux >> y);
-  else if (op == ">>>") r = y < 0 ? 0 : y >= 64 ? (x < 0 ? -1 : 0) : x >> y;
-  else if (op == "&") r = x & y;
-  else if (op == "|") r = x | y;
-  else if (op == "^") r = x ^ y;
-  else if (op == "~^" || op == "^~") r = ~(x ^ y);
-  else return fail("unsupported operator '" + op + "'");
-  if (!ok) return fail("arithmetic overflow in '" + op + "'");
+  } else if (op == Op::ShiftLeft || op == Op::ArithShiftLeft) r = y < 0 || y >= 64 ? 0 : static_cast<int64_t>(ux << y);
+  else if (op == Op::ShiftRight) r = y < 0 || y >= 64 ? 0 : static_cast<int64_t>(ux >> y);
+  else if (op == Op::ArithShiftRight) r = y < 0 ? 0 : y >= 64 ? (x < 0 ? -1 : 0) : x >> y;
+  else if (op == Op::BitAnd) r = x & y;
+  else if (op == Op::BitOr) r = x | y;
+  else if (op == Op::BitXor) r = x ^ y;
+  else if (op == Op::BitXnor || op == Op::BitXnorAlt) r = ~(x ^ y);
+  else return fail("unsupported operator '" + std::string(operatorText(op)) + "'");
+  if (!ok) return fail("arithmetic overflow in '" + std::string(operatorText(op)) + "'");
   out = Value::integer(r);
   return true;
 }

@@ -66,12 +66,12 @@ bool Evaluator::runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flo
       Value v;
       if (!eval(*stmt.value, scope, &locals, v)) return false;
       if (stmt.index) return assignSelect(stmt, v, scope, locals);
-      if (stmt.op != "=") {
+      if (stmt.op != Op::None) {
         auto it = locals.find(stmt.target);
         if (it == locals.end()) return fail("unknown variable '" + stmt.target + "'");
         Expr current;
         current.kind = Expr::Kind::Binary;
-        current.op = stmt.op.substr(0, stmt.op.size() - 1);
+        current.op = stmt.op;
         auto left = std::make_shared<Expr>();
         left->kind = Expr::Kind::Name;
         left->name = stmt.target;

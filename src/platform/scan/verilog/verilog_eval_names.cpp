@@ -41,10 +41,10 @@ bool Evaluator::evalElement(const Expr& select, const std::string& name, Paramet
     return fail("parameter array '" + name + "' is not given an assignment pattern");
   const Expr* element = nullptr;
   size_t at = static_cast<size_t>(position);
-  if (pattern->op == "{") {
+  if (pattern->op == Op::PatternReplicate) {
     size_t items = pattern->args.size() - 1;
     if (items > 0) element = pattern->args[1 + at % items].get();
-  } else if (pattern->op == ":") {
+  } else if (pattern->op == Op::PatternKeyed) {
     for (size_t k = 0; k + 1 < pattern->args.size() && !element; k += 2) {
       Value key;
       int64_t keyIndex = 0;

@@ -4,10 +4,10 @@
 
 #include <algorithm>
 #include <cstdint>
-#include <string>
 
 #include "platform/scan/common/reader_limits.h"
 #include "platform/scan/common/value.h"
+#include "platform/scan/verilog/verilog_expr.h"
 
 namespace scan::verilog {
 
@@ -16,14 +16,13 @@ inline uint64_t lowMask(int64_t width) {
 }
 
 // The low bit and width of x[i], x[i:j], x[i+:j] or x[i-:j].
-inline void selectBits(const std::string& op, int64_t i, int64_t j, bool part, int64_t& low,
-                       int64_t& width) {
+inline void selectBits(Op op, int64_t i, int64_t j, bool part, int64_t& low, int64_t& width) {
   low = i;
   width = 1;
   if (!part) return;
-  if (op == "+:") {
+  if (op == Op::PlusSelect) {
     width = j;
-  } else if (op == "-:") {
+  } else if (op == Op::MinusSelect) {
     width = j;
     low = i - j + 1;
   } else {

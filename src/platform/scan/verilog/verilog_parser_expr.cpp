@@ -9,20 +9,23 @@ namespace {
 
 int precedence(const Token& token) {
   if (token.kind != TokenKind::Symbol) return 0;
-  std::string_view op = token.text;
-  if (op == "||") return 1;
-  if (op == "&&") return 2;
-  if (op == "|") return 3;
-  if (op == "^" || op == "~^" || op == "^~") return 4;
-  if (op == "&") return 5;
-  if (op == "==" || op == "!=" || op == "===" || op == "!==" || op == "==?" || op == "!=?")
-    return 6;
-  if (op == "<" || op == "<=" || op == ">" || op == ">=") return 7;
-  if (op == "<<" || op == ">>" || op == "<<<" || op == ">>>") return 8;
-  if (op == "+" || op == "-") return 9;
-  if (op == "*" || op == "/" || op == "%") return 10;
-  if (op == "**") return 11;
-  return 0;
+  switch (operatorOf(token.text)) {
+    case Op::LogicalOr: return 1;
+    case Op::LogicalAnd: return 2;
+    case Op::BitOr: return 3;
+    case Op::BitXor: case Op::BitXnor: case Op::BitXnorAlt: return 4;
+    case Op::BitAnd: return 5;
+    case Op::Equal: case Op::NotEqual: case Op::CaseEqual: case Op::CaseNotEqual:
+    case Op::WildEqual: case Op::WildNotEqual:
+      return 6;
+    case Op::Less: case Op::LessEqual: case Op::Greater: case Op::GreaterEqual: return 7;
+    case Op::ShiftLeft: case Op::ShiftRight: case Op::ArithShiftLeft: case Op::ArithShiftRight:
+      return 8;
+    case Op::Plus: case Op::Minus: return 9;
+    case Op::Times: case Op::Divide: case Op::Modulo: return 10;
+    case Op::Power: return 11;
+    default: return 0;
+  }
 }
 
 bool isUnaryOperator(const Token& token) {
@@ -66,7 +69,7 @@ ExprPtr Parser::binary(int minPrecedence) {
     ExprPtr right = binary(p + 1);
     if (!right) return nullptr;
     auto expr = std::const_pointer_cast<Expr>(make(Expr::Kind::Binary, opToken));
-    expr->op.assign(opToken.text);
+    expr->op = operatorOf(opToken.text);
     expr->args = {left, right};
     left = expr;
   }
@@ -84,7 +87,7 @@ ExprPtr Parser::unary() {
     ExprPtr operand = unary();
     if (!operand) return nullptr;
     auto expr = std::const_pointer_cast<Expr>(make(Expr::Kind::Unary, op));
-    expr->op.assign(op.text);
+    expr->op = operatorOf(op.text);
     expr->args = {operand};
     return expr;
   }
@@ -107,7 +110,7 @@ ExprPtr Parser::postfix(ExprPtr base) {
       select->args = {base, index};
       const Token& sep = m_Tokens.peek();
       if (sep.isSymbol(":") || sep.isSymbol("+:") || sep.isSymbol("-:")) {
-        select->op.assign(m_Tokens.take().text);
+        select->op = operatorOf(m_Tokens.take().text);
         ExprPtr second = expression();
         if (!second) return nullptr;
         select->args.push_back(second);
@@ -259,7 +262,7 @@ ExprPtr Parser::pattern(const Token& at) {
       if (!expectSymbol(":")) return nullptr;
       ExprPtr value = expression();
       if (!value) return nullptr;
-      expr->op = ":";
+      expr->op = Op::PatternKeyed;
       expr->args.push_back(nullptr);
       expr->args.push_back(value);
       continue;
@@ -267,7 +270,7 @@ ExprPtr Parser::pattern(const Token& at) {
     ExprPtr first = expression();
     if (!first) return nullptr;
     if (expr->args.empty() && m_Tokens.acceptSymbol("{")) {  // '{N{items}}
-      expr->op = "{";
+      expr->op = Op::PatternReplicate;
       expr->args.push_back(first);
       do {
         ExprPtr item = expression();
@@ -280,12 +283,12 @@ ExprPtr Parser::pattern(const Token& at) {
     if (m_Tokens.acceptSymbol(":")) {
       ExprPtr value = expression();
       if (!value) return nullptr;
-      expr->op = ":";
+      expr->op = Op::PatternKeyed;
       expr->args.push_back(first);
       expr->args.push_back(value);
       continue;
     }
-    if (expr->op == ":") {
+    if (expr->op == Op::PatternKeyed) {
       fail("expected 'key: value' in an assignment pattern");
       return nullptr;
     }

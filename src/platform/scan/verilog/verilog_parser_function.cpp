@@ -51,7 +51,7 @@ bool Parser::declaration(std::vector<Stmt>& out) {
 bool Parser::assignment(Stmt& stmt) {
   stmt.kind = Stmt::Kind::Assign;
   if (m_Tokens.peek().isSymbol("++") || m_Tokens.peek().isSymbol("--")) {
-    stmt.op = m_Tokens.take().text[0] == '+' ? "+=" : "-=";
+    stmt.op = m_Tokens.take().text[0] == '+' ? Op::Plus : Op::Minus;
     if (m_Tokens.peek().kind != TokenKind::Identifier) return false;
     stmt.target.assign(m_Tokens.take().text);
     stmt.value = one();
@@ -63,7 +63,7 @@ bool Parser::assignment(Stmt& stmt) {
     if (!(stmt.index = expression())) return false;
     const Token& sep = m_Tokens.peek();
     if (sep.isSymbol(":") || sep.isSymbol("+:") || sep.isSymbol("-:")) {
-      stmt.selectOp.assign(m_Tokens.take().text);
+      stmt.selectOp = operatorOf(m_Tokens.take().text);
       if (!(stmt.indexEnd = expression())) return false;
     }
     if (!expectSymbol("]")) return false;
@@ -71,7 +71,7 @@ bool Parser::assignment(Stmt& stmt) {
   }
   const Token& op = m_Tokens.peek();
   if (op.isSymbol("++") || op.isSymbol("--")) {
-    stmt.op = m_Tokens.take().text[0] == '+' ? "+=" : "-=";
+    stmt.op = m_Tokens.take().text[0] == '+' ? Op::Plus : Op::Minus;
     stmt.value = one();
     return true;
   }
@@ -80,7 +80,10 @@ bool Parser::assignment(Stmt& stmt) {
         op.text == "/=" || op.text == "%=" || op.text == "&=" || op.text == "|=" ||
         op.text == "^=" || op.text == "<<=" || op.text == ">>=" || op.text == "<="))
     return false;
-  stmt.op = op.text == "<=" ? "=" : std::string(m_Tokens.take().text);
+  if (!op.isSymbol("<=")) {
+    Token assign = m_Tokens.take();
+    if (assign.text.size() > 1) stmt.op = operatorOf(assign.text.substr(0, assign.text.size() - 1));
+  }
   stmt.value = expression();
   return stmt.value != nullptr;
 }

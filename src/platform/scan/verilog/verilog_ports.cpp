@@ -342,11 +342,11 @@ class PortBuilder {
     if (!m_Evaluator.integer(*member.left, scope, first)) return false;
     if (!member.right) return true;  // one bit
     if (!m_Evaluator.integer(*member.right, scope, second)) return false;
-    if (member.op == ":") {
+    if (member.op == Op::RangeSelect) {
       range = {true, first, second};
     } else if (second <= 0) {
       return setError("part-select width must be positive");
-    } else if (member.op == "+:") {
+    } else if (member.op == Op::PlusSelect) {
       range = {true, first + second - 1, first};
     } else {
       range = {true, first, first - second + 1};
