@@ -1,9 +1,9 @@
 // The extractor keeps the registered files per library and hands them to the reader of the
 // run's language; lookups walk the libraries in search order.
 #include <algorithm>
-#include <cctype>
 
 #include "platform/scan.h"
+#include "platform/scan/common/ascii.h"
 #include "platform/scan/common/diagnostics.h"
 #include "platform/scan/language_reader.h"
 
@@ -71,12 +71,7 @@ std::vector<ScanUnitInfo> ScanExtractor::listUnits() const {
 std::vector<std::string> ScanExtractor::unknownOverrides() const {
   // VHDL names ignore case; Verilog names do not.
   auto same = [this](const std::string& a, const std::string& b) {
-    if (a.size() != b.size()) return false;
-    for (size_t i = 0; i < a.size(); ++i) {
-      const auto x = static_cast<unsigned char>(a[i]), y = static_cast<unsigned char>(b[i]);
-      if (m_Language == Vhdl ? std::tolower(x) != std::tolower(y) : x != y) return false;
-    }
-    return true;
+    return m_Language == Vhdl ? scan::equalsIgnoringCase(a, b) : a == b;
   };
   std::vector<std::string> unknown;
   for (const auto& [name, value] : m_Settings.genericOverrides) {

@@ -1,5 +1,6 @@
 // Platform-independent parts of SourceBuffer: in-memory buffers and offset → line:column.
 #include <algorithm>
+#include <cstring>
 
 #include "platform/scan/common/source_buffer.h"
 
@@ -35,6 +36,25 @@ std::string_view SourceBuffer::lineText(size_t offset) const {
   while (stop < m_Size && m_Data[stop] != '\n') ++stop;
   if (stop > start && m_Data[stop - 1] == '\r') --stop;
   return {m_Data + start, stop - start};
+}
+
+size_t LineCounter::lineOf(const SourceBuffer& source, size_t offset) {
+  offset = std::min(offset, source.text().size());
+  if (m_Source != &source || offset < m_Offset) {
+    m_Source = &source;
+    m_Offset = 0;
+    m_Line = 1;
+  }
+  const char* p = source.begin() + m_Offset;
+  const char* end = source.begin() + offset;
+  while (p < end) {
+    const void* nl = std::memchr(p, '\n', static_cast<size_t>(end - p));
+    if (!nl) break;
+    ++m_Line;
+    p = static_cast<const char*>(nl) + 1;
+  }
+  m_Offset = offset;
+  return m_Line;
 }
 
 }  // namespace scan

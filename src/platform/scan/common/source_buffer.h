@@ -53,4 +53,17 @@ class SourceBuffer {
   mutable std::vector<size_t> m_LineStarts;  // built on the first locate()
 };
 
+/// Line numbers of offsets, counted forward from the last question so that the ports of a
+/// unit at the end of a large file cost one pass over it and no line table.
+class LineCounter {
+ public:
+  /// The 1-based line of `offset` in `source` (offsets past the end clamp to the end).
+  size_t lineOf(const SourceBuffer& source, size_t offset);
+
+ private:
+  const SourceBuffer* m_Source = nullptr;
+  size_t m_Offset = 0;
+  size_t m_Line = 1;
+};
+
 }  // namespace scan

@@ -9,6 +9,8 @@
 #include <variant>
 #include <vector>
 
+#include "platform/scan/common/checked_math.h"
+
 namespace scan {
 
 struct Composite;
@@ -70,14 +72,5 @@ struct Composite {
 inline Value Value::composite(Composite v) {
   return Value(std::shared_ptr<const Composite>(std::make_shared<Composite>(std::move(v))));
 }
-
-/// Checked integer arithmetic: false on overflow (or division by zero), result untouched.
-bool checkedAdd(int64_t a, int64_t b, int64_t& result);
-bool checkedSub(int64_t a, int64_t b, int64_t& result);
-bool checkedMul(int64_t a, int64_t b, int64_t& result);
-bool checkedDiv(int64_t a, int64_t b, int64_t& result);
-bool checkedPow(int64_t base, int64_t exponent, int64_t& result);
-/// True when `v` fits a port bound (signed 32-bit).
-bool fitsBound(int64_t v);
 
 }  // namespace scan

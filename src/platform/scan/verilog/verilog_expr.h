@@ -5,6 +5,7 @@
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <string_view>
 #include <vector>
 
 namespace scan {
@@ -12,6 +13,28 @@ class SourceBuffer;
 }
 
 namespace scan::verilog {
+
+/// An operator, fixed when the expression is read. The two spellings of xnor stay apart so
+/// that messages quote the operator as it was written.
+enum class Op : uint8_t {
+  None,
+  Plus, Minus, Times, Divide, Modulo, Power,
+  LogicalAnd, LogicalOr, LogicalNot,
+  BitAnd, BitOr, BitXor, BitXnor, BitXnorAlt, BitNot, BitNand, BitNor,
+  Equal, NotEqual, CaseEqual, CaseNotEqual, WildEqual, WildNotEqual,
+  Less, LessEqual, Greater, GreaterEqual,
+  ShiftLeft, ShiftRight, ArithShiftLeft, ArithShiftRight,
+  RangeSelect,       ///< x[i:j]
+  PlusSelect,        ///< x[i+:j]
+  MinusSelect,       ///< x[i-:j]
+  PatternReplicate,  ///< '{n{items}}
+  PatternKeyed,      ///< '{key: value, default: value}
+};
+
+/// The operator spelled `text` (a select's ":" is RangeSelect); Op::None when none is.
+Op operatorOf(std::string_view text);
+/// How `op` is written.
+std::string_view operatorText(Op op);
 
 struct Expr;
 using ExprPtr = std::shared_ptr<const Expr>;
@@ -37,11 +60,11 @@ struct Expr {
     Replicate,  ///< {args[0]{args[1..]}}
     Select,     ///< args[0][args[1]] or args[0][args[1]:args[2]]
     TypeName,   ///< a data type used as an argument ($bits(logic [3:0]))
-    Pattern,    ///< '{args}; op "{": '{args[0]{args[1..]}}; op ":": key, value pairs (null key:
-                ///< default)
+    Pattern,    ///< '{args}; PatternReplicate: '{args[0]{args[1..]}}; PatternKeyed: key,
+                ///< value pairs (null key: default)
   };
   Kind kind = Kind::Number;
-  std::string op;     ///< operator, or "+:"/"-:"/":" for selects
+  Op op = Op::None;   ///< operator, or the kind of a part select or pattern
   std::string name;   ///< names, functions, system functions
   std::string scope;  ///< package of a scoped name
   int64_t integer = 0;
@@ -105,7 +128,7 @@ struct Stmt {
   enum class Kind { Block, Assign, If, For, While, Repeat, Return, Case, Declare, Nothing };
   Kind kind = Kind::Nothing;
   std::string target;  ///< assigned or declared variable
-  std::string op;      ///< "=", "+=", ... for Assign
+  Op op = Op::None;    ///< Assign: the operator of `+=`, `<<=`, ...; None for `=`
   ExprPtr value;       ///< right-hand side, condition, count or returned value
   std::vector<Stmt> body;     ///< block statements; If: then, else; loops: init, step, body
   std::vector<std::vector<ExprPtr>> labels;  ///< Case: one label list per body statement
@@ -113,7 +136,7 @@ struct Stmt {
   /// Assign to a bit or part select, target[index], target[index selectOp indexEnd].
   ExprPtr index;
   ExprPtr indexEnd;
-  std::string selectOp;
+  Op selectOp = Op::None;
 };
 
 struct Function {

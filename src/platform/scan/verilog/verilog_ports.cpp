@@ -3,7 +3,6 @@
 #include "platform/scan/verilog/verilog_ports.h"
 
 #include <algorithm>
-#include <cstring>
 
 #include "platform/scan/common/diagnostics.h"
 #include "platform/scan/common/source_buffer.h"
@@ -343,11 +342,11 @@ class PortBuilder {
     if (!m_Evaluator.integer(*member.left, scope, first)) return false;
     if (!member.right) return true;  // one bit
     if (!m_Evaluator.integer(*member.right, scope, second)) return false;
-    if (member.op == ":") {
+    if (member.op == Op::RangeSelect) {
       range = {true, first, second};
     } else if (second <= 0) {
       return setError("part-select width must be positive");
-    } else if (member.op == "+:") {
+    } else if (member.op == Op::PlusSelect) {
       range = {true, first + second - 1, first};
     } else {
       range = {true, first, first - second + 1};
@@ -432,25 +431,6 @@ class PortBuilder {
 };
 
 }  // namespace
-
-size_t LineCounter::lineOf(const SourceBuffer& source, size_t offset) {
-  offset = std::min(offset, source.text().size());
-  if (m_Source != &source || offset < m_Offset) {
-    m_Source = &source;
-    m_Offset = 0;
-    m_Line = 1;
-  }
-  const char* p = source.begin() + m_Offset;
-  const char* end = source.begin() + offset;
-  while (p < end) {
-    const void* nl = std::memchr(p, '\n', static_cast<size_t>(end - p));
-    if (!nl) break;
-    ++m_Line;
-    p = static_cast<const char*>(nl) + 1;
-  }
-  m_Offset = offset;
-  return m_Line;
-}
 
 std::vector<ScanPort> buildPorts(UnitModel& model, Evaluator& evaluator,
                                  const DesignIndex& index, Diagnostics& diagnostics,

@@ -29,11 +29,10 @@
 
 namespace scan {
 class Diagnostics;
-}
+class LineCounter;
+}  // namespace scan
 
 namespace scan::verilog {
-
-class LineCounter;
 
 /// What the fix in a range problem depends on.
 struct RangeHints {
@@ -44,17 +43,5 @@ struct RangeHints {
 std::vector<ScanPort> buildPorts(UnitModel& model, Evaluator& evaluator,
                                  const DesignIndex& index, Diagnostics& diagnostics,
                                  LineCounter& lines, const RangeHints& hints);
-
-/// Line numbers of offsets, counted forward from the last question so that the ports of a
-/// unit at the end of a large file cost one pass over it.
-class LineCounter {
- public:
-  size_t lineOf(const SourceBuffer& source, size_t offset);
-
- private:
-  const SourceBuffer* m_Source = nullptr;
-  size_t m_Offset = 0;
-  size_t m_Line = 1;
-};
 
 }  // namespace scan::verilog

@@ -6,6 +6,7 @@
 #include <array>
 
 #include "platform/scan/common/diagnostics.h"
+#include "platform/scan/common/reader_limits.h"
 #include "platform/scan/common/source_buffer.h"
 #include "platform/scan/verilog/verilog_sources.h"
 
@@ -15,7 +16,6 @@ namespace {
 // Limits that turn runaway input (recursive macros, include cycles through many names,
 // exponential expansions) into one error instead of a hang or unbounded memory.
 constexpr size_t kMaxFrames = 256;
-constexpr size_t kMaxIncludeDepth = 64;
 // Per use of a macro outside any macro text. Real macros (UVM's included) stay far below these;
 // a recursive definition reaches them in microseconds instead of flooding the index pass.
 constexpr size_t kMaxExpansions = 20000;
@@ -367,7 +367,7 @@ void Preprocessor::include(const Token& token) {
     }
     if (frame.file) ++depth;
   }
-  if (depth >= kMaxIncludeDepth || m_Frames.size() >= kMaxFrames) {
+  if (depth >= limits::kVerilogIncludeNesting || m_Frames.size() >= kMaxFrames) {
     error(token, "includes nested too deeply at \"" + name + "\"");
     return;
   }

@@ -9,6 +9,7 @@
 #include <cstdlib>
 
 #include "platform/scan/common/diagnostics.h"
+#include "platform/scan/common/source_buffer.h"
 #include "platform/scan/verilog/verilog_eval.h"
 #include "platform/scan/verilog/verilog_ports.h"
 #include "platform/scan/verilog/verilog_preprocessor.h"

@@ -329,7 +329,7 @@ bool readPortMember(Parser& parser, PortReference::Member& member) {
   if (!member.left) return false;
   const Token& sep = tokens.peek();
   if (sep.isSymbol(":") || sep.isSymbol("+:") || sep.isSymbol("-:")) {
-    member.op.assign(tokens.take().text);
+    member.op = operatorOf(tokens.take().text);
     member.right = parser.expression();
     if (!member.right) return false;
   }

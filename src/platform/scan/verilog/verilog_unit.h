@@ -38,7 +38,7 @@ struct PortReference {
     std::string signal;
     ExprPtr left;   ///< select, when written
     ExprPtr right;  ///< second bound of a part select
-    std::string op;
+    Op op = Op::None;  ///< the kind of part select
   };
   std::string name;  ///< empty for an unnamed concatenation
   std::vector<Member> members;

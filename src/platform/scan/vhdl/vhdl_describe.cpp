@@ -8,14 +8,13 @@
 #include <cmath>
 
 #include "platform/scan/common/diagnostics.h"
+#include "platform/scan/common/reader_limits.h"
 #include "platform/scan/vhdl/vhdl_lexer.h"
 #include "platform/scan/vhdl/vhdl_parser.h"
 
 namespace scan::vhdl {
 namespace {
 
-// Subtypes defined by other subtypes; a cycle stops here.
-constexpr int kMaxTypeChain = 32;
 
 bool isIn(std::string_view name, std::initializer_list<std::string_view> names) {
   for (std::string_view n : names)
@@ -137,7 +136,7 @@ std::vector<ScanGeneric> Describer::generics(UnitScope& entity,
 
 Describer::TypeInfo Describer::classify(UnitScope* unit, const SubtypeIndication& subtype,
                                         int depth) {
-  if (!subtype.valid() || depth > kMaxTypeChain) return {};
+  if (!subtype.valid() || depth > limits::kVhdlDefinitionChain) return {};
   auto [owner, decl] = m_Evaluator.declarationOf(EvalContext{unit, nullptr}, subtype.typeMark);
   if (decl == nullptr) {
     std::string name = normalizeName(subtype.typeMark.back());
@@ -317,7 +316,7 @@ UnitScope* Describer::ownerOf(UnitScope& entity, const SubtypeIndication& subtyp
   if (holds(entity, subtype.indexConstraint, subtype.rangeConstraint)) return &entity;
   UnitScope* unit = &entity;
   const SubtypeIndication* s = &subtype;
-  for (int depth = 0; depth <= kMaxTypeChain && s->valid(); ++depth) {
+  for (int depth = 0; depth <= limits::kVhdlDefinitionChain && s->valid(); ++depth) {
     auto [owner, decl] = m_Evaluator.declarationOf(EvalContext{unit, nullptr}, s->typeMark);
     if (decl == nullptr) return nullptr;
     if (decl->kind == DeclKind::ArrayType)

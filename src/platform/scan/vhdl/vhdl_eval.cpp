@@ -5,14 +5,12 @@
 
 #include <cmath>
 
+#include "platform/scan/common/reader_limits.h"
 #include "platform/scan/vhdl/vhdl_parser.h"
 #include "platform/scan/vhdl/vhdl_types.h"
 
 namespace scan::vhdl {
 namespace {
-
-// Evaluation recursion (nested expressions, constants defined by other constants).
-constexpr int kMaxDepth = 400;
 
 bool isTypeDecl(DeclKind k) {
   return k == DeclKind::Subtype || k == DeclKind::ArrayType || k == DeclKind::RangeType ||
@@ -62,12 +60,8 @@ bool Evaluator::step() {
 
 bool Evaluator::eval(const EvalContext& c, ExprId id, Value& out) {
   if (id == kNoExpr) return failWith("missing expression");
-  if (m_Depth >= kMaxDepth) return failWith("evaluation is nested too deeply");
-  struct Guard {
-    int& depth;
-    explicit Guard(int& d) : depth(d) { ++depth; }
-    ~Guard() { --depth; }
-  } guard(m_Depth);
+  DepthGuard guard(m_Depth, limits::kVhdlEvalNesting);
+  if (guard.tooDeep()) return failWith("evaluation is nested too deeply");
   const Expr& e = c.unit->arena[static_cast<size_t>(id)];
   switch (e.kind) {
     case ExprKind::Literal:
@@ -123,9 +117,8 @@ Evaluator::Found Evaluator::pick(UnitScope* unit, const std::string& key, size_t
 // An alias stands for what it names. One that names no declaration (a predefined type, a
 // record field) is kept: its target is evaluated or looked up by name where it is used.
 Evaluator::Found Evaluator::followAlias(Found f, size_t arity) {
-  constexpr int kMaxAliasChain = 32;
   if (f.decl == nullptr || f.decl->kind != DeclKind::Alias) return f;
-  if (m_AliasHops >= kMaxAliasChain) return f;
+  if (m_AliasHops >= limits::kVhdlDefinitionChain) return f;
   ++m_AliasHops;
   const Expr& target = f.unit->arena[static_cast<size_t>(f.decl->init)];
   Found named = resolve(EvalContext{f.unit, nullptr}, target, arity);

@@ -6,6 +6,8 @@
 #include <cstdio>
 #include <cstdlib>
 
+#include "platform/scan/common/ascii.h"
+#include "platform/scan/common/reader_limits.h"
 #include "platform/scan/vhdl/vhdl_eval.h"
 #include "platform/scan/vhdl/vhdl_parser.h"
 #include "platform/scan/vhdl/vhdl_types.h"
@@ -13,20 +15,11 @@
 namespace scan::vhdl {
 namespace {
 
-// Subtypes defined by other subtypes; a cycle stops here.
-constexpr int kMaxTypeChain = 32;
 // An aggregate such as (0 to 2**30 => 0) would otherwise allocate without bound.
 constexpr int64_t kMaxElements = 1 << 20;
 
 std::string_view sourceText(const EvalContext& c, const Expr& e) {
   return c.unit->source->text().substr(e.begin, e.end - e.begin);
-}
-
-std::string lowerCase(std::string_view text) {
-  std::string out(text);
-  for (char& ch : out)
-    if (ch >= 'A' && ch <= 'Z') ch = static_cast<char>(ch + 32);
-  return out;
 }
 
 // The shortest digits that read back as `v`, written d.ddd with an exponent unless it is 0:
@@ -65,7 +58,7 @@ bool Evaluator::evalAs(const EvalContext& c, ExprId id, UnitScope* typeUnit,
 
 bool Evaluator::describeType(UnitScope* unit, const SubtypeIndication& s, TargetType& out,
                              int depth) {
-  if (depth > kMaxTypeChain) return failWith("a subtype is defined in terms of itself");
+  if (depth > limits::kVhdlDefinitionChain) return failWith("a subtype is defined in terms of itself");
   EvalContext c{unit, nullptr};
   if (!out.constrained && !s.indexConstraint.empty() &&
       unit->arena[static_cast<size_t>(s.indexConstraint[0])].kind != ExprKind::Open) {
@@ -298,7 +291,7 @@ bool Evaluator::evalImage(const EvalContext& c, const Expr& e, Value& out) {
   Found f = prefix.kind == ExprKind::Name || prefix.kind == ExprKind::Selected
                 ? resolve(c, prefix, kAnyArity)
                 : Found{};
-  for (int hops = 0; f.decl != nullptr && f.decl->kind == DeclKind::Subtype && hops < kMaxTypeChain;
+  for (int hops = 0; f.decl != nullptr && f.decl->kind == DeclKind::Subtype && hops < limits::kVhdlDefinitionChain;
        ++hops)
     f = resolveMark(EvalContext{f.unit, nullptr}, f.decl->subtype.typeMark);
   if (f.decl != nullptr && f.decl->kind == DeclKind::EnumType && v.isInteger()) {
@@ -307,7 +300,7 @@ bool Evaluator::evalImage(const EvalContext& c, const Expr& e, Value& out) {
     if (position < 0 || position >= f.decl->position)
       return failWith("the value in " + quoted(sourceText(c, e)) + " is out of range");
     std::string_view name = f.unit->decls[at + 1 + static_cast<size_t>(position)].name;
-    out = Value::string(name[0] == '\\' || name[0] == '\'' ? std::string(name) : lowerCase(name));
+    out = Value::string(name[0] == '\\' || name[0] == '\'' ? std::string(name) : asciiLowered(name));
     return true;
   }
   if (v.isBoolean()) {

@@ -2,6 +2,7 @@
 // port's subtype (scalar, constrained array, unconstrained array).
 #include <cmath>
 
+#include "platform/scan/common/reader_limits.h"
 #include "platform/scan/vhdl/vhdl_eval.h"
 #include "platform/scan/vhdl/vhdl_parser.h"
 #include "platform/scan/vhdl/vhdl_types.h"
@@ -9,8 +10,6 @@
 namespace scan::vhdl {
 namespace {
 
-// Subtypes defined by other subtypes; a cycle stops here.
-constexpr int kMaxTypeChain = 32;
 
 std::string markText(const std::vector<std::string_view>& mark) {
   std::string out;
@@ -85,12 +84,8 @@ bool Evaluator::subtypeRange(const EvalContext& c, const SubtypeIndication& s, R
 }
 
 bool Evaluator::declRange(UnitScope* unit, Decl& decl, RangeValue& out) {
-  if (m_Depth >= 400) return failWith("types are nested too deeply");
-  struct Guard {
-    int& depth;
-    explicit Guard(int& d) : depth(d) { ++depth; }
-    ~Guard() { --depth; }
-  } guard(m_Depth);
+  DepthGuard guard(m_Depth, limits::kVhdlEvalNesting);
+  if (guard.tooDeep()) return failWith("types are nested too deeply");
   EvalContext c{unit, nullptr};
   switch (decl.kind) {
     case DeclKind::Subtype:
@@ -215,7 +210,7 @@ bool Evaluator::evalAttribute(const EvalContext& c, const Expr& e, Value& out) {
 Evaluator::Shape Evaluator::shapeOfDecl(UnitScope* unit, const Decl& decl, RangeValue& out,
                                         const Expr*& failed, int depth) {
   EvalContext c{unit, nullptr};
-  if (depth > kMaxTypeChain) {
+  if (depth > limits::kVhdlDefinitionChain) {
     failWith("subtype " + quoted(decl.name) + " is defined in terms of itself");
     return Shape::Failed;
   }

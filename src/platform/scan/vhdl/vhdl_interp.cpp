@@ -1,15 +1,11 @@
 // The interpreter for user functions that size ports (log2ceil and friends): integer, real
 // and boolean variables, if/case, the three loop forms, exit/next and return. Every
 // statement and loop turn costs a step; a runaway loop ends at the step limit.
+#include "platform/scan/common/reader_limits.h"
 #include "platform/scan/vhdl/vhdl_eval.h"
 #include "platform/scan/vhdl/vhdl_parser.h"
 
 namespace scan::vhdl {
-namespace {
-
-constexpr int kMaxCalls = 64;
-
-}  // namespace
 
 bool Evaluator::callFunction(UnitScope* unit, Decl& decl, const std::vector<Value>& args,
                              Value& out) {
@@ -29,7 +25,7 @@ bool Evaluator::callFunction(UnitScope* unit, Decl& decl, const std::vector<Valu
     }
   }
   if (bodyDecl == nullptr) return failWith("function " + quoted(decl.name) + " has no body");
-  if (m_Calls >= kMaxCalls) return failWith("function calls are nested too deeply");
+  if (m_Calls >= limits::kVhdlCallNesting) return failWith("function calls are nested too deeply");
   const FunctionBody* fn = m_Design.function(*bodyUnit, *bodyDecl);
   if (fn == nullptr) return failWith("function " + quoted(decl.name) + " cannot be evaluated");
   if (args.size() > fn->parameters.size())

@@ -6,6 +6,8 @@
 #include <array>
 #include <cstring>
 
+#include "platform/scan/common/ascii.h"
+
 namespace scan::vhdl {
 namespace {
 
@@ -33,7 +35,6 @@ inline bool isWordChar(char c) {
   uint8_t k = classOf(c);
   return k == Letter || k == Digit || c == '_';
 }
-inline char lower(char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c + 32) : c; }
 
 constexpr std::string_view kReserved[] = {
     "abs", "access", "after", "alias", "all", "and", "architecture", "array", "assert",
@@ -53,10 +54,10 @@ constexpr std::string_view kReserved[] = {
 // A base specifier of a bit-string literal: b o x d, optionally prefixed by u or s.
 bool isBaseSpecifier(const char* p, size_t n) {
   if (n == 0 || n > 2) return false;
-  char last = lower(p[n - 1]);
+  char last = asciiLower(p[n - 1]);
   bool base = last == 'b' || last == 'o' || last == 'x' || last == 'd';
   if (n == 1) return base;
-  char sign = lower(p[0]);
+  char sign = asciiLower(p[0]);
   return base && last != 'd' && (sign == 'u' || sign == 's');
 }
 
@@ -65,14 +66,14 @@ bool isBaseSpecifier(const char* p, size_t n) {
 bool equalsWord(std::string_view a, std::string_view lowerWord) {
   if (a.size() != lowerWord.size()) return false;
   for (size_t i = 0; i < a.size(); ++i)
-    if (lower(a[i]) != lowerWord[i]) return false;
+    if (asciiLower(a[i]) != lowerWord[i]) return false;
   return true;
 }
 
 bool isReservedWord(std::string_view word) {
   if (word.size() < 2 || word.size() > 18) return false;
   char buffer[18];
-  for (size_t i = 0; i < word.size(); ++i) buffer[i] = lower(word[i]);
+  for (size_t i = 0; i < word.size(); ++i) buffer[i] = asciiLower(word[i]);
   std::string_view key(buffer, word.size());
   return std::binary_search(std::begin(kReserved), std::end(kReserved), key);
 }

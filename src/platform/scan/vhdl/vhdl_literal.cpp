@@ -6,6 +6,8 @@
 #include <cstdlib>
 #include <string>
 
+#include "platform/scan/common/ascii.h"
+
 namespace scan::vhdl {
 namespace {
 
@@ -89,8 +91,8 @@ Value bitStringValue(std::string_view text) {
   size_t letters = quote;
   while (letters > 0 && !(text[letters - 1] >= '0' && text[letters - 1] <= '9')) --letters;
   std::string_view spec = text.substr(letters, quote - letters);
-  char base = static_cast<char>(spec.back() | 0x20);
-  bool isSigned = spec.size() == 2 && (spec[0] | 0x20) == 's';
+  char base = asciiLower(spec.back());
+  bool isSigned = spec.size() == 2 && asciiLower(spec[0]) == 's';
   std::string digits = withoutUnderscores(unquote(text.substr(quote + 1, text.size() - quote - 2)));
   std::string bits;
   if (base == 'd') {

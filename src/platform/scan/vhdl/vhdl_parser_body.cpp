@@ -1,15 +1,10 @@
 // Subprogram bodies, parsed only when a bound calls the function: declarations of
 // parameters, constants and variables, then sequential statements.
 #include "platform/scan/common/diagnostics.h"
+#include "platform/scan/common/reader_limits.h"
 #include "platform/scan/vhdl/vhdl_parser.h"
 
 namespace scan::vhdl {
-namespace {
-
-constexpr int kMaxStatementNesting = 100;
-
-}  // namespace
-
 bool Parser::parseFunction(FunctionBody& body) {
   m_WarnOnly = true;
   if (acceptWord("pure") || acceptWord("impure")) {}
@@ -71,12 +66,8 @@ bool Parser::parseStatements(FunctionBody& body, std::vector<int32_t>& list) {
 }
 
 bool Parser::parseStatement(FunctionBody& body, std::vector<int32_t>& list) {
-  if (m_Depth >= kMaxStatementNesting) return fail(peek().offset, "statements are too deeply nested");
-  struct DepthGuard {
-    int& depth;
-    explicit DepthGuard(int& d) : depth(d) { ++depth; }
-    ~DepthGuard() { --depth; }
-  } guard(m_Depth);
+  DepthGuard guard(m_Depth, limits::kVhdlStatementNesting);
+  if (guard.tooDeep()) return fail(peek().offset, "statements are too deeply nested");
   Stmt s;
   s.offset = peek().offset;
   if (isName(peek()) && peek(1).is(':')) {

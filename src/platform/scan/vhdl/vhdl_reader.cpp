@@ -3,10 +3,10 @@
 #include "platform/scan/vhdl/vhdl_reader.h"
 
 #include <algorithm>
-#include <optional>
 #include <unordered_map>
 
 #include "platform/scan/common/diagnostics.h"
+#include "platform/scan/common/source_buffer.h"
 #include "platform/scan/vhdl/vhdl_header_text.h"
 #include "platform/scan/vhdl/vhdl_parser.h"
 
@@ -20,27 +20,10 @@ std::unique_ptr<LanguageReader> makeVhdlReader(Diagnostics& diagnostics,
 namespace vhdl {
 namespace {
 
-// Line numbers of increasing offsets without a line table for the whole file.
-class LineCounter {
- public:
-  explicit LineCounter(std::string_view text) : m_Text(text) {}
-  int lineOf(size_t offset) {
-    offset = std::min(offset, m_Text.size());
-    if (offset < m_Offset) {
-      m_Offset = 0;
-      m_Line = 1;
-    }
-    m_Line += std::count(m_Text.begin() + static_cast<std::ptrdiff_t>(m_Offset),
-                         m_Text.begin() + static_cast<std::ptrdiff_t>(offset), '\n');
-    m_Offset = offset;
-    return static_cast<int>(std::min<size_t>(m_Line, INT32_MAX));
-  }
-
- private:
-  std::string_view m_Text;
-  size_t m_Offset = 0;
-  size_t m_Line = 1;
-};
+// A line number as the unit description holds it.
+int lineNumber(LineCounter& lines, const SourceBuffer& source, size_t offset) {
+  return static_cast<int>(std::min<size_t>(lines.lineOf(source, offset), INT32_MAX));
+}
 
 // An expression as one line of a message.
 std::string oneLine(std::string_view text) {
@@ -89,21 +72,16 @@ bool VhdlReader::selectUnit(std::string_view library, std::string_view unit) {
 
 std::vector<ScanUnitInfo> VhdlReader::listUnits() const {
   std::vector<ScanUnitInfo> out;
-  const SourceBuffer* current = nullptr;
-  std::optional<LineCounter> lines;
+  LineCounter lines;
   for (const UnitRecord& record : m_Index.unitsMet()) {
     const SourceBuffer& source = m_Index.source(record);
-    if (&source != current) {
-      current = &source;
-      lines.emplace(source.text());
-    }
     std::string_view name = unitNameAt(source.text(), record.offset);
     ScanUnitInfo info;
     info.library = record.library;
     info.kind = kindName(record.kind);
     info.name = name.empty() ? record.name : std::string(name);
     info.file = source.path();
-    info.line = lines->lineOf(record.offset);
+    info.line = lineNumber(lines, source, record.offset);
     out.push_back(std::move(info));
   }
   return out;
@@ -125,10 +103,10 @@ bool VhdlReader::readUnit(UnitDescription& unit) {
     m_Describer.applyOverrides(*scope, header.generics, m_Settings.genericOverrides);
     m_OverridesApplied = scope;
   }
-  LineCounter lines(scope->source->text());
+  LineCounter lines;
   unit.generics = m_Describer.generics(*scope, header.generics);
   for (size_t i = 0; i < unit.generics.size(); ++i)
-    unit.generics[i].sourceLine = lines.lineOf(header.generics[i].offset);
+    unit.generics[i].sourceLine = lineNumber(lines, *scope->source, header.generics[i].offset);
   unit.context = contextOf(*m_Selected);
   std::unordered_map<size_t, const InterfaceText*> texts;
   for (const InterfaceText& text : header.ports) texts.emplace(text.offset, &text);
@@ -136,7 +114,7 @@ bool VhdlReader::readUnit(UnitDescription& unit) {
     if (decl.kind != DeclKind::Port) continue;
     auto text = texts.find(decl.offset);
     unit.ports.push_back(readPort(*scope, decl, text == texts.end() ? nullptr : text->second,
-                                  lines.lineOf(decl.offset)));
+                                  lineNumber(lines, *scope->source, decl.offset)));
   }
   return !scope->parseFailed;
 }
