@@ -7,8 +7,13 @@ set(PINFORGE_TEST_ENV
 
 function(pinforge_library name dir)
   file(GLOB sources CONFIGURE_DEPENDS ${CMAKE_SOURCE_DIR}/${dir}/*.cpp)
-  list(FILTER sources EXCLUDE REGEX "-win32\\.cpp$")
-  list(FILTER sources EXCLUDE REGEX "/src/main\\.cpp$")
+  # Each host-specific file has a twin for the other system; only this host's twin is built.
+  if(WIN32)
+    list(FILTER sources EXCLUDE REGEX "-posix\\.cpp$")
+  else()
+    list(FILTER sources EXCLUDE REGEX "-win32\\.cpp$")
+  endif()
+  list(FILTER sources EXCLUDE REGEX "/src/main(-win32)?\\.cpp$")
   if(sources)
     add_library(${name} STATIC ${sources})
     target_include_directories(${name} PUBLIC ${CMAKE_SOURCE_DIR}/src)
@@ -22,6 +27,10 @@ endfunction()
 
 function(pinforge_test name dir)
   file(GLOB sources CONFIGURE_DEPENDS ${CMAKE_SOURCE_DIR}/${dir}/*.cpp)
+  # A host may leave out tests that need what it lacks (cmake/Windows.cmake says which and why).
+  foreach(pattern IN LISTS PINFORGE_TEST_EXCLUDE)
+    list(FILTER sources EXCLUDE REGEX "${pattern}")
+  endforeach()
   if(NOT sources)
     return()
   endif()
