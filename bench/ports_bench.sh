@@ -2,6 +2,8 @@
 # Runs a 100,000-port entity through a template that lists every port three ways and prints
 # the run time and the output rate. A second run with a one-line template measures what
 # reading the design costs, so the rate of the template step itself can be told apart.
+# A last row runs 200,000 ports through name tests inside an iteration and one @MAPSIGNAL per
+# port, which must stay linear in the number of ports.
 # Times are CPU seconds (user + system) of pinforge, which a busy machine disturbs less than
 # wall-clock time. Usage: sh bench/ports_bench.sh <pinforge-binary> [ports]
 set -eu
@@ -18,7 +20,7 @@ printf '%%module%%\n' > "$out/ports_baseline.tmpl"
 mark() { times > "$out/times.$1"; }
 
 run() {
-  "$pinforge" -lib work "$out/ports_bench.vhd" -module ports_bench -prj bench \
+  "$pinforge" -lib work "${3:-$out/ports_bench.vhd}" -module ports_bench -prj bench \
     -template "$1" -o "$2" > "$out/ports_bench.log" || {
     cat "$out/ports_bench.log" >&2
     exit 1
@@ -53,3 +55,17 @@ awk -v b="$bytes" -v p="$ports" '
     else
       printf "ports_bench: template step below timer resolution\n"
   }' "$out"/times.0 "$out"/times.1 "$out"/times.2 "$out"/times.3 "$out"/times.4 "$out"/times.5 "$out"/times.6
+
+search_ports=200000
+awk -v n="$search_ports" -f "$here/ports_gen.awk" > "$out/ports_search.vhd"
+awk -v n="$search_ports" -f "$here/ports_bench_search.awk" > "$out/ports_search.tmpl"
+mark 7
+run "$out/ports_search.tmpl" "$out/ports_search.txt" "$out/ports_search.vhd"
+mark 8
+awk -v p="$search_ports" '
+  FNR == 2 {
+    split($1, u, /[ms]/); split($2, s, /[ms]/)
+    t[n++] = u[1] * 60 + u[2] + s[1] * 60 + s[2]
+  }
+  END { printf "ports_bench: %d ports, name tests in an iteration and a mapping per port: %.3f s CPU\n", p, t[1] - t[0] }
+' "$out/times.7" "$out/times.8"

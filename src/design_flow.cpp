@@ -7,6 +7,7 @@
 #include <new>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "engine/forge.h"
 #include "run_context.h"
@@ -36,7 +37,14 @@ std::string currentDate() {
 }  // namespace
 
 bool runDesignFlow(RunContext& context) {
+  const bool done = runStages(context);
+  context.closeTraceFile();
+  return done && !context.hasErrors();
+}
+
+bool runStages(RunContext& context) {
   context.m_Extractor.Parse(context.m_Language);
+  if (!reportUnreadableFiles(context)) return false;
   if (context.m_Extractor.findDesignUnit("work", context.m_ModuleName.c_str(),
                                          ScanExtractor::SearchAllLibraries) != 0) {
     std::string text = "Declaration (Module ";
@@ -45,16 +53,68 @@ bool runDesignFlow(RunContext& context) {
     context.reportMessage(text, RunContext::Severity::Error);
     return false;
   }
+  if (!checkUnitHeader(context)) return false;
   if (!prepareRun(context)) return false;
   if (!buildPortList(context)) return false;
   if (Host::FileName(context.m_TemplateFileName.view()).GetExtension().Compare(".tcl", 0) == 0)
-    return context.runTclGenerator();
+    return handOverOutput(context) && context.runTclGenerator();
   return runTemplateEngine(context);
+}
+
+bool reportUnreadableFiles(RunContext& context) {
+  const std::vector<std::string>& unreadable = context.m_Extractor.unreadableFiles();
+  for (const std::string& file : unreadable) {
+    std::string text = "Unable to read design file ";
+    text += file;
+    text += "; see the messages above.";
+    context.reportMessage(text, RunContext::Severity::Error);
+  }
+  return unreadable.empty();
+}
+
+bool checkUnitHeader(RunContext& context) {
+  context.m_Extractor.getPorts();
+  if (!context.m_Extractor.unitHasErrors()) return true;
+  std::string text = "Errors in the declaration of ";
+  text += context.m_ModuleName.view();
+  text += "; see the messages above.";
+  context.reportMessage(text, RunContext::Severity::Error);
+  return false;
+}
+
+bool handOverOutput(RunContext& context) {
+  std::string error;
+  if (!context.closeOutput(error)) {
+    reportOutputFailure(context, "write", error);
+    return false;
+  }
+  if (!context.m_Output.commit(error)) {
+    reportOutputFailure(context, "replace", error);
+    return false;
+  }
+  return true;
+}
+
+void reportOutputFailure(RunContext& context, std::string_view action, std::string_view why) {
+  std::string text = "Unable to ";
+  text += action;
+  text += " output file ";
+  text += context.m_OutputFileName.view();
+  text += ": ";
+  text += why;
+  context.reportMessage(text, RunContext::Severity::Error);
 }
 
 bool prepareRun(RunContext& context) {
   // A trace file that cannot be created only means the expansion runs without a trace.
-  if (context.m_Debug) context.m_DebugStream = std::fopen("forge.deb", "w");
+  if (std::string error; context.m_Debug && !context.openTraceFile(error)) {
+    std::string text = "WARNING: Unable to open trace file ";
+    text += kTraceFileName;
+    text += ": ";
+    text += error;
+    text += "; the run goes on without it.";
+    context.reportMessage(text, RunContext::Severity::Warning);
+  }
 
   const std::string title = titleOf(context.m_OutputFileName);
   context.m_Date = Host::StringBase(currentDate());

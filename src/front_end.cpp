@@ -3,7 +3,9 @@
 
 #include <cstdint>
 #include <cstdio>
+#include <string>
 #include <string_view>
+#include <utility>
 #include <vector>
 
 #include "design_flow.h"
@@ -33,6 +35,78 @@ void selectLanguage(RunContext& context, const UT_CMDARGS& parser) {
   }
 }
 
+/// A file the run names on its command line, with what it is to the run for messages.
+struct NamedFile {
+  const char* role;
+  const char* name;
+};
+
+std::vector<NamedFile> inputFiles(const UT_CMDARGS& parser) {
+  std::vector<NamedFile> inputs;
+  if (const char* name = firstArgument(parser, "-template")) inputs.push_back({"template", name});
+  for (uint16_t index = 0; const UT_CMDSWINFO* occurrence = parser.getsw("-lib", index); ++index)
+    for (uint16_t file = 1; const char* name = occurrence->getargtxt(file); ++file)
+      inputs.push_back({"design file", name});
+  return inputs;
+}
+
+/// The first pair of the run's files that are one and the same file with at least one of them
+/// written, as "the <role> <name> is the same file as the <role> <name>"; empty when there is
+/// none. Devices such as /dev/null may be named twice: writing one destroys nothing.
+std::string overlappingFiles(const UT_CMDARGS& parser) {
+  std::vector<std::pair<NamedFile, std::string>> seen;
+  for (const NamedFile& input : inputFiles(parser)) {
+    bool regular = false;
+    std::string identity = Host::File::identity(input.name, regular);
+    // Only existing inputs can be destroyed; a missing one is reported when it is read.
+    if (regular) seen.emplace_back(input, std::move(identity));
+  }
+  for (const NamedFile output : {NamedFile{"output file", firstArgument(parser, "-o")},
+                                 NamedFile{"error file", firstArgument(parser, "-err")}}) {
+    if (output.name == nullptr) continue;
+    bool regular = false;
+    std::string identity = Host::File::identity(output.name, regular);
+    if (identity.empty() || (!regular && !identity.starts_with("new "))) continue;
+    for (const auto& [earlier, earlierIdentity] : seen) {
+      if (earlierIdentity != identity) continue;
+      std::string text = "The ";
+      text += output.role;
+      text += ' ';
+      text += output.name;
+      text += " is the same file as the ";
+      text += earlier.role;
+      text += ' ';
+      text += earlier.name;
+      return text;
+    }
+    seen.emplace_back(output, std::move(identity));
+  }
+  return std::string();
+}
+
+/// Stops the run before anything is opened for writing when writing would destroy one of its
+/// own inputs or write two streams into one file. True when the files are distinct.
+bool checkDistinctFiles(const UT_CMDARGS& parser, std::FILE* messageStream) {
+  const std::string overlap = overlappingFiles(parser);
+  if (overlap.empty()) return true;
+  const std::string line = "FATAL ERROR: " + overlap + "; nothing was written.\n";
+  std::fwrite(line.data(), 1, line.size(), messageStream);
+  return false;
+}
+
+/// "FATAL ERROR: Unable to open <what> <name>: <why>" on the message stream.
+void writeOpenFailure(std::FILE* messageStream, std::string_view what, const char* name,
+                      std::string_view why) {
+  std::string line = "FATAL ERROR: Unable to open ";
+  line += what;
+  line += ' ';
+  line += name;
+  line += ": ";
+  line += why;
+  line += '\n';
+  std::fwrite(line.data(), 1, line.size(), messageStream);
+}
+
 /// Records the names and flags and opens the template and output files. A file that cannot be
 /// opened is told on the message stream; the run goes on so that every problem is shown, but
 /// the design flow will not run. Returns false in that case.
@@ -44,32 +118,68 @@ bool readRunOptions(RunContext& context, const UT_CMDARGS& parser, std::FILE* me
   context.m_Debug = parser.findsw("-a");
   if (const char* project = firstArgument(parser, "-prj"))
     context.m_ProjectName = std::string_view(project);
+  std::string why;
   if (const char* name = firstArgument(parser, "-template");
-      name && !context.openTemplateFile(name)) {
-    std::fprintf(messageStream, "FATAL ERROR: Unable to open template file %s...\n", name);
+      name && !context.openTemplateFile(name, why)) {
+    writeOpenFailure(messageStream, "template file", name, why);
     opened = false;
   }
-  if (const char* name = firstArgument(parser, "-o"); name && !context.openOutput(name)) {
-    std::fprintf(messageStream, "FATAL ERROR: Unable to open output file %s...\n", name);
+  if (const char* name = firstArgument(parser, "-o"); name && !context.openOutput(name, why)) {
+    writeOpenFailure(messageStream, "output file", name, why);
     opened = false;
   }
   return opened;
 }
 
-/// Closes the output, removes it on request when the run failed, and prints the completion line.
-void finishRun(RunContext& context, const UT_CMDARGS& parser, bool errors) {
-  const char* languageName = context.m_Verilog != 0 ? "verilog" : "vhdl";
-  if (context.m_OutputStream != nullptr) {
-    std::fclose(context.m_OutputStream);
-    context.m_OutputStream = nullptr;
+/// Settles the output once the run is over. A failed write is an error. The output is put in
+/// place when the design flow ran, so a failed run still shows how far it got, unless
+/// -deleteonerror asks a failed run to leave nothing: then it is dropped, and an output
+/// already put in place (the Tcl path's) is removed if it is still the file this run wrote.
+/// An early failure never touches a previous output. True when nothing went wrong here.
+bool settleOutput(RunContext& context, bool flowRan, bool failed, bool deleteOnError) {
+  std::string why;
+  bool settled = true;
+  if (!context.closeOutput(why)) {
+    reportOutputFailure(context, "write", why);
+    settled = false;
   }
-  if (errors) {
-    const char* output = firstArgument(parser, "-o");
-    if (parser.findsw("-deleteonerror") && output != nullptr) Host::File::remove_f(output);
-    std::printf("forge(%s) completed with errors.\n", languageName);
+  failed = failed || !settled;
+  if (flowRan && !(failed && deleteOnError)) {
+    if (!context.m_Output.commit(why)) {
+      reportOutputFailure(context, "replace", why);
+      settled = false;
+    }
   } else {
-    std::printf("forge(%s) completed successfully.\n", languageName);
+    context.m_Output.discard();
   }
+  if (failed && deleteOnError) context.m_Output.removeWritten();
+  return settled;
+}
+
+/// Closes the "-err" file, reporting a failed write to it; true when it was written in full.
+bool closeErrorFile(RunContext& context) {
+  if (context.m_ErrorStream == nullptr) return true;
+  context.m_ErrorStream = nullptr;
+  std::string why;
+  if (context.m_ErrorFile.close(why)) return true;
+  std::string text = "Unable to write error file ";
+  text += context.m_ErrorFileName.view();
+  text += ": ";
+  text += why;
+  context.reportMessage(text, RunContext::Severity::Error);
+  return false;
+}
+
+/// Settles the run's files and prints the completion line; true when the run failed.
+bool finishRun(RunContext& context, const UT_CMDARGS& parser, bool flowRan, bool failed) {
+  const char* languageName = context.m_Verilog != 0 ? "verilog" : "vhdl";
+  failed = !settleOutput(context, flowRan, failed, parser.findsw("-deleteonerror")) || failed;
+  failed = !closeErrorFile(context) || failed;
+  if (failed)
+    std::printf("forge(%s) completed with errors.\n", languageName);
+  else
+    std::printf("forge(%s) completed successfully.\n", languageName);
+  return failed;
 }
 
 }  // namespace
@@ -93,6 +203,7 @@ bool checkRequiredInputs(const RunContext& context) {
 }
 
 int runFrontEnd(int argc, char** argv) {
+  Host::Interrupt::install();
   std::FILE* messageStream = stderr;
   RunContext context;
   if (argc < 2) {
@@ -100,9 +211,9 @@ int runFrontEnd(int argc, char** argv) {
     return 0;
   }
   ArgumentVector arguments;
-  if (expandResponseFile(messageStream, argc, argv, arguments)) {
+  if (expandResponseFile(messageStream, argc, argv, arguments) != Expansion::Ready) {
     writeUsage(messageStream);
-    return 0;
+    return 1;
   }
   std::vector<char*> vector = arguments.pointers();
   const UT_CMDARGS parser(static_cast<int>(arguments.count()), vector.data(), kUsageText, nullptr,
@@ -112,26 +223,28 @@ int runFrontEnd(int argc, char** argv) {
   if (parser.gaveusage()) return 0;
 
   selectLanguage(context, parser);
+  if (!checkDistinctFiles(parser, messageStream)) return 1;
   if (const char* name = firstArgument(parser, "-err")) {
-    messageStream = context.openErrorFile(name);
+    std::string why;
+    messageStream = context.openErrorFile(name, why);
     if (messageStream == nullptr) {
-      std::printf("FATAL ERROR: Unable to open log file %s in write mode.\n", name);
+      const std::string line =
+          "FATAL ERROR: Unable to open log file " + std::string(name) + " in write mode: " + why +
+          "\n";
+      std::fwrite(line.data(), 1, line.size(), stdout);
       return 1;
     }
   }
   bool fatal = !readRunOptions(context, parser, messageStream);
   registerLibraries(context, parser);
+  bool flowRan = false;
   if (!checkRequiredInputs(context)) {
     if (context.m_Debug) context.dumpContext();
     writeUsage(messageStream);
     fatal = true;
   } else if (!fatal) {
     runDesignFlow(context);
+    flowRan = true;
   }
-
-  const bool errors = fatal || context.hasErrors();
-  finishRun(context, parser, errors);
-  if (messageStream == context.m_ErrorStream) context.m_ErrorStream = nullptr;
-  std::fclose(messageStream);
-  return errors ? 1 : 0;
+  return finishRun(context, parser, flowRan, fatal || context.hasErrors()) ? 1 : 0;
 }

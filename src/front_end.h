@@ -12,8 +12,8 @@ inline constexpr const char* kUsageText =
     "[-deleteonerror] [--nodelist] [--a] [--inc]";
 
 /// One whole run of the program over the process's arguments; returns the exit status (0 on
-/// success, 1 when errors occurred). Closes the message stream (standard error unless "-err"
-/// was given), so it is meant to be called once, from main.
+/// success, 1 when errors occurred). Installs the interrupt handlers and closes the "-err"
+/// file, so it is meant to be called once, from main.
 int runFrontEnd(int argc, char** argv);
 
 /// Registers the design files of every "-lib" occurrence, each under the library name of its

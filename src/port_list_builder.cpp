@@ -66,14 +66,41 @@ void applyIntegerRule(RunContext& context, const ScanPort& port) {
   context.reportMessage(text, RunContext::Severity::Warning);
 }
 
-void printDebugLine(const RunContext& context) {
-  std::printf("%s: %s %s", context.m_CurrentPortName.c_str(), "?",
-              context.m_CurrentPortType.c_str());
-  if (context.m_CurrentRangeKind != kRangeNone)
-    std::printf(" (%d %s %d)", context.m_CurrentLeft,
-                context.m_CurrentRangeKind == kRangeTo ? "TO" : "DOWNTO",
-                context.m_CurrentRight);
-  std::printf(";\n");
+/// The direction as the design's language writes it.
+std::string_view directionWord(int code, bool verilog) {
+  switch (code) {
+    case ScanPort::Input:
+      return verilog ? "input" : "in";
+    case ScanPort::Output:
+      return verilog ? "output" : "out";
+    case ScanPort::Inout:
+      return "inout";
+    case ScanPort::Buffer:
+      return "buffer";
+    case ScanPort::Linkage:
+      return "linkage";
+    case ScanPort::Ref:
+      return "ref";
+    case ScanPort::InterfacePort:
+      return "interface";
+    default:
+      return "?";
+  }
+}
+
+void printDebugLine(const RunContext& context, int direction) {
+  std::string line = context.m_CurrentPortName.str();
+  line += ": ";
+  line += directionWord(direction, context.m_Verilog != 0);
+  line += ' ';
+  line += context.m_CurrentPortType.view();
+  if (context.m_CurrentRangeKind != kRangeNone) {
+    line += " (" + std::to_string(context.m_CurrentLeft);
+    line += context.m_CurrentRangeKind == kRangeTo ? " TO " : " DOWNTO ";
+    line += std::to_string(context.m_CurrentRight) + ")";
+  }
+  line += ";\n";
+  std::fwrite(line.data(), 1, line.size(), stdout);
 }
 
 }  // namespace
@@ -95,7 +122,7 @@ bool buildPortList(RunContext& context) {
     context.m_DesignData->appendOwned(new PortRecord(context.m_CurrentPortName.view(),
                                                      context.m_CurrentLeft,
                                                      context.m_CurrentRight, letter));
-    if (context.m_Debug) printDebugLine(context);
+    if (context.m_Debug) printDebugLine(context, port->direction());
     resetScratch(context);
   }
   return !context.hasErrors();

@@ -1,63 +1,83 @@
 // Builds the run's argument vector from the command line or from a response file.
 #include "response_file.h"
 
-#include <filesystem>
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
 #include <memory>
-#include <string_view>
-#include <system_error>
 
 namespace {
-
-constexpr std::string_view kWordDelimiters = " \t\n";
 
 struct FileCloser {
   void operator()(std::FILE* file) const { std::fclose(file); }
 };
 
-/// Stores the words of `line` while free slots remain; words past the limit are dropped.
-void storeWords(std::string_view line, ArgumentVector& expanded) {
-  size_t position = 0;
-  while (true) {
-    const size_t start = line.find_first_not_of(kWordDelimiters, position);
-    if (start == std::string_view::npos) return;
-    size_t end = line.find_first_of(kWordDelimiters, start);
-    if (end == std::string_view::npos) end = line.size();
-    if (expanded.count() < ArgumentVector::kSlotLimit)
-      expanded.append(std::string(line.substr(start, end - start)));
-    position = end;
+/// Opens a response file for reading, or writes why it cannot be one. The open does not block
+/// (a FIFO without a writer would stall it), and the file is looked at before a byte is read,
+/// so a FIFO or a device such as /dev/zero is refused instead of read forever.
+std::unique_ptr<std::FILE, FileCloser> openResponseFile(std::FILE* messageStream,
+                                                        const char* name) {
+  const int descriptor = ::open(name, O_RDONLY | O_NONBLOCK | O_CLOEXEC);
+  struct stat status {};
+  if (descriptor >= 0 && ::fstat(descriptor, &status) == 0 && S_ISREG(status.st_mode)) {
+    // O_NONBLOCK means nothing for a regular file, so the stream reads it as usual.
+    std::unique_ptr<std::FILE, FileCloser> file(::fdopen(descriptor, "r"));
+    if (file) return file;
   }
-}
-
-/// Reads one line (without its "\n"; a "\r" just before it is dropped too). False at the end
-/// of the file when nothing was read.
-bool readLine(std::FILE* file, std::string& line) {
-  line.clear();
-  int c;
-  while ((c = std::getc(file)) != EOF) {
-    if (c == '\n') {
-      if (!line.empty() && line.back() == '\r') line.pop_back();
-      return true;
-    }
-    line.push_back(static_cast<char>(c));
-  }
-  return !line.empty();
-}
-
-bool readResponseFile(std::FILE* messageStream, const char* name, ArgumentVector& expanded) {
+  if (descriptor >= 0) ::close(descriptor);
   // Some systems open a directory for reading; it is no more a response file there than where
   // the open fails.
-  std::error_code error;
-  std::unique_ptr<std::FILE, FileCloser> file(
-      std::filesystem::is_directory(name, error) ? nullptr : std::fopen(name, "r"));
-  if (!file) {
+  if (descriptor < 0 || S_ISDIR(status.st_mode) || S_ISREG(status.st_mode))
     std::fprintf(messageStream, "FATAL ERROR: Unable to open response file %s...\n", name);
-    return false;
-  }
-  // The file is read to its end even once the vector is full, so the limit is still noticed.
-  std::string line;
-  while (readLine(file.get(), line)) storeWords(line, expanded);
-  return true;
+  else
+    std::fprintf(messageStream, "FATAL ERROR: Response file %s is not a regular file.\n", name);
+  return nullptr;
 }
+
+/// Splits a stream into words at blanks, tabs and line ends; a "\r" just before a "\n" belongs
+/// to the line end. Words past the argument limit are counted but not kept.
+class WordSplitter {
+ public:
+  explicit WordSplitter(ArgumentVector& expanded) : m_Expanded(expanded) {}
+
+  /// False when a word grew longer than the limit; `line` then holds its line number.
+  bool read(std::FILE* file, size_t& line) {
+    line = 1;
+    bool carriageReturn = false;
+    for (int c; (c = std::getc(file)) != EOF;) {
+      if (c == '\n') {
+        carriageReturn = false;
+        endWord();
+        ++line;
+        continue;
+      }
+      if (carriageReturn) m_Word.push_back('\r');
+      carriageReturn = c == '\r';
+      if (c == ' ' || c == '\t')
+        endWord();
+      else if (!carriageReturn)
+        m_Word.push_back(static_cast<char>(c));
+      if (m_Word.size() > ArgumentVector::kMaxWordBytes) return false;
+    }
+    if (carriageReturn) m_Word.push_back('\r');
+    endWord();
+    return true;
+  }
+  size_t total() const { return m_Total; }
+
+ private:
+  void endWord() {
+    if (m_Word.empty()) return;
+    ++m_Total;
+    if (m_Expanded.count() <= ArgumentVector::kMaxArguments) m_Expanded.append(std::move(m_Word));
+    m_Word.clear();
+  }
+
+  ArgumentVector& m_Expanded;
+  std::string m_Word;
+  size_t m_Total = 0;
+};
 
 }  // namespace
 
@@ -69,20 +89,34 @@ std::vector<char*> ArgumentVector::pointers() {
   return result;
 }
 
-bool expandResponseFile(std::FILE* messageStream, int argc, char** argv, ArgumentVector& expanded) {
+Expansion expandResponseFile(std::FILE* messageStream, int argc, char** argv,
+                             ArgumentVector& expanded) {
   expanded.append("pinforge");
+  size_t given = 0;
   if (argc > 1 && argv[1][0] == '@') {
-    if (!readResponseFile(messageStream, argv[1] + 1, expanded)) return true;
+    const char* name = argv[1] + 1;
+    std::unique_ptr<std::FILE, FileCloser> file = openResponseFile(messageStream, name);
+    if (!file) return Expansion::Refused;
+    WordSplitter splitter(expanded);
+    size_t line = 0;
+    if (!splitter.read(file.get(), line)) {
+      std::fprintf(messageStream,
+                   "FATAL ERROR: Response file %s, line %zu: a word is longer than %zu MB.\n",
+                   name, line, ArgumentVector::kMaxWordBytes >> 20);
+      return Expansion::Refused;
+    }
+    given = splitter.total();
   } else {
-    for (int index = 1; index < argc && expanded.count() < ArgumentVector::kSlotLimit; ++index)
+    given = argc > 1 ? static_cast<size_t>(argc) - 1 : 0;
+    for (size_t index = 1; index <= given && index <= ArgumentVector::kMaxArguments; ++index)
       expanded.append(argv[index]);
   }
-  if (expanded.count() == ArgumentVector::kSlotLimit) {
+  if (given > ArgumentVector::kMaxArguments) {
     std::fprintf(messageStream,
                  "FATAL ERROR: The number of command line arguments exceeds the max allowed "
-                 "(%d).\n",
-                 static_cast<int>(ArgumentVector::kSlotLimit));
-    return true;
+                 "(%zu).\n",
+                 ArgumentVector::kMaxArguments);
+    return Expansion::Refused;
   }
-  return false;
+  return Expansion::Ready;
 }

@@ -2,6 +2,8 @@
 // reporting messages in the program's one format and the diagnostic dump.
 #include "run_context.h"
 
+#include <cerrno>
+#include <cstring>
 #include <filesystem>
 #include <string>
 #include <system_error>
@@ -33,38 +35,68 @@ std::string_view openState(const std::FILE* stream) {
 RunContext::RunContext() = default;
 
 RunContext::~RunContext() {
-  closeIfOpen(m_DebugStream);
   closeIfOpen(m_InputStream);
   closeIfOpen(m_TemplateStream);
-  closeIfOpen(m_OutputStream);
-  closeIfOpen(m_ErrorStream);
 }
 
-std::FILE* RunContext::openErrorFile(const char* name) {
+std::FILE* RunContext::openErrorFile(const char* name, std::string& error) {
   m_ErrorFileName = std::string_view(name);
-  closeIfOpen(m_ErrorStream);
-  m_ErrorStream = std::fopen(name, "w");
+  m_ErrorStream = nullptr;
+  if (m_ErrorFile.open(name, Host::OutputFile::Placement::InPlace, error))
+    m_ErrorStream = m_ErrorFile.stream();
   return m_ErrorStream;
 }
 
-bool RunContext::openTemplateFile(const char* name) {
+bool RunContext::openTemplateFile(const char* name, std::string& error) {
   m_TemplateFileName = std::string_view(name);
   closeIfOpen(m_TemplateStream);
   // Some systems open a directory for reading; it can never be read as a template.
-  std::error_code error;
-  if (!std::filesystem::is_directory(name, error)) m_TemplateStream = std::fopen(name, "r");
+  std::error_code status;
+  if (std::filesystem::is_directory(name, status)) {
+    error = std::strerror(EISDIR);
+    return false;
+  }
+  // "e": the Tcl shell the run may start must not inherit the template.
+  m_TemplateStream = std::fopen(name, "re");
+  if (m_TemplateStream == nullptr) error = std::strerror(errno);
   return m_TemplateStream != nullptr;
 }
 
-bool RunContext::openOutput(const char* name) {
+bool RunContext::openOutput(const char* name, std::string& error) {
   m_OutputFileName = std::string_view(name);
   // The extension starts after the first dot anywhere in the name, directory part included.
   const std::string_view whole(name);
   const size_t dot = whole.find('.');
   m_OutputExt = dot == std::string_view::npos ? std::string_view() : whole.substr(dot + 1);
-  closeIfOpen(m_OutputStream);
-  m_OutputStream = std::fopen(name, "w");
+  m_OutputStream = nullptr;
+  if (m_Output.open(name, Host::OutputFile::Placement::Replace, error))
+    m_OutputStream = m_Output.stream();
   return m_OutputStream != nullptr;
+}
+
+bool RunContext::openTraceFile(std::string& error) {
+  m_DebugStream = nullptr;
+  if (m_TraceFile.open(kTraceFileName, Host::OutputFile::Placement::InPlaceNoFollow, error))
+    m_DebugStream = m_TraceFile.stream();
+  return m_DebugStream != nullptr;
+}
+
+bool RunContext::closeOutput(std::string& error) {
+  m_OutputStream = nullptr;
+  return m_Output.close(error);
+}
+
+void RunContext::closeTraceFile() {
+  if (m_DebugStream == nullptr) return;
+  m_DebugStream = nullptr;
+  std::string error;
+  if (!m_TraceFile.close(error)) {
+    std::string text = "Unable to write trace file ";
+    text += kTraceFileName;
+    text += ": ";
+    text += error;
+    reportMessage(text, Severity::Error);
+  }
 }
 
 bool RunContext::registerDesignFile(const char* name) {

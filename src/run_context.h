@@ -7,6 +7,7 @@
 #include <cstdint>
 #include <cstdio>
 #include <memory>
+#include <string>
 #include <string_view>
 
 #include "data/typed_lists.h"
@@ -15,24 +16,35 @@
 
 /// Marks a name that was not given on the command line.
 inline constexpr const char* kUndefinedName = "__UNDEFINED__";
+/// The trace file debug mode writes in the current folder.
+inline constexpr const char* kTraceFileName = "forge.deb";
 
 class RunContext {
  public:
   enum class Severity { Error, Warning };
 
   RunContext();
-  /// Closes every stream the context still holds. Code that closes one of them earlier (the
-  /// entry point closes the output and error streams) resets the field to null.
+  /// Closes the template and input streams. The output, error and trace files close with
+  /// their OutputFile members: an output that was never committed leaves no trace.
   ~RunContext();
   RunContext(const RunContext&) = delete;
   RunContext& operator=(const RunContext&) = delete;
 
-  /// Opens the "-err" file for writing; the stream, or null when it cannot be opened.
-  std::FILE* openErrorFile(const char* name);
-  /// Opens the template for reading; true when it opened.
-  bool openTemplateFile(const char* name);
-  /// Opens the output for writing and derives its extension; true when it opened.
-  bool openOutput(const char* name);
+  /// Opens the "-err" file for writing (in place, like fopen "w"); the stream, or null with
+  /// the reason in `error`.
+  std::FILE* openErrorFile(const char* name, std::string& error);
+  /// Opens the template for reading; true when it opened, else false with the reason.
+  bool openTemplateFile(const char* name, std::string& error);
+  /// Opens the output for writing and derives its extension; true when it opened, else false
+  /// with the reason. A regular output is written beside the target and only replaces it when
+  /// the run commits it (see Host::OutputFile).
+  bool openOutput(const char* name, std::string& error);
+  /// Opens the trace file "forge.deb" in the current folder without following a symlink.
+  bool openTraceFile(std::string& error);
+  /// Closes the output stream, false with the reason when any write to it failed.
+  bool closeOutput(std::string& error);
+  /// Closes the trace file and reports a failed write to it as an error.
+  void closeTraceFile();
   /// Registers a design file under the current library; true when the file exists.
   bool registerDesignFile(const char* name);
   /// Prints "pinforge:<text>" on standard output, appends it to the error text and counts it.
@@ -50,6 +62,10 @@ class RunContext {
   std::unique_ptr<StbDataList> m_DesignData;
   bool m_Debug = false;
   bool m_NoList = false;
+  Host::OutputFile m_Output;
+  Host::OutputFile m_ErrorFile;
+  Host::OutputFile m_TraceFile;
+  /// The streams of the three files above while they are open; null otherwise.
   std::FILE* m_ErrorStream = nullptr;
   std::FILE* m_OutputStream = nullptr;
   std::FILE* m_TemplateStream = nullptr;

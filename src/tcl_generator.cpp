@@ -1,96 +1,118 @@
-// The Tcl path: writes a temporary driver script that defines the run's names and the port
-// lists as Tcl variables, appends the Tcl template's text, and runs the script shell `runscr`
-// on it.
+// The Tcl path: writes a temporary driver script that defines the run's names and the design
+// data (ports, generics, declared types, context) as Tcl variables, appends the Tcl template's
+// text, and runs the script shell `runscr` on it, found beside this program or else on PATH.
+#include <cerrno>
 #include <cstdint>
 #include <cstdio>
-#include <cstdlib>
+#include <cstring>
 #include <filesystem>
-#include <memory>
 #include <string>
 #include <string_view>
+#include <system_error>
 
 #include "run_context.h"
+#include "tcl_driver_script.h"
 
 namespace {
 
 constexpr const char* kScriptShell = "runscr";
 
-/// Collects what the script shell prints, so a failure can show the Tcl error to the user.
-class DerivedOutput : public Host::ChildOutput {
+/// Keeps the end of what the script shell prints, so a failure can show the Tcl error without
+/// holding the whole output of a script that prints without end.
+class OutputTail : public Host::ChildOutput {
  public:
-  DerivedOutput(std::string* collected, const int32_t* stopFlag)
-      : m_Collected(collected), m_StopFlag(stopFlag) {}
+  static constexpr size_t kKeptBytes = 64 * 1024;
 
-  bool OnOutput(const char* text) override {
-    if (!m_Stopped && text != nullptr) {
-      if (*m_StopFlag == 0)
-        m_Collected->append(text);
-      else
-        m_Stopped = true;
-    }
+  explicit OutputTail(std::string& tail) : m_Tail(tail) {}
+
+  bool OnOutput(std::string_view text) override {
+    m_Tail.append(text.substr(text.size() > kKeptBytes ? text.size() - kKeptBytes : 0));
+    m_Seen += text.size();
+    if (m_Tail.size() > kKeptBytes) m_Tail.erase(0, m_Tail.size() - kKeptBytes);
     return true;
   }
-  void OnEnd() override {}
+  /// How many bytes of the output are no longer kept.
+  size_t dropped() const { return m_Seen - m_Tail.size(); }
 
  private:
-  std::string* m_Collected;
-  const int32_t* m_StopFlag;
-  bool m_Stopped = false;
+  std::string& m_Tail;
+  size_t m_Seen = 0;
 };
 
 /// Backslash before every character Tcl would interpret inside a double-quoted word, so any
-/// name or path arrives verbatim and none can run a command.
+/// name or path arrives verbatim and none can run a command. A carriage return and ^Z are
+/// written as escapes: Tcl reads a script file with CR/LF translation and ends it at a ^Z.
 std::string tclEscaped(std::string_view text) {
   std::string result;
   result.reserve(text.size());
   for (char c : text) {
+    if (c == '\r') {
+      result += "\\r";
+      continue;
+    }
+    if (c == '\x1a') {
+      result += "\\032";
+      continue;
+    }
     if (c == '\\' || c == '"' || c == '$' || c == '[' || c == ']') result += '\\';
     result += c;
   }
   return result;
 }
 
-void appendSetLine(std::string& script, std::string_view variable, const Host::StringBase& value) {
+void appendSetLine(std::string& script, std::string_view variable, std::string_view value) {
   script += "set ";
   script += variable;
   script += " \"";
-  script += tclEscaped(value.view());
+  script += tclEscaped(value);
   script += "\"\n";
 }
 
-std::string scriptHead(const RunContext& context) {
-  std::string script =
-      "# This file drives input variables to the tcl template file\n"
-      "#   given below in the \"source\" command.\n";
-  appendSetLine(script, "ModuleName", context.m_ModuleName);
-  appendSetLine(script, "ProjectName", context.m_ProjectName);
-  appendSetLine(script, "ProjectFile", context.m_ProjectFileName);
-  appendSetLine(script, "ProjectName", context.m_ProjectName);
-  appendSetLine(script, "OutputFileName", context.m_OutputFileName);
-  appendSetLine(script, "InputFileName", context.m_InputFileName);
-  appendSetLine(script, "TemplateFileName", context.m_TemplateFileName);
-  appendSetLine(script, "ErrorFileName", context.m_ErrorFileName);
-  appendSetLine(script, "LibLocation", context.m_LibLocation);
-  script += "\n# Port Definitions\n";
+/// " \"text\"": one list item, escaped.
+std::string quotedItem(std::string_view text) { return " \"" + tclEscaped(text) + '"'; }
 
-  std::string names = "set PortName [ list ";
-  std::string lefts = "set LeftRange [ list ";
-  std::string rights = "set RightRange [ list ";
-  std::string dirs = "set PortDir [ list ";
-  int32_t count = 0;
-  StbDataList& ports = *context.m_DesignData;
-  for (PortRecord* port = ports.first(); ports.hasCurrent(); port = ports.next()) {
-    names += " \"" + tclEscaped(port->m_Name) + '"';
-    lefts += ' ' + std::to_string(port->m_Left);
-    rights += ' ' + std::to_string(port->m_Right);
-    dirs += " \"";
-    dirs += port->m_Dir;
-    dirs += '"';
-    ++count;
+/// One bound as a list item: empty when the range could not be evaluated, so a template that
+/// computes with it fails instead of using a wrong width.
+std::string boundItem(const PortRecord& port, int32_t bound) {
+  return port.isRangeUnknown() ? std::string(" \"\"") : ' ' + std::to_string(bound);
+}
+
+std::string listLine(std::string_view variable, const std::string& items) {
+  std::string line = "set ";
+  line += variable;
+  line += " [ list " + items + " ]\n";
+  return line;
+}
+
+/// The generics, the declared port types, the context and the language, behind everything
+/// the script held before them.
+std::string designDetails(StbDataList& design) {
+  std::string names;
+  std::string types;
+  std::string defaults;
+  std::string values;
+  for (const GenericRecord& generic : design.m_Generics) {
+    names += quotedItem(generic.m_Name);
+    types += quotedItem(generic.m_Type);
+    defaults += quotedItem(generic.m_Default);
+    values += quotedItem(generic.m_Value);
   }
-  for (const std::string* list : {&names, &lefts, &rights, &dirs}) script += *list + " ]\n";
-  script += "set TotalPorts " + std::to_string(count) + '\n';
-  return script;
+  std::string portTypes;
+  for (PortRecord* port = design.first(); design.hasCurrent(); port = design.next())
+    portTypes += quotedItem(port->m_DeclaredType);
+
+  std::string text = "\n# Generic Definitions\n";
+  text += listLine("GenericName", names);
+  text += listLine("GenericType", types);
+  text += listLine("GenericDefault", defaults);
+  text += listLine("GenericValue", values);
+  text += "set TotalGenerics " + std::to_string(design.m_Generics.size()) + '\n';
+  text += "\n# Declared Types and Context\n";
+  text += listLine("PortType", portTypes);
+  appendSetLine(text, "Context", design.m_Context);
+  appendSetLine(text, "Language",
+                design.m_Language == DesignLanguage::Verilog ? "verilog" : "vhdl");
+  return text;
 }
 
 bool writeAll(std::FILE* stream, std::string_view text) {
@@ -106,101 +128,121 @@ bool copyStream(std::FILE* from, std::FILE* to) {
   return std::ferror(from) == 0;
 }
 
-bool isExecutableFile(const std::filesystem::path& path) {
+/// The script's path in a form no program can read as an option: a relative $TMPDIR such as
+/// "-x" would otherwise make "-x/pinforge-....tcl".
+std::string unambiguousPath(const std::string& name) {
+  if (name.starts_with('/')) return name;
   std::error_code error;
-  const std::filesystem::file_status status = std::filesystem::status(path, error);
-  using std::filesystem::perms;
-  return !error && std::filesystem::is_regular_file(status) &&
-         (status.permissions() & (perms::owner_exec | perms::group_exec | perms::others_exec)) !=
-             perms::none;
+  const std::filesystem::path absolute = std::filesystem::absolute(name, error);
+  if (!error && absolute.string().starts_with('/')) return absolute.string();
+  return "./" + name;
 }
 
-bool onSearchPath(std::string_view program) {
-  const char* path = std::getenv("PATH");
-  if (path == nullptr) return false;
-  std::string_view rest = path;
-  while (true) {
-    const size_t colon = rest.find(':');
-    const std::string_view dir = rest.substr(0, colon);
-    if (isExecutableFile(std::filesystem::path(dir.empty() ? "." : dir) / program)) return true;
-    if (colon == std::string_view::npos) return false;
-    rest.remove_prefix(colon + 1);
-  }
-}
-
-/// A word of the command line, quoted when a blank or tab would split it.
-std::string commandWord(std::string_view word) {
-  if (word.find_first_of(" \t") == std::string_view::npos) return std::string(word);
-  return '"' + std::string(word) + '"';
-}
-
-/// The script shell as the command line names it: from PATH when it is there, else the one
-/// installed next to this program, so a fresh build runs Tcl templates without setup.
-std::string scriptShellCommand() {
-  if (onSearchPath(kScriptShell)) return kScriptShell;
-  const std::string exeDir = Host::File::executableDirectory();
-  if (exeDir.empty()) return kScriptShell;
-  const std::string besideUs = exeDir + '/' + kScriptShell;
-  return isExecutableFile(besideUs) ? commandWord(besideUs) : kScriptShell;
-}
-
-void reportCannotCreateScript(const std::string& scriptName) {
-  std::printf("Template file = %s\n", scriptName.c_str());
-  std::fflush(stdout);
-  std::unique_ptr<Host_MsgManData> messages =
-      Host_MsgManData::createObject("ProjectMgmt", "../src/stbparse", 330, "$Revision: 1.5 $");
-  messages->issueError(
-      "ERROR: ProjectMgmt(pinforge) - Unable to open temporary tcl template file\n");
+/// Removes the script and stops watching it.
+void discardScript(const std::string& name) {
+  Host::File::remove(name.c_str());
+  Host::Interrupt::forget(name);
 }
 
 }  // namespace
 
+std::string tclDriverScriptHead(const RunContext& context) {
+  std::string script =
+      "# This file drives input variables to the tcl template file\n"
+      "#   given below in the \"source\" command.\n";
+  appendSetLine(script, "ModuleName", context.m_ModuleName.view());
+  appendSetLine(script, "ProjectName", context.m_ProjectName.view());
+  appendSetLine(script, "ProjectFile", context.m_ProjectFileName.view());
+  appendSetLine(script, "ProjectName", context.m_ProjectName.view());
+  appendSetLine(script, "OutputFileName", context.m_OutputFileName.view());
+  appendSetLine(script, "InputFileName", context.m_InputFileName.view());
+  appendSetLine(script, "TemplateFileName", context.m_TemplateFileName.view());
+  appendSetLine(script, "ErrorFileName", context.m_ErrorFileName.view());
+  appendSetLine(script, "LibLocation", context.m_LibLocation.view());
+  script += "\n# Port Definitions\n";
+
+  std::string names;
+  std::string lefts;
+  std::string rights;
+  std::string dirs;
+  int32_t count = 0;
+  StbDataList& ports = *context.m_DesignData;
+  for (PortRecord* port = ports.first(); ports.hasCurrent(); port = ports.next()) {
+    names += quotedItem(port->m_Name);
+    lefts += boundItem(*port, port->m_Left);
+    rights += boundItem(*port, port->m_Right);
+    dirs += " \"";
+    dirs += port->m_Dir;
+    dirs += '"';
+    ++count;
+  }
+  script += listLine("PortName", names);
+  script += listLine("LeftRange", lefts);
+  script += listLine("RightRange", rights);
+  script += listLine("PortDir", dirs);
+  script += "set TotalPorts " + std::to_string(count) + '\n';
+  return script + designDetails(ports);
+}
+
 bool RunContext::runTclGenerator() {
+  // A signal from here on removes the script and stops the script shell.
+  Host::Interrupt::install();
   std::string scriptName;
   std::FILE* script = Host::File::createTemporary(".tcl", scriptName);
   if (script == nullptr) {
-    reportCannotCreateScript(scriptName);
-    return false;
-  }
-  if (!writeAll(script, scriptHead(*this))) {
-    std::fclose(script);
-    Host::File::remove(scriptName.c_str());
-    reportCannotCreateScript(scriptName);
-    return false;
-  }
-
-  std::FILE* tclTemplate = std::fopen(m_TemplateFileName.c_str(), "r");
-  if (tclTemplate == nullptr) {
-    std::fclose(script);
-    reportMessage("ERROR: ProjectMgmt(pinforge) - Unable to open/read tcl template file\n",
+    const int error = errno;
+    reportMessage("ERROR: ProjectMgmt(pinforge) - Unable to create the temporary tcl script in " +
+                      Host::File::temporaryDirectory() + ": " + std::strerror(error),
                   Severity::Error);
     return false;
   }
-  const bool copied = copyStream(tclTemplate, script);
-  std::fclose(tclTemplate);
+  scriptName = unambiguousPath(scriptName);
+  Host::Interrupt::removeOnSignal(scriptName);
+  if (!writeAll(script, tclDriverScriptHead(*this))) {
+    const int error = errno;
+    std::fclose(script);
+    discardScript(scriptName);
+    reportMessage("ERROR: ProjectMgmt(pinforge) - Unable to write the temporary tcl script " +
+                      scriptName + ": " + std::strerror(error),
+                  Severity::Error);
+    return false;
+  }
+
+  std::FILE* tclTemplate = std::fopen(m_TemplateFileName.c_str(), "re");
+  const bool copied = tclTemplate != nullptr && copyStream(tclTemplate, script);
+  if (tclTemplate != nullptr) std::fclose(tclTemplate);
   if (std::fclose(script) != 0 || !copied) {
+    discardScript(scriptName);
     reportMessage("ERROR: ProjectMgmt(pinforge) - Unable to open/read tcl template file\n",
                   Severity::Error);
     return false;
   }
 
-  const std::string commandLine = scriptShellCommand() + ' ' + commandWord(scriptName);
-  Host_MsgManData::debugStub(("Command line is: " + commandLine + '\n').c_str());
-
-  std::string collected;
-  int32_t stopFlag = 0;
-  Host::Process process;
-  const int status = process.RunNoWindow(
-      commandLine.c_str(), std::make_unique<DerivedOutput>(&collected, &stopFlag), 0, true, true,
-      false);
+  const std::string shell = Host::Process::findProgram(kScriptShell);
+  Host_MsgManData::debugStub(("Command line is: " + shell + ' ' + scriptName + '\n').c_str());
+  std::string tail;
+  OutputTail receiver(tail);
+  const int status = shell.empty() ? -1 : Host::Process::run({shell, scriptName}, &receiver);
   if (status != 0) {
-    std::fwrite(collected.data(), 1, collected.size(), stderr);
+    // The script stays for inspection.
+    Host::Interrupt::forget(scriptName);
+    if (shell.empty())
+      reportMessage("ERROR: ProjectMgmt(pinforge) - The script shell runscr is neither beside "
+                    "pinforge nor in a folder on PATH",
+                    Severity::Error);
+    if (receiver.dropped() != 0)
+      std::fprintf(stderr, "[... %zu earlier bytes of the script's output not shown ...]\n",
+                   receiver.dropped());
+    std::fwrite(tail.data(), 1, tail.size(), stderr);
     reportMessage("ERROR: ProjectMgmt(pinforge)  Unable to invoke tcl file generator\n",
                   Severity::Error);
     return false;
   }
 
-  if (!m_Debug) Host::File::remove(scriptName.c_str());
+  if (m_Debug)
+    Host::Interrupt::forget(scriptName);
+  else
+    discardScript(scriptName);
   m_DesignData.reset();
   return !hasErrors();
 }

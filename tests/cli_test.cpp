@@ -23,11 +23,13 @@ const std::string kUsage =
     "<errfile>] [-deleteonerror] [--nodelist] [--a] [--inc]\n";
 const std::string kNotFound = "pinforge:Declaration (Module top) not found.\n";
 const std::string kFailed = "forge(vhdl) completed with errors.\n";
-const std::string kMissingTemplate = "FATAL ERROR: Unable to open template file missing.tpl...\n";
-const std::string kMissingOutput = "FATAL ERROR: Unable to open output file no/dir/out.txt...\n";
+const std::string kMissingTemplate =
+    "FATAL ERROR: Unable to open template file missing.tpl: No such file or directory\n";
+const std::string kMissingOutput =
+    "FATAL ERROR: Unable to open output file no/dir/out.txt: No such file or directory\n";
 const std::string kMissingRsp = "FATAL ERROR: Unable to open response file missing.rsp...\n";
 const std::string kTooMany =
-    "FATAL ERROR: The number of command line arguments exceeds the max allowed (999).\n";
+    "FATAL ERROR: The number of command line arguments exceeds the max allowed (997).\n";
 const std::string kMissing = "<missing>";
 const std::string kOther = "entity other is\nend entity other;\n";
 
@@ -70,15 +72,26 @@ struct Row {
   int status;
   std::vector<std::pair<std::string, std::string>> files = {};  ///< name -> content or kMissing
   std::optional<std::string> rsp = {};                          ///< written to run.rsp
+  std::vector<std::pair<std::string, std::string>> before = {};  ///< written before the run
 };
+
+/// A run of the unit "top", which the design holds, writing to `output`.
+Args topRun(const std::string& output) {
+  return {"-lib", "work", "top.vhd", "-module", "top", "-prj", "demo", "-template", "tpl.txt",
+          "-o", output};
+}
+
+std::string sameFile(const std::string& what) {
+  return "FATAL ERROR: The " + what + "; nothing was written.\n";
+}
 
 std::vector<Row> rows() {
   const std::string notFound = kNotFound + kFailed;
   std::vector<Row> rows = {
       {"no arguments", {}, "", kUsage, 0},
-      {"unreadable response file", {"@missing.rsp", "-lib", "work"}, "", kMissingRsp + kUsage, 0},
+      {"unreadable response file", {"@missing.rsp", "-lib", "work"}, "", kMissingRsp + kUsage, 1},
       {"error file opens after the response file",
-       {"@missing.rsp", "-err", "run.log"}, "", kMissingRsp + kUsage, 0, {{"run.log", kMissing}}},
+       {"@missing.rsp", "-err", "run.log"}, "", kMissingRsp + kUsage, 1, {{"run.log", kMissing}}},
       {"unknown switch", {"-bogus"}, "", "pinforge: unknown switch -bogus\n" + kUsage, 1},
       {"stray argument", plus(kComplete, {"stray"}), "",
        "pinforge: argument stray does not belong to any switch\n" + kUsage, 1,
@@ -89,16 +102,67 @@ std::vector<Row> rows() {
       {"help after a complete line", plus(kComplete, {"-help"}), kUsage, "", 0,
        {{"out.txt", kMissing}}},
       {"unwritable error file", plus(kComplete, {"-err", "no/such/dir/run.log"}),
-       "FATAL ERROR: Unable to open log file no/such/dir/run.log in write mode.\n", "", 1,
+       "FATAL ERROR: Unable to open log file no/such/dir/run.log in write mode: No such file or "
+       "directory\n",
+       "", 1,
        {{"out.txt", kMissing}}},
       // The first occurrence of a switch wins, so these come before the complete line.
       {"missing template", plus({"-template", "missing.tpl"}, kComplete), kFailed,
-       kMissingTemplate + kUsage, 1, {{"out.txt", ""}}},
+       kMissingTemplate + kUsage, 1, {{"out.txt", kMissing}}},
+      {"missing template keeps the previous output", plus({"-template", "missing.tpl"}, kComplete),
+       kFailed, kMissingTemplate + kUsage, 1, {{"out.txt", "previous"}}, {},
+       {{"out.txt", "previous"}}},
+      {"missing template, delete on error, keeps the previous output",
+       plus({"-template", "missing.tpl", "-deleteonerror"}, kComplete), kFailed,
+       kMissingTemplate + kUsage, 1, {{"out.txt", "previous"}}, {}, {{"out.txt", "previous"}}},
+      {"missing -prj keeps the previous output", without(kComplete, "-prj", 1), kFailed, kUsage,
+       1, {{"out.txt", "previous"}}, {}, {{"out.txt", "previous"}}},
+      {"a failed flow leaves its partial output", kComplete, notFound, "", 1, {{"out.txt", ""}},
+       {}, {{"out.txt", "previous"}}},
+      {"a failed flow with delete on error leaves the previous output",
+       plus(kComplete, {"-deleteonerror"}), notFound, "", 1, {{"out.txt", "previous"}}, {},
+       {{"out.txt", "previous"}}},
+      {"successful run replaces the previous output", topRun("out.txt"),
+       "forge(vhdl) completed successfully.\n", "", 0, {{"out.txt", "top\n"}}, {},
+       {{"out.txt", "previous"}}},
+      {"device output", plus(topRun("/dev/null"), {"-deleteonerror"}),
+       "forge(vhdl) completed successfully.\n", "", 0},
+      {"full output device", topRun("/dev/full"),
+       "pinforge:Unable to write output file /dev/full: No space left on device\n" + kFailed, "",
+       1},
+      {"full error file", plus({"-err", "/dev/full", "-template", "missing.tpl"}, kComplete),
+       "pinforge:Unable to write error file /dev/full: No space left on device\n" + kFailed, "",
+       1},
+      {"missing design file beside the unit's", plus(topRun("out.txt"), {"-lib", "work", "gone.vhd"}),
+       "pinforge:Unable to read design file gone.vhd; see the messages above.\n" + kFailed,
+       "gone.vhd: error: No such file or directory\n", 1, {{"out.txt", ""}}},
+      {"directory as a design file", plus(topRun("out.txt"), {"-lib", "work", "/"}),
+       "pinforge:Unable to read design file /; see the messages above.\n" + kFailed,
+       "/: error: is a directory\n", 1},
+      {"output is a design file", topRun("top.vhd"), "",
+       sameFile("output file top.vhd is the same file as the design file top.vhd"), 1,
+       {{"top.vhd", "entity top is\n  port (a : in bit);\nend entity top;\n"}}},
+      {"output is the template", topRun("./tpl.txt"), "",
+       sameFile("output file ./tpl.txt is the same file as the template tpl.txt"), 1,
+       {{"tpl.txt", "%module%\n"}}},
+      {"error file is a design file", plus(kComplete, {"-err", "other.vhd"}), "",
+       sameFile("error file other.vhd is the same file as the design file other.vhd"), 1,
+       {{"other.vhd", kOther}, {"out.txt", kMissing}}},
+      {"error file is the output", plus(kComplete, {"-err", "./out.txt"}), "",
+       sameFile("error file ./out.txt is the same file as the output file out.txt"), 1,
+       {{"out.txt", kMissing}}},
+      {"one device for output and errors", plus(topRun("/dev/null"), {"-err", "/dev/null"}),
+       "forge(vhdl) completed successfully.\n", "", 0},
+      {"debug lines name the direction",
+       {"-lang", "verilog", "-lib", "work", "top.v", "-module", "top", "-prj", "demo",
+        "-template", "tpl.txt", "-o", "out.txt", "--a"},
+       "a: input ;\nforge(verilog) completed successfully.\n", "", 0},
       {"missing template, delete on error",
        plus({"-template", "missing.tpl", "-deleteonerror"}, kComplete), kFailed,
        kMissingTemplate + kUsage, 1, {{"out.txt", kMissing}}},
       {"template is a directory", plus({"-template", "/"}, kComplete), kFailed,
-       "FATAL ERROR: Unable to open template file /...\n" + kUsage, 1, {{"out.txt", ""}}},
+       "FATAL ERROR: Unable to open template file /: Is a directory\n" + kUsage, 1,
+       {{"out.txt", kMissing}}},
       {"unopenable output", plus({"-o", "no/dir/out.txt"}, kComplete), kFailed,
        kMissingOutput + kUsage, 1},
       {"template and output both unopenable",
@@ -154,15 +218,16 @@ std::vector<Row> rows() {
     rows.push_back({"language " + lang.back(), plus(without(kComplete, "-module", 1), lang),
                     "forge(" + name + ") completed with errors.\n", kUsage, 1});
   // Without -module the run stops before any design file is read, so the files need not exist.
-  for (const auto& [files, err, status] :
-       {std::tuple{995u, kUsage, 1}, std::tuple{996u, kTooMany + kUsage, 0}}) {
+  // 2 + 995 words are the most a run takes; one more is refused.
+  for (const auto& [files, out, err] : {std::tuple{995u, kFailed, kUsage},
+                                        std::tuple{996u, std::string(), kTooMany + kUsage}}) {
     Args args = {"-lib", "work"};
     args.resize(2 + files, "f.vhd");
     std::string words;
     for (const std::string& arg : args) words += arg + "\n";
-    rows.push_back({std::to_string(files) + " files", args, status ? kFailed : "", err, status});
-    rows.push_back({std::to_string(files) + " files in a response file", {"@run.rsp"},
-                    status ? kFailed : "", err, status, {}, words});
+    rows.push_back({std::to_string(files) + " files", args, out, err, 1});
+    rows.push_back({std::to_string(files) + " files in a response file", {"@run.rsp"}, out, err,
+                    1, {}, words});
   }
   for (const auto& [design, language] :
        {std::pair<Args, std::string>{{"-lib", "work", "top.vhd"}, "vhdl"},
@@ -195,6 +260,7 @@ TEST(CommandLine, OutputStatusAndFiles) {
     if (row.rsp) {
       ASSERT_TRUE(dir.write("run.rsp", *row.rsp));
     }
+    for (const auto& [name, text] : row.before) ASSERT_TRUE(dir.write(name, text));
     const RunResult run = runPinforge(row.args, dir.path());
     ASSERT_TRUE(run.started);
     EXPECT_EQ(run.out, row.out);

@@ -1,12 +1,23 @@
 // Whole runs of the binary where the golden format cannot say enough: the trace file exists
-// only in debug mode once the unit is found, an unwritable trace file does not break the run,
-// the script shell is found beside tclsh, and the shipped demo keeps its reviewed outputs.
+// only in debug mode once the unit is found, an unwritable trace file does not break the run
+// and a symlink is never followed to write it, a file-size limit fails the run cleanly,
+// links cannot make an input the output, -deleteonerror on the Tcl path, an interrupted run
+// leaves the previous output and no temporary file, the script shell is
+// found beside tclsh, and the shipped demo keeps its reviewed outputs.
+#include <fcntl.h>
 #include <gtest/gtest.h>
+#include <signal.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
 #include <unistd.h>
 
+#include <cerrno>
+#include <chrono>
 #include <cstdlib>
 #include <filesystem>
+#include <set>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "support/process.h"
@@ -56,14 +67,182 @@ TEST(FlowRun, TraceFileOnlyWhenDebuggingAFoundUnit) {
     }
     std::vector<std::string> args = argsFor(c.module, c.templateName);
     if (c.debug) args.push_back("--a");
-    const char* path = std::getenv("PATH");
-    const RunResult run = runPinforge(
-        args, dir.file("work"),
-        {{"PATH", dir.file("bin") + ":" + (path != nullptr ? path : "/usr/bin:/bin")}});
+    // runscr is taken from beside the program first, so the program runs from bin/ too.
+    std::error_code error;
+    ASSERT_TRUE(std::filesystem::copy_file(binaryPath(), dir.file("bin/pinforge"), error));
+    args.insert(args.begin(), dir.file("bin/pinforge"));
+    const RunResult run = runProgram(args, dir.file("work"));
     ASSERT_TRUE(run.started);
     EXPECT_EQ(run.status, c.status) << run.out << run.err;
     EXPECT_EQ(dir.read("work/out.txt"), c.output);
     EXPECT_EQ(dir.exists("work/forge.deb"), c.traced);
+  }
+}
+
+TEST(FlowRun, TraceFileIsNeverWrittenThroughASymlink) {
+  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
+  for (const char* target : {"victim", "absent"}) {
+    SCOPED_TRACE(target);
+    ScratchDir dir;
+    ASSERT_TRUE(dir.write("design.vhd", kDesign) && dir.write("t.txt", "%module%\n") &&
+                dir.write("victim", "keep"));
+    ASSERT_EQ(symlink(target, dir.file("forge.deb").c_str()), 0);
+    std::vector<std::string> args = argsFor("top", "t.txt");
+    args.push_back("--a");
+    const RunResult run = runPinforge(args, dir.path());
+    EXPECT_EQ(run.status, 0);
+    EXPECT_EQ(run.out,
+              "pinforge:WARNING: Unable to open trace file forge.deb: it is a symbolic link, which "
+              "is not followed; the run goes on without it.\n"
+              "clk: in std_logic;\nq: out std_logic_vector (3 DOWNTO 0);\n"
+              "forge(vhdl) completed successfully.\n");
+    EXPECT_EQ(dir.read("victim"), "keep");
+    EXPECT_FALSE(dir.exists("absent"));
+    EXPECT_EQ(dir.read("out.txt"), "top\n");
+  }
+}
+
+TEST(FlowRun, FileSizeLimitFailsTheRun) {
+  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
+  std::string templateText, expected;
+  for (int line = 0; line < 4000; ++line) {
+    templateText += "%module%\n";
+    expected += "top\n";
+  }
+  for (bool deleteOnError : {false, true}) {
+    SCOPED_TRACE(deleteOnError);
+    ScratchDir dir;
+    ASSERT_TRUE(dir.write("design.vhd", kDesign) && dir.write("t.txt", templateText));
+    // The shell sets the limit (in blocks of 512 or 1024 bytes) and leaves SIGXFSZ as it is.
+    std::vector<std::string> args = {"/bin/sh", "-c", "ulimit -f 1 && exec \"$0\" \"$@\"",
+                                     binaryPath()};
+    for (const std::string& arg : argsFor("top", "t.txt")) args.push_back(arg);
+    if (deleteOnError) args.push_back("-deleteonerror");
+    const RunResult run = runProgram(args, dir.path());
+    EXPECT_EQ(run.status, 1);
+    EXPECT_EQ(run.out,
+              "pinforge:Unable to write output file out.txt: File too large\n"
+              "forge(vhdl) completed with errors.\n");
+    EXPECT_EQ(run.err, "");
+    const std::string partial = dir.read("out.txt");
+    if (deleteOnError) {
+      EXPECT_FALSE(dir.exists("out.txt"));
+    } else {
+      EXPECT_FALSE(partial.empty());
+      EXPECT_LE(partial.size(), 1024u);
+      EXPECT_TRUE(expected.starts_with(partial));
+    }
+    size_t files = 0;
+    for ([[maybe_unused]] const auto& entry : std::filesystem::directory_iterator(dir.path()))
+      ++files;
+    EXPECT_EQ(files, deleteOnError ? 2u : 3u) << "a temporary file was left behind";
+  }
+}
+
+TEST(FlowRun, LinksCannotMakeAnInputTheOutput) {
+  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
+  const struct {
+    const char* output;
+    const char* message;
+  } cases[] = {
+      {"hard.txt", "The output file hard.txt is the same file as the template t.txt"},
+      {"sym.vhd", "The output file sym.vhd is the same file as the design file design.vhd"},
+      {"sub/../t.txt", "The output file sub/../t.txt is the same file as the template t.txt"},
+  };
+  for (const auto& c : cases) {
+    SCOPED_TRACE(c.output);
+    ScratchDir dir;
+    ASSERT_TRUE(dir.write("design.vhd", kDesign) && dir.write("t.txt", "%module%\n") &&
+                dir.makeDir("sub"));
+    ASSERT_EQ(link(dir.file("t.txt").c_str(), dir.file("hard.txt").c_str()), 0);
+    ASSERT_EQ(symlink("design.vhd", dir.file("sym.vhd").c_str()), 0);
+    std::vector<std::string> args = argsFor("top", "t.txt");
+    args.back() = c.output;
+    const RunResult run = runPinforge(args, dir.path());
+    EXPECT_EQ(run.status, 1);
+    EXPECT_EQ(run.out, "");
+    EXPECT_EQ(run.err, std::string("FATAL ERROR: ") + c.message + "; nothing was written.\n");
+    EXPECT_EQ(dir.read("t.txt"), "%module%\n");
+    EXPECT_EQ(dir.read("design.vhd"), kDesign);
+  }
+}
+
+TEST(FlowRun, DeleteOnErrorOnTheTclPathRemovesWhatTheScriptWrote) {
+  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
+  for (bool deleteOnError : {false, true}) {
+    SCOPED_TRACE(deleteOnError);
+    ScratchDir dir;
+    ASSERT_TRUE(dir.makeDir("bin") && dir.makeDir("work"));
+    // A stand-in script shell that writes part of the output, then fails.
+    ASSERT_TRUE(dir.write("bin/runscr", "#!/bin/sh\necho partial > out.txt\nexit 1\n", true));
+    ASSERT_TRUE(dir.write("work/design.vhd", kDesign) && dir.write("work/t.tcl", "\n"));
+    std::vector<std::string> args = argsFor("top", "t.tcl");
+    if (deleteOnError) args.push_back("-deleteonerror");
+    // runscr is taken from beside the program first, so the program runs from bin/ too.
+    std::error_code error;
+    ASSERT_TRUE(std::filesystem::copy_file(binaryPath(), dir.file("bin/pinforge"), error));
+    args.insert(args.begin(), dir.file("bin/pinforge"));
+    const RunResult run = runProgram(args, dir.file("work"));
+    EXPECT_EQ(run.status, 1) << run.out << run.err;
+    EXPECT_EQ(dir.read("work/out.txt"), deleteOnError ? "<missing>" : "partial\n");
+  }
+}
+
+std::set<std::string> listing(const ScratchDir& dir) {
+  std::set<std::string> names;
+  for (const auto& entry : std::filesystem::directory_iterator(dir.path()))
+    names.insert(entry.path().filename().string());
+  return names;
+}
+
+TEST(FlowRun, InterruptedRunLeavesThePreviousOutput) {
+  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
+  using namespace std::chrono_literals;
+  for (int number : {SIGINT, SIGTERM}) {
+    SCOPED_TRACE(number);
+    ScratchDir dir;
+    ASSERT_TRUE(dir.write("design.vhd", kDesign) && dir.write("out.txt", "previous"));
+    // A template fed through a FIFO holds the run in the middle of its expansion.
+    ASSERT_EQ(mkfifo(dir.file("t.txt").c_str(), 0600), 0);
+    const std::set<std::string> before = listing(dir);
+    std::vector<std::string> args = argsFor("top", "t.txt");
+    args.insert(args.begin(), binaryPath());
+    std::vector<char*> argv;
+    for (std::string& arg : args) argv.push_back(arg.data());
+    argv.push_back(nullptr);
+    const pid_t child = fork();
+    ASSERT_GE(child, 0);
+    if (child == 0) {
+      const int devNull = open("/dev/null", O_RDWR);
+      if (devNull < 0 || dup2(devNull, 1) < 0 || dup2(devNull, 2) < 0 ||
+          chdir(dir.path().c_str()) != 0)
+        _exit(127);
+      alarm(60);
+      execv(argv[0], argv.data());
+      _exit(127);
+    }
+    int writer = -1;
+    bool temporarySeen = false;
+    for (auto deadline = std::chrono::steady_clock::now() + 20s;
+         !temporarySeen && std::chrono::steady_clock::now() < deadline;) {
+      if (writer < 0) writer = open(dir.file("t.txt").c_str(), O_WRONLY | O_NONBLOCK);
+      if (writer >= 0 && listing(dir).size() > before.size()) temporarySeen = true;
+      std::this_thread::sleep_for(10ms);
+    }
+    if (writer >= 0) {
+      EXPECT_EQ(write(writer, "%module%\n", 9), 9);
+    }
+    std::this_thread::sleep_for(50ms);
+    kill(child, number);
+    int status = 0;
+    ASSERT_EQ(waitpid(child, &status, 0), child);
+    if (writer >= 0) close(writer);
+    EXPECT_TRUE(temporarySeen);
+    EXPECT_TRUE((WIFSIGNALED(status) && WTERMSIG(status) == number) ||
+                (WIFEXITED(status) && WEXITSTATUS(status) == 128 + number))
+        << status;
+    EXPECT_EQ(listing(dir), before);
+    EXPECT_EQ(dir.read("out.txt"), "previous");
   }
 }
 

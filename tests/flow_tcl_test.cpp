@@ -1,10 +1,20 @@
-// The Tcl path seen from outside: a stand-in runscr placed first on PATH captures the driver
-// script, so the whole script, the messages and the fate of the temporary file can be checked.
+// The Tcl path seen from outside: a copy of the program runs beside a stand-in runscr that
+// captures the driver script, so the whole script, the messages, the fate of the temporary
+// file, where runscr comes from and what happens on a signal can be checked.
 #include <gtest/gtest.h>
+#include <fcntl.h>
+#include <signal.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
+#include <chrono>
+#include <cstring>
 #include <cstdlib>
+#include <filesystem>
 #include <ostream>
+#include <regex>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include "support/process.h"
@@ -14,12 +24,32 @@ namespace {
 
 using namespace pinforge_test;
 
+// Also records the files it inherited, prints $FAKE_BULK bytes and then $FAKE_SAY (with
+// printf's %b escapes, so a test can ask for a NUL byte), and exits with $FAKE_STATUS.
 constexpr const char* kStandInRunscr =
     "#!/bin/sh\n"
     "cp \"$1\" \"$FAKE_CAPTURE\"\n"
     "printf '%s' \"$1\" > \"$FAKE_CAPTURE.name\"\n"
-    "if [ -n \"$FAKE_SAY\" ]; then printf '%s\\n' \"$FAKE_SAY\"; fi\n"
+    "ls -l /proc/$$/fd > \"$FAKE_CAPTURE.fds\"\n"
+    "if [ -n \"$FAKE_BULK\" ]; then head -c \"$FAKE_BULK\" /dev/zero | tr '\\0' x; fi\n"
+    "if [ -n \"$FAKE_SAY\" ]; then printf '%b\\n' \"$FAKE_SAY\"; fi\n"
     "exit \"${FAKE_STATUS:-0}\"\n";
+
+/// A copy of the program under test in `folder`, so that runscr is looked up beside it.
+bool placeProgram(const ScratchDir& dir, const std::string& folder) {
+  std::error_code error;
+  return std::filesystem::copy_file(binaryPath(), dir.file(folder + "/pinforge"), error) &&
+         !error;
+}
+
+/// `text` with every "@/" replaced by the scratch folder and a slash.
+std::string inScratch(std::string text, const ScratchDir& dir) {
+  for (size_t at = 0; (at = text.find("@/", at)) != std::string::npos;) {
+    text.replace(at, 2, dir.path() + "/");
+    at += dir.path().size() + 1;
+  }
+  return text;
+}
 
 constexpr const char* kTwoPorts =
     "library ieee;\nuse ieee.std_logic_1164.all;\n"
@@ -36,6 +66,10 @@ constexpr const char* kTwoPortLists =
     "set TotalPorts 2\n";
 
 const std::string kSuccess = "forge(vhdl) completed successfully.\n";
+const std::string kFailure = "forge(vhdl) completed with errors.\n";
+const std::string kInvokeError =
+    "pinforge:ERROR: ProjectMgmt(pinforge)  Unable to invoke tcl file generator\n\n" + kFailure;
+const std::string kSystemPath = "/usr/local/bin:/usr/bin:/bin";
 
 struct TclCase {
   const char* name;
@@ -45,16 +79,21 @@ struct TclCase {
   std::string project = "demo";
   std::string projectLine = "demo";  ///< the project as it must appear between the quotes
   std::string fakeSay = "";          ///< what the stand-in prints
+  size_t fakeBulk = 0;               ///< how many "x" the stand-in prints before that
   int fakeStatus = 0;
   std::string portLines = kTwoPortLists;
   std::string out = kSuccess;
   std::string err = "";
   int status = 0;
   bool scriptKept = false;
-  bool tmpMissing = false;  ///< $TMPDIR names no directory, so no script can be created
+  std::string tmpdir = "@/tmp";        ///< $TMPDIR, "@/" standing for the scratch folder
+  std::string scriptFolder = "@/tmp";  ///< where the script must be; empty: nowhere
+  std::string shellBeside = "bin";     ///< the folder of the stand-in; no stand-in when empty
+  std::string path = "@/bin:" + kSystemPath;  ///< $PATH
 };
 
-std::string expectedScript(const TclCase& c) {
+/// The script up to its port count: the text every earlier version wrote.
+std::string expectedHead(const TclCase& c) {
   return "# This file drives input variables to the tcl template file\n"
          "#   given below in the \"source\" command.\n"
          "set ModuleName \"top\"\n"
@@ -68,8 +107,20 @@ std::string expectedScript(const TclCase& c) {
          "set LibLocation \"\"\n"
          "\n"
          "# Port Definitions\n" +
-         c.portLines + c.templateText;
+         c.portLines;
 }
+
+/// The lines between the port count and the template. Their values come from the readers and
+/// are checked with design data of the test's own making; here only their order and form.
+const std::string kQuoted = R"("([^"\\]|\\.)*")";
+const std::string kList = R"( \[ list ( )" + kQuoted + R"()* \]\n)";
+const std::regex kDesignDetails("\n# Generic Definitions\n"
+                                "set GenericName" + kList + "set GenericType" + kList +
+                                "set GenericDefault" + kList + "set GenericValue" + kList +
+                                "set TotalGenerics [0-9]+\n"
+                                "\n# Declared Types and Context\n"
+                                "set PortType" + kList + "set Context " + kQuoted + "\n" +
+                                R"(set Language "vhdl"\n)");
 
 const TclCase kCases[] = {
     {.name = "TwoPorts", .templateText = "puts done\n"},
@@ -110,12 +161,50 @@ const TclCase kCases[] = {
      .scriptKept = true},
     {.name = "DebugKeepsScript",
      .extraArgs = {"--a"},
-     .out = "In0: ? std_logic;\nInBus: ? std_logic_vector (2 DOWNTO 0);\n" + kSuccess,
+     .out = "In0: in std_logic;\nInBus: in std_logic_vector (2 DOWNTO 0);\n" + kSuccess,
      .scriptKept = true},
     {.name = "ScriptCannotBeCreated",
-     .out = "Template file = \n" + kSuccess,
-     .err = "ERROR: ProjectMgmt(pinforge) - Unable to open temporary tcl template file\n",
-     .tmpMissing = true},
+     .out = "pinforge:ERROR: ProjectMgmt(pinforge) - Unable to create the temporary tcl script "
+            "in @/tmp/missing: No such file or directory\n" + kFailure,
+     .status = 1,
+     .tmpdir = "@/tmp/missing",
+     .scriptFolder = ""},
+    {.name = "TempFolderIsAFile",
+     .out = "pinforge:ERROR: ProjectMgmt(pinforge) - Unable to create the temporary tcl script "
+            "in @/work/t.tcl: Not a directory\n" + kFailure,
+     .status = 1,
+     .tmpdir = "@/work/t.tcl",
+     .scriptFolder = ""},
+    // Run in work/, the name "-tmp/pinforge-....tcl" would read as an option.
+    {.name = "TempFolderLooksLikeAnOption", .tmpdir = "-tmp", .scriptFolder = "@/work/-tmp"},
+    {.name = "FailureShowsTheEndOfLongOutput",
+     .fakeSay = "the error",
+     .fakeBulk = 200000,
+     .fakeStatus = 1,
+     .out = kInvokeError,
+     .err = "[... 134474 earlier bytes of the script's output not shown ...]\n" +
+            std::string(65536 - 10, 'x') + "the error\n",
+     .status = 1,
+     .scriptKept = true},
+    {.name = "FailureOutputKeepsNulBytes",
+     .fakeSay = "a\\0b",
+     .fakeStatus = 1,
+     .out = kInvokeError,
+     .err = std::string("a\0b\n", 4),
+     .status = 1,
+     .scriptKept = true},
+    // A runscr beside the program wins over one on PATH, here one that would fail.
+    {.name = "ShellBesideProgramFirst", .path = "@/pathbin:" + kSystemPath},
+    {.name = "ShellFromPath", .shellBeside = "pathbin", .path = "@/pathbin:" + kSystemPath},
+    // Empty and relative PATH entries mean the current folder, where a stranger's runscr waits.
+    {.name = "ShellNeverFromCurrentFolder",
+     .out = "pinforge:ERROR: ProjectMgmt(pinforge) - The script shell runscr is neither beside "
+            "pinforge nor in a folder on PATH\n" + kInvokeError,
+     .status = 1,
+     .scriptKept = true,
+     .scriptFolder = "",
+     .shellBeside = "work",
+     .path = ":.:work:" + kSystemPath},
 };
 
 void PrintTo(const TclCase& c, std::ostream* os) { *os << c.name; }
@@ -124,44 +213,143 @@ class TclDriver : public testing::TestWithParam<TclCase> {};
 
 TEST_P(TclDriver, WritesScriptAndJudgesShell) {
   const TclCase& c = GetParam();
+  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
   ScratchDir dir;
   ASSERT_FALSE(dir.path().empty());
-  for (const char* sub : {"bin", "work", "tmp"}) ASSERT_TRUE(dir.makeDir(sub));
-  ASSERT_TRUE(dir.write("bin/runscr", kStandInRunscr, true));
+  for (const char* sub : {"bin", "pathbin", "work", "tmp", "work/-tmp"})
+    ASSERT_TRUE(dir.makeDir(sub));
+  ASSERT_TRUE(placeProgram(dir, "bin"));
+  ASSERT_TRUE(dir.write("pathbin/runscr", "#!/bin/sh\nexit 9\n", true));
+  if (!c.shellBeside.empty()) {
+    ASSERT_TRUE(dir.write(c.shellBeside + "/runscr", kStandInRunscr, true));
+  }
   ASSERT_TRUE(dir.write("work/design.vhd", c.design));
   ASSERT_TRUE(dir.write("work/t.tcl", c.templateText));
 
-  std::vector<std::string> args = {"-lib",    "work",    "design.vhd", "-module", "top", "-prj",
-                                   c.project, "-template", "t.tcl",    "-o",      "out.txt"};
+  std::vector<std::string> args = {dir.file("bin/pinforge"), "-lib", "work", "design.vhd",
+                                   "-module", "top", "-prj", c.project, "-template", "t.tcl",
+                                   "-o", "out.txt"};
   args.insert(args.end(), c.extraArgs.begin(), c.extraArgs.end());
   const std::string capture = dir.file("captured.tcl");
-  const std::string tmp = dir.file("tmp");
-  const char* path = std::getenv("PATH");
-  const RunResult run =
-      runPinforge(args, dir.file("work"),
-                  {{"PATH", dir.file("bin") + ":" + (path != nullptr ? path : "/usr/bin:/bin")},
-                   {"TMPDIR", c.tmpMissing ? tmp + "/missing" : tmp},
-                   {"FAKE_CAPTURE", capture},
-                   {"FAKE_SAY", c.fakeSay},
-                   {"FAKE_STATUS", std::to_string(c.fakeStatus)}});
+  const RunResult run = runProgram(args, dir.file("work"),
+                                   {{"PATH", inScratch(c.path, dir)},
+                                    {"TMPDIR", inScratch(c.tmpdir, dir)},
+                                    {"FAKE_CAPTURE", capture},
+                                    {"FAKE_SAY", c.fakeSay},
+                                    {"FAKE_BULK", c.fakeBulk ? std::to_string(c.fakeBulk) : ""},
+                                    {"FAKE_STATUS", std::to_string(c.fakeStatus)}});
   ASSERT_TRUE(run.started);
   EXPECT_EQ(run.status, c.status);
-  EXPECT_EQ(run.out, c.out);
+  EXPECT_EQ(run.out, inScratch(c.out, dir));
   EXPECT_EQ(run.err, c.err);
   std::string script;
-  ASSERT_EQ(readFile(capture, script), !c.tmpMissing) << "whether the stand-in runscr ran";
-  if (c.tmpMissing) return;
-  EXPECT_EQ(script, expectedScript(c));
+  ASSERT_EQ(readFile(capture, script), !c.scriptFolder.empty()) << "whether the stand-in ran";
+  if (c.scriptFolder.empty()) return;
+  const std::string head = expectedHead(c);
+  EXPECT_EQ(script.substr(0, head.size()), head);
+  ASSERT_TRUE(script.ends_with(c.templateText)) << script;
+  const std::string details =
+      script.substr(head.size(), script.size() - head.size() - c.templateText.size());
+  EXPECT_TRUE(std::regex_match(details, kDesignDetails)) << details;
 
   const std::string scriptName = readFile(capture + ".name");
-  EXPECT_TRUE(scriptName.starts_with(tmp + "/")) << scriptName;
+  EXPECT_TRUE(scriptName.starts_with(inScratch(c.scriptFolder, dir) + "/")) << scriptName;
   EXPECT_TRUE(scriptName.ends_with(".tcl")) << scriptName;
   EXPECT_EQ(readFile(scriptName) != "<missing>", c.scriptKept);
+  // The shell holds none of the program's files, the output least of all.
+  const std::string inherited = readFile(capture + ".fds");
+  for (const char* name : {"/out.txt", "/t.tcl", "/design.vhd"})
+    EXPECT_EQ(inherited.find(name), std::string::npos) << inherited;
 }
 
 INSTANTIATE_TEST_SUITE_P(Cases, TclDriver, testing::ValuesIn(kCases),
                          [](const testing::TestParamInfo<TclCase>& info) {
                            return std::string(info.param.name);
+                         });
+
+TEST(TclShell, RealShellWithTempFolderLikeAnOption) {
+  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
+  if (findOnPath("tclsh").empty()) GTEST_SKIP() << "tclsh is not installed";
+  ScratchDir dir;
+  for (const char* sub : {"bin", "work", "work/-tmp"}) ASSERT_TRUE(dir.makeDir(sub));
+  ASSERT_TRUE(placeProgram(dir, "bin"));
+  const std::string runscr = dir.file("bin/runscr");
+  std::error_code error;
+  ASSERT_TRUE(std::filesystem::copy_file(sourceDir() + "/tools/runscr", runscr, error));
+  ASSERT_TRUE(dir.write("work/design.vhd", kTwoPorts));
+  ASSERT_TRUE(dir.write("work/t.tcl", "set f [open $OutputFileName w]\n"
+                                      "puts $f \"$ModuleName [llength $PortName]\"\nclose $f\n"));
+  const RunResult run = runProgram({dir.file("bin/pinforge"), "-lib", "work", "design.vhd",
+                                    "-module", "top", "-prj", "p", "-template", "t.tcl", "-o",
+                                    "out.txt"},
+                                   dir.file("work"), {{"TMPDIR", "-tmp"}});
+  EXPECT_EQ(run.out, kSuccess);
+  EXPECT_EQ(run.err, "");
+  EXPECT_EQ(run.status, 0);
+  EXPECT_EQ(dir.read("work/out.txt"), "top 2\n");
+
+  // runscr itself, given such a name by hand.
+  ASSERT_TRUE(dir.write("work/-tmp/direct.tcl", "set f [open direct.txt w]; puts $f ok; close $f"));
+  const RunResult direct = runProgram({runscr, "-tmp/direct.tcl"}, dir.file("work"));
+  EXPECT_EQ(direct.status, 0) << direct.err;
+  EXPECT_EQ(dir.read("work/direct.txt"), "ok\n");
+}
+
+/// A stand-in shell that says it has started, then, a second later, writes ".late" itself and
+/// from a background job of its own: neither may happen once the program has been stopped.
+constexpr const char* kSlowRunscr =
+    "#!/bin/sh\n"
+    "printf '%s' \"$1\" > \"$FAKE_CAPTURE.name\"\n"
+    "(sleep 1; echo late > \"$FAKE_CAPTURE.late-job\") &\n"
+    "echo $$ > \"$FAKE_CAPTURE.pid\"\n"
+    "sleep 1\n"
+    "echo late > \"$FAKE_CAPTURE.late\"\n";
+
+class TclInterrupt : public testing::TestWithParam<int> {};
+
+TEST_P(TclInterrupt, StopsShellRemovesScriptAndEndsWithTheSignal) {
+  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
+  ScratchDir dir;
+  for (const char* sub : {"bin", "work", "tmp"}) ASSERT_TRUE(dir.makeDir(sub));
+  ASSERT_TRUE(placeProgram(dir, "bin"));
+  ASSERT_TRUE(dir.write("bin/runscr", kSlowRunscr, true));
+  ASSERT_TRUE(dir.write("work/design.vhd", kTwoPorts));
+  ASSERT_TRUE(dir.write("work/t.tcl", "puts done\n"));
+  const std::string capture = dir.file("captured");
+  const std::string program = dir.file("bin/pinforge");
+  const pid_t child = ::fork();
+  ASSERT_GE(child, 0);
+  if (child == 0) {
+    const int quiet = ::open("/dev/null", O_WRONLY);
+    if (quiet < 0 || ::dup2(quiet, 1) < 0 || ::dup2(quiet, 2) < 0 ||
+        ::chdir(dir.file("work").c_str()) != 0 || ::setenv("TMPDIR", dir.file("tmp").c_str(), 1) ||
+        ::setenv("FAKE_CAPTURE", capture.c_str(), 1))
+      ::_exit(127);
+    ::execl(program.c_str(), program.c_str(), "-lib", "work", "design.vhd", "-module", "top",
+            "-prj", "p", "-template", "t.tcl", "-o", "out.txt", static_cast<char*>(nullptr));
+    ::_exit(127);
+  }
+  bool started = false;
+  for (int wait = 0; wait < 200 && !started; ++wait) {
+    std::this_thread::sleep_for(std::chrono::milliseconds(50));
+    started = readFile(capture + ".pid") != "<missing>";
+  }
+  EXPECT_TRUE(started);
+  ::kill(child, GetParam());
+  int status = 0;
+  ASSERT_EQ(::waitpid(child, &status, 0), child);
+  EXPECT_TRUE(WIFSIGNALED(status) && WTERMSIG(status) == GetParam()) << status;
+  const std::string scriptName = readFile(capture + ".name");
+  EXPECT_TRUE(scriptName.starts_with(dir.file("tmp/"))) << scriptName;
+  EXPECT_EQ(readFile(scriptName), "<missing>");
+  std::this_thread::sleep_for(std::chrono::milliseconds(1500));
+  EXPECT_EQ(readFile(capture + ".late"), "<missing>");
+  EXPECT_EQ(readFile(capture + ".late-job"), "<missing>");
+}
+
+INSTANTIATE_TEST_SUITE_P(Signals, TclInterrupt, testing::Values(SIGINT, SIGTERM, SIGHUP),
+                         [](const testing::TestParamInfo<int>& info) {
+                           return std::string(sigabbrev_np(info.param));
                          });
 
 }  // namespace

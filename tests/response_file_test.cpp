@@ -1,8 +1,9 @@
-// The argument vector built from a command line or a response file: word splitting and the
-// message of an unreadable response file.
+// The argument vector built from a command line or a response file: word splitting, and the
+// refusal of a response file that cannot be read, is not a regular file or holds a huge word.
 #include "response_file.h"
 
 #include <gtest/gtest.h>
+#include <sys/stat.h>
 
 #include <string>
 #include <vector>
@@ -16,7 +17,8 @@ using Words = std::vector<std::string>;
 TEST(ExpandResponseFile, WordsAndFailures) {
   pinforge_test::ScratchDir dir;
   const std::string rsp = "@" + dir.file("args.rsp");
-  const std::string longWord(25000, 'x');
+  const std::string hugeWord(ArgumentVector::kMaxWordBytes, 'x');
+  ASSERT_EQ(::mkfifo(dir.file("fifo").c_str(), 0600), 0);
   const struct {
     const char* what;
     Words args;            // after the program name
@@ -35,15 +37,20 @@ TEST(ExpandResponseFile, WordsAndFailures) {
       {"empty file", {rsp}, "", {}},
       {"no quoting, comments or nesting", {rsp}, "\"a b\" # c @inner.rsp\n",
        {"\"a", "b\"", "#", "c", "@inner.rsp"}},
-      {"a word far longer than any line buffer", {rsp}, "-module " + longWord + " -prj p\n",
-       {"-module", longWord, "-prj", "p"}},
-      {"a word across the 9999th character", {rsp}, std::string(9990, ' ') + "abcdefghijklmnop\n",
-       {"abcdefghijklmnop"}},
       {"missing file", {"@" + dir.file("missing.rsp")}, "", {},
        "FATAL ERROR: Unable to open response file " + dir.file("missing.rsp") + "...\n"},
       {"empty name", {"@"}, "", {}, "FATAL ERROR: Unable to open response file ...\n"},
       {"a directory", {"@" + dir.path()}, "", {},
        "FATAL ERROR: Unable to open response file " + dir.path() + "...\n"},
+      // Opening a FIFO without a writer would wait forever; reading a device, without end.
+      {"a FIFO", {"@" + dir.file("fifo")}, "", {},
+       "FATAL ERROR: Response file " + dir.file("fifo") + " is not a regular file.\n"},
+      {"an endless device", {"@/dev/zero"}, "", {},
+       "FATAL ERROR: Response file /dev/zero is not a regular file.\n"},
+      {"a word of the largest size", {rsp}, "a\n" + hugeWord, {"a", hugeWord}},
+      {"a word one byte over the largest size", {rsp}, "a\n\nb " + hugeWord + "x\n", {},
+       "FATAL ERROR: Response file " + dir.file("args.rsp") +
+           ", line 3: a word is longer than 16 MB.\n"},
   };
   for (const auto& test : cases) {
     SCOPED_TRACE(test.what);
@@ -57,7 +64,7 @@ TEST(ExpandResponseFile, WordsAndFailures) {
     ArgumentVector expanded;
     EXPECT_EQ(expandResponseFile(messages.get(), static_cast<int>(args.size()), argv.data(),
                                  expanded),
-              !test.message.empty());
+              test.message.empty() ? Expansion::Ready : Expansion::Refused);
     Words words;
     for (size_t i = 1; i < expanded.count(); ++i) words.push_back(expanded[i]);
     if (test.message.empty()) {

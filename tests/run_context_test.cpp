@@ -46,7 +46,9 @@ TEST_F(RunContextFiles, OutputExtensionIsEverythingAfterTheFirstDotOfTheWholeNam
   for (const auto& test : cases) {
     SCOPED_TRACE(test.name);
     RunContext context;
-    EXPECT_EQ(context.openOutput(test.name), test.opens);
+    std::string why;
+    EXPECT_EQ(context.openOutput(test.name, why), test.opens);
+    EXPECT_EQ(why.empty(), test.opens);
     EXPECT_EQ(context.m_OutputExt.str(), test.extension);
     EXPECT_EQ(context.m_OutputFileName.str(), test.name);
     EXPECT_EQ(context.m_OutputStream != nullptr, test.opens);
@@ -57,20 +59,23 @@ TEST_F(RunContextFiles, OpensAndRegistrationsRecordTheNameWhetherOrNotTheFileOpe
   ASSERT_TRUE(m_Dir.write("t.tpl", "text"));
   ASSERT_TRUE(m_Dir.write("a.vhd", ""));
   RunContext context;
-  EXPECT_TRUE(context.openTemplateFile("t.tpl"));
+  std::string why;
+  EXPECT_TRUE(context.openTemplateFile("t.tpl", why));
   EXPECT_NE(context.m_TemplateStream, nullptr);
-  std::FILE* log = context.openErrorFile("run.log");
+  std::FILE* log = context.openErrorFile("run.log", why);
   EXPECT_NE(log, nullptr);
   EXPECT_EQ(log, context.m_ErrorStream);
   EXPECT_EQ(context.m_ErrorFileName.str(), "run.log");
   EXPECT_TRUE(context.registerDesignFile("a.vhd"));
 
   RunContext missing;
-  EXPECT_FALSE(missing.openTemplateFile("."));
-  EXPECT_FALSE(missing.openTemplateFile("none.tpl"));
+  EXPECT_FALSE(missing.openTemplateFile(".", why));
+  EXPECT_EQ(why, "Is a directory");
+  EXPECT_FALSE(missing.openTemplateFile("none.tpl", why));
+  EXPECT_EQ(why, "No such file or directory");
   EXPECT_EQ(missing.m_TemplateStream, nullptr);
   EXPECT_EQ(missing.m_TemplateFileName.str(), "none.tpl");
-  EXPECT_EQ(missing.openErrorFile("no/such/dir.log"), nullptr);
+  EXPECT_EQ(missing.openErrorFile("no/such/dir.log", why), nullptr);
   EXPECT_EQ(missing.m_ErrorFileName.str(), "no/such/dir.log");
   // A design file that cannot be read stays registered so the lookup can tell about it.
   missing.m_LibraryName = std::string_view("lib2");
@@ -114,9 +119,10 @@ TEST(RunContextReport, EveryMessageIsPrintedCountedAndKept) {
 
 TEST_F(RunContextFiles, DumpShowsStreamsAndNames) {
   RunContext context;
-  ASSERT_TRUE(context.openOutput("top.vhd"));
-  ASSERT_NE(context.openErrorFile("run.log"), nullptr);
-  context.m_DebugStream = std::fopen("forge.deb", "w");
+  std::string why;
+  ASSERT_TRUE(context.openOutput("top.vhd", why));
+  ASSERT_NE(context.openErrorFile("run.log", why), nullptr);
+  ASSERT_TRUE(context.openTraceFile(why));
   context.m_ModuleName = std::string_view("top");
   context.m_LibraryName = std::string_view("lib2");
   context.m_Date = std::string_view("10:11:12 01/02/2026");

@@ -6,17 +6,31 @@
 
 bool Forge::processTemplate() {
   bool stop = false;
-  std::string_view token = m_Reader.nextToken();
+  std::string_view token;
+  if (!readToken(token)) return false;
   while (!m_Reader.atEnd()) {
     if (doToken(token, nullptr, nullptr)) {
       stop = true;
       break;
     }
-    token = m_Reader.nextToken();
+    if (!readToken(token)) return false;
   }
   // The read that met the end still returned a token (often empty); it is handled too.
   if (!stop) stop = doToken(m_Reader.current(), nullptr, nullptr);
   return !stop;
+}
+
+bool Forge::readToken(std::string_view& token) {
+  const int32_t startLine = m_Reader.line();
+  token = m_Reader.nextToken();
+  if (!m_Reader.tooLong()) return true;
+  std::string message = "Token: the token that starts on line ";
+  message += std::to_string(startLine);
+  message += " is longer than the limit of ";
+  message += std::to_string(TokenReader::kMaxTokenSize);
+  message += " bytes (16 MB).";
+  reportError(message);
+  return false;
 }
 
 bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
@@ -30,6 +44,8 @@ bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
     switch (lookupKeyword(token)) {
       case kKwIfHas: return doIf(token, true);
       case kKwIfNHas: return doIf(token, false);
+      case kKwIfPort: return doIfPort(token, true, port);
+      case kKwIfNPort: return doIfPort(token, false, port);
       case kKwEndIf: return doEndIf();
       default: return false;
     }
@@ -49,6 +65,22 @@ bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
 
   const bool replaying = list != nullptr && port != nullptr;
   switch (index) {
+    case kKwContext: return writeContext();
+    case kKwGeneric: return writeGenericList();
+    case kKwGenericDefault:
+    case kKwGenericType:
+    case kKwGenericValue: return writeGenericField(index);
+    case kKwIfPort: return doIfPort(token, true, port);
+    case kKwIfNPort: return doIfPort(token, false, port);
+    case kKwPortMode:
+    case kKwPortType:
+      if (!replaying) {
+        reportError(index == kKwPortMode
+                        ? "@PORT_MODE@ may only occur inside an @ITERATE@ over ports."
+                        : "@PORT_TYPE@ may only occur inside an @ITERATE@ over ports.");
+        return true;
+      }
+      return index == kKwPortMode ? writePortMode(*port) : writePortType(*port);
     case kKwAt: return writeText("@", false);
     case kKwComment: return false;
     case kKwCr: return writeText("\n", false);
@@ -62,11 +94,15 @@ bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
     case kKwInvCase: m_Case = INVCASE; return false;
     case kKwIterate: return eatIterate();
     case kKwIterator:
+      if (m_CurrentGeneric != nullptr) {
+        std::string name = m_CurrentGeneric->m_Name;
+        return writeText(applyCase(name), false);
+      }
       if (!replaying) {
         reportError("@ITERATOR@ may not occur outside of an @ITERATE@.");
         return true;
       }
-      return writeText(formatPort(*port), false);
+      return rangeNeeded(*port) || writeText(formatPort(*port), false);
     case kKwLowCase: m_Case = LOWCASE; return false;
     case kKwMap: m_Map = true; return false;
     case kKwMapSignal: return doMapSignal(token);
@@ -82,6 +118,10 @@ bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
     case kKwTab: return writeText("\t", false);
     case kKwUpCase: m_Case = UPCASE; return false;
     case kKwVhdlTypeDec:
+      if (m_CurrentGeneric != nullptr) {
+        reportError("@VHDL_TYPEDEC@ may only occur inside an @ITERATE@ over ports.");
+        return true;
+      }
       if (!replaying) {
         reportError("@VHDL_TYPEDEC@ may not occur outside of an @ITERATE@.");
         return true;

@@ -51,6 +51,21 @@ void Forge::reportError(std::string_view text) {
   m_Message = std::move(message);
 }
 
+void Forge::reportRangeError(const PortRecord& port) {
+  if (m_Status != kStatusOk) return;
+  m_Status = kStatusTemplateError;
+  // Not cut to kMessageCapacity: the problem text says how to fix the design, and is needed
+  // whole.
+  std::string message = "Error - Template file line ";
+  message += std::to_string(m_Reader.line());
+  message += " needs the range of port ";
+  message += port.m_Name;
+  message += ", which could not be evaluated:\n";
+  message += port.rangeProblem();
+  message += '\n';
+  m_Message = std::move(message);
+}
+
 void Forge::trace(const char* format, ...) const {
   if (m_Debug == nullptr) return;
   va_list args;

@@ -7,12 +7,16 @@
 #include <cstdint>
 #include <cstdio>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
+#include <unordered_map>
 
 #include "data/port_record.h"
 #include "data/typed_lists.h"
 #include "engine/expansion_list.h"
+#include "engine/keyword_table.h"
+#include "engine/port_index.h"
 #include "engine/token_reader.h"
 
 class Forge {
@@ -23,7 +27,7 @@ class Forge {
   enum RangePosition : uint32_t { AsPrefix = 0, AsPostfix = 1 };
   /// Status values.
   enum : uint32_t { kStatusOk = 0, kStatusTemplateError = 2 };
-  /// Deepest nesting of @IFHAS/@IFNHAS blocks.
+  /// Deepest nesting of @IFHAS/@IFNHAS/@IFPORT/@IFNPORT blocks.
   static constexpr uint32_t kMaxConditionalDepth = 9;
   /// m_Message keeps at most this many bytes.
   static constexpr size_t kMessageCapacity = 255;
@@ -40,13 +44,22 @@ class Forge {
   /// change nothing. A message longer than kMessageCapacity is cut between characters and
   /// still ends with a newline.
   void reportError(std::string_view text);
+  /// Records, as the first error, that the template needs the range of `port`, which the
+  /// design could not evaluate; the message carries the port's problem text uncut.
+  void reportRangeError(const PortRecord& port);
+  /// True once an error has been recorded.
+  bool failed() const { return m_Status != kStatusOk; }
 
   // --- Main loop and dispatch (dispatch.cpp) ---
   /// Expands the whole template. True when it ran to its end without a stop.
   bool processTemplate();
-  /// Handles one token. `list` and `port` are present only while an @ITERATE@ body is replayed.
-  /// True means stop.
+  /// Handles one token. `list` is present only while an @ITERATE@ body is replayed, `port` only
+  /// while that is an iteration over ports (m_CurrentGeneric holds the generic of an iteration
+  /// over generics). True means stop.
   bool doToken(std::string_view token, TokList* list, PortRecord* port);
+  /// The next template token into `token`; false (after reporting) when it is longer than
+  /// TokenReader::kMaxTokenSize.
+  bool readToken(std::string_view& token);
 
   // --- Output writer (output_writer.cpp) ---
   /// Writes `text`; drops newlines and tabs when `suppress`; wraps after the signal delimiter.
@@ -73,9 +86,17 @@ class Forge {
 
   // --- Conditionals (conditionals.cpp) ---
   bool doIf(std::string_view token, bool isIfHas);
+  /// @IFPORT / @IFNPORT: tests the name of `port` (null outside a port iteration) against a
+  /// pattern in which "*" matches any run and "?" one character.
+  bool doIfPort(std::string_view token, bool isIfPort, const PortRecord* port);
   bool doEndIf();
   bool addCondition(uint32_t value);
   int compareSignalName(std::string_view name, std::string_view pattern) const;
+  /// Whether a port selected by port-list keyword `kind` has a name matching `pattern` (the
+  /// @IFHAS rules); null (after reporting) when deciding needs a range that is unknown.
+  std::optional<bool> hasMatchingPort(int kind, std::string_view pattern);
+  /// Whether a generic has a name matching `pattern` (the @IFHAS rules).
+  bool hasMatchingGeneric(std::string_view pattern);
 
   // --- Signal mapping (signal_mapping.cpp) ---
   bool doMapSignal(std::string_view token);
@@ -88,14 +109,41 @@ class Forge {
   bool writePortList(int kind, TokList* list);
   bool eatIterate();
   bool doIterate(int kind, TokList* list);
+  /// True (after reporting) when `selection` would need the width of `port` to decide on it,
+  /// and that width is unknown.
+  bool widthUnknown(const PortKind& selection, const PortRecord& port);
+  /// The name index of the ports, built on first use.
+  PortIndex& portIndex();
+
+  // --- Generics and context (generics.cpp) ---
+  /// %generic%: the generic names, delimited and in the case mode.
+  bool writeGenericList();
+  /// Replays `list` once per generic with m_CurrentGeneric set.
+  bool doIterateGenerics(TokList* list);
+  /// @GENERIC_TYPE@, @GENERIC_DEFAULT@ and @GENERIC_VALUE@ (keyword `index`).
+  bool writeGenericField(int index);
+  /// %context%, as stored.
+  bool writeContext();
 
   // --- @ITERATOR@ and bus expansion (port_format.cpp) ---
   /// The bits of bus `port`, worked out one at a time as they are walked; they carry the
   /// port's mapped name as it is now.
   std::unique_ptr<ExpansionList> expandBus(const PortRecord& port) const;
   std::string formatPort(const PortRecord& port) const;
+  /// True (after reporting) when writing `port` under the current settings needs its range
+  /// (showrange or expandbus on) and that range is unknown.
+  bool rangeNeeded(const PortRecord& port);
+
+  // --- Port words of an iteration (port_words.cpp) ---
+  /// @PORT_TYPE@: the declared type as written.
+  bool writePortType(const PortRecord& port);
+  /// @PORT_MODE@: the direction word in the design's language; nothing for an interface port
+  /// or a node.
+  bool writePortMode(const PortRecord& port);
 
   // --- @VHDL_TYPEDEC@ (vhdl_typedec.cpp) ---
+  /// Bit, bit-vector and integer ports (and ports whose declared type is not known) get the
+  /// net type or the bus type with its range; any other port gets its declared type.
   bool doVhdlTypeDec(const PortRecord& port);
 
   /// Writes one trace line when a trace stream exists. The format must be a literal.
@@ -130,10 +178,6 @@ class Forge {
   uint32_t m_Column = 0;
 
   // --- Port selection and iteration state (owned by iteration.cpp) ---
-  /// The first (restart) or next port of `kind`, walking the data list with its own cursor and
-  /// never expanding buses (a bus's bits carry its name, so name searches find the same ports);
-  /// null when done. Used by the searches of @IFHAS/@IFNHAS and @MAPSIGNAL.
-  PortRecord* searchPort(int kind, bool restart);
   /// The data-list element that selectPort handed out last (or whose bits it is handing out);
   /// null before the first walk and after a walk ran off the end. Only port-list variables and
   /// iterations move it, so searches inside an iteration body leave the iteration's position
@@ -141,4 +185,12 @@ class Forge {
   List_element* m_SelectedPort = nullptr;
   /// True while an @ITERATE@ body is being replayed.
   bool m_Iterating = false;
+  /// The generic of the @ITERATE@%GENERIC% pass being replayed; null otherwise.
+  const GenericRecord* m_CurrentGeneric = nullptr;
+  /// Searches by name see every port of the list, never bus bits, so the mapping of
+  /// @MAPSIGNAL lands on the bus itself and the searches leave every walk alone.
+  std::unique_ptr<PortIndex> m_PortIndex;
+  /// Results of @IFHAS tests by kind, case rule and pattern: the ports and generics do not
+  /// change during an expansion, so a test repeated in an iteration body is answered once.
+  std::unordered_map<std::string, bool> m_MatchResults;
 };

@@ -1,6 +1,6 @@
 // Port-list variables and @ITERATE@: the walk over the ports of one kind (handing out a bus as
-// its bits while expandbus is on), the delimited listing, and the collection and replay of an
-// iteration body once per port.
+// its bits while expandbus is on), the delimited listing, the collection of an iteration body
+// and its replay once per port.
 #include "engine/forge.h"
 #include "engine/keyword_table.h"
 
@@ -26,12 +26,21 @@ PortRecord* Forge::selectPort(int kind, bool restart) {
     if (m_SelectedPort == nullptr) return nullptr;
     m_SelectedPort = m_SelectedPort->m_Next;
   }
-  while (m_SelectedPort != nullptr &&
-         !selection->selects(portOf(m_SelectedPort)->m_Dir, portOf(m_SelectedPort)->isBus())) {
-    m_SelectedPort = m_SelectedPort->m_Next;
+  for (; m_SelectedPort != nullptr; m_SelectedPort = m_SelectedPort->m_Next) {
+    const PortRecord& candidate = *portOf(m_SelectedPort);
+    if (widthUnknown(*selection, candidate)) {
+      m_SelectedPort = nullptr;
+      return nullptr;
+    }
+    if (selection->selects(candidate.m_Dir, candidate.isBus())) break;
   }
   if (m_SelectedPort == nullptr) return nullptr;
   PortRecord* port = portOf(m_SelectedPort);
+  if (m_ExpandBus && port->isRangeUnknown()) {
+    reportRangeError(*port);
+    m_SelectedPort = nullptr;
+    return nullptr;
+  }
   if (m_ExpandBus && port->isBus()) {
     m_Expansion = expandBus(*port);
     return m_Expansion->first();
@@ -39,18 +48,16 @@ PortRecord* Forge::selectPort(int kind, bool restart) {
   return port;
 }
 
-PortRecord* Forge::searchPort(int kind, bool restart) {
-  const PortKind* selection = portKindFor(kind);
-  if (selection == nullptr) return nullptr;
-  PortRecord* port = nullptr;
-  if (restart) {
-    port = m_DataList->first();
-  } else if (m_DataList->hasCurrent()) {
-    port = m_DataList->next();
-  }
-  while (port != nullptr && !selection->selects(port->m_Dir, port->isBus()))
-    port = m_DataList->next();
-  return port;
+bool Forge::widthUnknown(const PortKind& selection, const PortRecord& port) {
+  if (selection.filter == WidthFilter::Any || !port.isRangeUnknown()) return false;
+  if (selection.letters.find(port.m_Dir) == std::string_view::npos) return false;
+  reportRangeError(port);
+  return true;
+}
+
+PortIndex& Forge::portIndex() {
+  if (!m_PortIndex) m_PortIndex = std::make_unique<PortIndex>(*m_DataList);
+  return *m_PortIndex;
 }
 
 bool Forge::writePortList(int kind, TokList* list) {
@@ -61,13 +68,13 @@ bool Forge::writePortList(int kind, TokList* list) {
     return true;
   }
   PortRecord* port = selectPort(kind, true);
-  if (port == nullptr) return false;
-  if (writeText(formatPort(*port), false)) return true;
+  if (port == nullptr) return failed();
+  if (rangeNeeded(*port) || writeText(formatPort(*port), false)) return true;
   while ((port = selectPort(kind, false)) != nullptr) {
     if (writeText(m_SigDelim, false)) return true;
-    if (writeText(formatPort(*port), false)) return true;
+    if (rangeNeeded(*port) || writeText(formatPort(*port), false)) return true;
   }
-  return false;
+  return failed();
 }
 
 bool Forge::eatIterate() {
@@ -76,31 +83,34 @@ bool Forge::eatIterate() {
     reportError("@ITERATE@ may not occur inside an @ITERATE@ body.");
     return true;
   }
-  const std::string_view iterator = m_Reader.nextToken();
+  std::string_view iterator;
+  if (!readToken(iterator)) return true;
   const int kind = lookupKeyword(iterator);
   trace("eatIterate() Iterator=%.*s\n", static_cast<int>(iterator.size()), iterator.data());
-  if (portKindFor(kind) == nullptr) {
+  if (kind != kKwGeneric && portKindFor(kind) == nullptr) {
     reportError("Iterator must be one of: %IPORT% %OBPORT% %OPORT% %BPORT% %PORT% %NODE% %SIGNAL%");
     return true;
   }
   TokList body;
-  std::string_view token = m_Reader.nextToken();
+  std::string_view token;
+  if (!readToken(token)) return true;
   while (!m_Reader.atEnd()) {
     if (lookupKeyword(token) == kKwEndIterate) break;
     trace("eatIterate() eating szToken=%.*s\n", static_cast<int>(token.size()), token.data());
     body.appendOwned(new TokEntry(token));
-    token = m_Reader.nextToken();
+    if (!readToken(token)) return true;
   }
   if (m_Reader.atEnd()) {
     reportError("@ITERATE@ must be terminated by @ENDITERATE@!");
     return true;
   }
+  if (kind == kKwGeneric) return doIterateGenerics(&body);
   return doIterate(kind, &body);
 }
 
 bool Forge::doIterate(int kind, TokList* list) {
   PortRecord* port = selectPort(kind, true);
-  if (port == nullptr) return false;
+  if (port == nullptr) return failed();
   m_Iterating = true;
   bool stop = false;
   while (true) {
@@ -113,7 +123,10 @@ bool Forge::doIterate(int kind, TokList* list) {
       }
     }
     port = selectPort(kind, false);
-    if (port == nullptr) break;
+    if (port == nullptr) {
+      stop = stop || failed();
+      break;
+    }
     // A stopped pass still separates itself from the port that would have followed.
     if (writeText(m_SigDelim, false)) {
       stop = true;

@@ -8,19 +8,22 @@ namespace {
 // Sorted by bytes with letters compared as lower case; words that take argument text carry no
 // closing character. No word is the beginning of another, so a prefix match is unambiguous.
 constexpr std::array<std::string_view, kKeywordCount> kWords = {
-    "%bbusport%",     "%bport%",           "%bscalarport%",     "%busport%",
-    "%date%",         "%design%",          "%ext%",             "%filename%",
-    "%ibusport%",     "%iport%",           "%iscalarport%",     "%module%",
-    "%node%",         "%obbusport%",       "%obport%",          "%obscalarport%",
-    "%obusport%",     "%oport%",           "%oscalarport%",     "%port%",
-    "%project%",      "%scalarport%",      "%signal%",          "%title%",
-    "%tool%",         "%ver%",             "@at@",              "@comment",
-    "@cr@",           "@endif@",           "@enditerate@",      "@expandbus@",
-    "@ifhas",         "@ifnhas",           "@invcase@",         "@iterate@",
-    "@iterator@",     "@lowcase@",         "@map@",             "@mapsignal",
-    "@noexpandbus@",  "@nomap@",           "@noshowrange@",     "@nosuppresnewline@",
-    "@percent@",      "@samecase@",        "@set",              "@showrange@",
-    "@suppresnewline@", "@tab@",           "@upcase@",          "@vhdl_typedec@",
+    "%bbusport%", "%bport%", "%bscalarport%", "%busport%",
+    "%context%", "%date%", "%design%", "%ext%",
+    "%filename%", "%generic%", "%ibusport%", "%iport%",
+    "%iscalarport%", "%module%", "%node%", "%obbusport%",
+    "%obport%", "%obscalarport%", "%obusport%", "%oport%",
+    "%oscalarport%", "%port%", "%project%", "%scalarport%",
+    "%signal%", "%title%", "%tool%", "%ver%",
+    "@at@", "@comment", "@cr@", "@endif@",
+    "@enditerate@", "@expandbus@", "@generic_default@", "@generic_type@",
+    "@generic_value@", "@ifhas", "@ifnhas", "@ifnport",
+    "@ifport", "@invcase@", "@iterate@", "@iterator@",
+    "@lowcase@", "@map@", "@mapsignal", "@noexpandbus@",
+    "@nomap@", "@noshowrange@", "@nosuppresnewline@", "@percent@",
+    "@port_mode@", "@port_type@", "@samecase@", "@set",
+    "@showrange@", "@suppresnewline@", "@tab@", "@upcase@",
+    "@vhdl_typedec@",
 };
 
 unsigned char lower(unsigned char c) { return (c >= 'A' && c <= 'Z') ? c + ('a' - 'A') : c; }

@@ -1,71 +1,82 @@
-// The template language's vocabulary: the 52 variable and directive words in one sorted table,
+// The template language's vocabulary: the 61 variable and directive words in one sorted table,
 // the prefix lookup that maps a token to its word, and the port-list kinds (which ports each of
 // the seventeen port-list variables selects).
 #pragma once
 
 #include <string_view>
 
-/// Indices of the keyword table. Variables come first (0-25), then directives (26-51). The
+/// Indices of the keyword table. Variables come first (0-27), then directives (28-60). The
 /// order is the table's sort order and is relied on by callers that store an index.
 enum Keyword : int {
   kKwBBusPort = 0,
   kKwBPort = 1,
   kKwBScalarPort = 2,
   kKwBusPort = 3,
-  kKwDate = 4,
-  kKwDesign = 5,
-  kKwExt = 6,
-  kKwFileName = 7,
-  kKwIBusPort = 8,
-  kKwIPort = 9,
-  kKwIScalarPort = 10,
-  kKwModule = 11,
-  kKwNode = 12,
-  kKwOBBusPort = 13,
-  kKwOBPort = 14,
-  kKwOBScalarPort = 15,
-  kKwOBusPort = 16,
-  kKwOPort = 17,
-  kKwOScalarPort = 18,
-  kKwPort = 19,
-  kKwProject = 20,
-  kKwScalarPort = 21,
-  kKwSignal = 22,
-  kKwTitle = 23,
-  kKwTool = 24,
-  kKwVer = 25,
-  kKwAt = 26,
-  kKwComment = 27,
-  kKwCr = 28,
-  kKwEndIf = 29,
-  kKwEndIterate = 30,
-  kKwExpandBus = 31,
-  kKwIfHas = 32,
-  kKwIfNHas = 33,
-  kKwInvCase = 34,
-  kKwIterate = 35,
-  kKwIterator = 36,
-  kKwLowCase = 37,
-  kKwMap = 38,
-  kKwMapSignal = 39,
-  kKwNoExpandBus = 40,
-  kKwNoMap = 41,
-  kKwNoShowRange = 42,
-  kKwNoSuppresNewLine = 43,
-  kKwPercent = 44,
-  kKwSameCase = 45,
-  kKwSet = 46,
-  kKwShowRange = 47,
-  kKwSuppresNewLine = 48,
-  kKwTab = 49,
-  kKwUpCase = 50,
-  kKwVhdlTypeDec = 51,
+  kKwContext = 4,
+  kKwDate = 5,
+  kKwDesign = 6,
+  kKwExt = 7,
+  kKwFileName = 8,
+  kKwGeneric = 9,
+  kKwIBusPort = 10,
+  kKwIPort = 11,
+  kKwIScalarPort = 12,
+  kKwModule = 13,
+  kKwNode = 14,
+  kKwOBBusPort = 15,
+  kKwOBPort = 16,
+  kKwOBScalarPort = 17,
+  kKwOBusPort = 18,
+  kKwOPort = 19,
+  kKwOScalarPort = 20,
+  kKwPort = 21,
+  kKwProject = 22,
+  kKwScalarPort = 23,
+  kKwSignal = 24,
+  kKwTitle = 25,
+  kKwTool = 26,
+  kKwVer = 27,
+  kKwAt = 28,
+  kKwComment = 29,
+  kKwCr = 30,
+  kKwEndIf = 31,
+  kKwEndIterate = 32,
+  kKwExpandBus = 33,
+  kKwGenericDefault = 34,
+  kKwGenericType = 35,
+  kKwGenericValue = 36,
+  kKwIfHas = 37,
+  kKwIfNHas = 38,
+  kKwIfNPort = 39,
+  kKwIfPort = 40,
+  kKwInvCase = 41,
+  kKwIterate = 42,
+  kKwIterator = 43,
+  kKwLowCase = 44,
+  kKwMap = 45,
+  kKwMapSignal = 46,
+  kKwNoExpandBus = 47,
+  kKwNoMap = 48,
+  kKwNoShowRange = 49,
+  kKwNoSuppresNewLine = 50,
+  kKwPercent = 51,
+  kKwPortMode = 52,
+  kKwPortType = 53,
+  kKwSameCase = 54,
+  kKwSet = 55,
+  kKwShowRange = 56,
+  kKwSuppresNewLine = 57,
+  kKwTab = 58,
+  kKwUpCase = 59,
+  kKwVhdlTypeDec = 60,
 };
 
 /// Number of words in the table.
-inline constexpr int kKeywordCount = 52;
+inline constexpr int kKeywordCount = 61;
+/// Number of variable words ("%...%"); they come before every directive.
+inline constexpr int kVariableCount = 28;
 /// lookupKeyword's result for a token that begins with neither "%" nor "@" (plain text).
-inline constexpr int kKwPlainText = 52;
+inline constexpr int kKwPlainText = 61;
 /// lookupKeyword's result for a keyword token that matches no word.
 inline constexpr int kKwNoMatch = -1;
 
@@ -74,7 +85,7 @@ inline constexpr int kKwNoMatch = -1;
 /// kKwNoMatch when no word matches.
 int lookupKeyword(std::string_view token);
 
-/// The table word of `index` (lower case, as stored); empty for an index outside 0-51.
+/// The table word of `index` (lower case, as stored); empty for an index outside 0-60.
 std::string_view keywordWord(int index);
 
 /// Which ports a port-list kind selects by width.

@@ -36,3 +36,9 @@ std::string Forge::formatPort(const PortRecord& port) const {
   }
   return applyCase(text);
 }
+
+bool Forge::rangeNeeded(const PortRecord& port) {
+  if (!port.isRangeUnknown() || (!m_ShowRange && !m_ExpandBus)) return false;
+  reportRangeError(port);
+  return true;
+}

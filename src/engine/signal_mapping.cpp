@@ -17,10 +17,16 @@ bool Forge::doMapSignal(std::string_view token) {
         "NEWNAME@");
     return true;
   }
-  // The search sees a bus as one record even while expandbus is on, so the mapping lands on
+  // The index sees a bus as one record even while expandbus is on, so the mapping lands on
   // the bus itself and reaches every expansion of it made from now on.
-  PortRecord* port = searchPort(kKwSignal, true);
-  while (port != nullptr && port->m_Name != *oldName) port = searchPort(kKwSignal, false);
+  const PortKind& anyPort = *portKindFor(kKwSignal);
+  PortRecord* port = nullptr;
+  for (PortRecord* candidate : portIndex().named(*oldName, false)) {
+    if (anyPort.selects(candidate->m_Dir, candidate->isBus())) {
+      port = candidate;
+      break;
+    }
+  }
   if (port != nullptr) {
     port->setMappedName(*newName);
     trace("doMapSignal() mapped: %.*s to %.*s\n", static_cast<int>(oldName->size()),

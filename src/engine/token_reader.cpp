@@ -39,6 +39,10 @@ std::string_view TokenReader::nextToken() {
   const bool keyword = isKeywordMark(first);
   while (fill()) {
     takeRun();
+    if (m_Buffer.size() > kMaxTokenSize) {
+      m_TooLong = true;
+      break;
+    }
     if (m_Position < m_Filled) {
       // A mark closes a keyword token and belongs to it; after text it opens the next token.
       if (keyword) m_Buffer.push_back(m_Chunk[m_Position++]);

@@ -10,6 +10,9 @@
 
 class TokenReader {
  public:
+  /// The longest token the reader collects; a template cannot make it hold more.
+  static constexpr size_t kMaxTokenSize = 16 * 1024 * 1024;
+
   explicit TokenReader(std::FILE* stream) : m_Stream(stream) {}
 
   /// The next token; empty at end of file. Valid until the next call. Any byte, NUL included,
@@ -23,6 +26,9 @@ class TokenReader {
   /// True once a read has met the end of the stream (a read that needed one more byte and
   /// found none), as the stream's own end-of-file indicator would be.
   bool atEnd() const { return m_AtEnd; }
+  /// True when the last token was cut short after passing kMaxTokenSize bytes; the reader is
+  /// then of no further use.
+  bool tooLong() const { return m_TooLong; }
 
  private:
   /// Makes at least one unread byte available; false at the end of the stream.
@@ -39,4 +45,5 @@ class TokenReader {
   size_t m_Position = 0;
   size_t m_Filled = 0;
   bool m_AtEnd = false;
+  bool m_TooLong = false;
 };

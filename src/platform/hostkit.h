@@ -95,30 +95,94 @@ class File {
   static std::FILE* createTemporary(std::string_view suffix, std::string& name);
   /// The directory holding the running executable; empty when it cannot be found.
   static std::string executableDirectory();
+  /// The folder temporary files are created in: $TMPDIR when set and not empty, else /tmp.
+  static std::string temporaryDirectory();
+  /// Identifies `path` by what it is, not how it is spelled: an existing file by its device
+  /// and inode (symlinks followed, so "./x", a symlink and a hard link all match), a file yet
+  /// to be created by its folder's identity and its last component. Empty when neither can
+  /// be found. `regular` is set when the path names an existing regular file.
+  static std::string identity(const char* path, bool& regular);
+};
+
+/// A file the run writes, with every write, flush and close checked and the first failure
+/// kept with its reason. With Placement::Replace a regular file, or one that does not exist
+/// yet, is written to a new temporary file in the same folder and only put in place by
+/// commit(); until then the previous file is untouched, and the temporary file is removed on
+/// destruction, by discard() and on SIGINT, SIGTERM or SIGHUP (see Interrupt). Anything else
+/// (a device such as /dev/null, a FIFO, a symlink such as /dev/stdout) is written directly,
+/// as are the other placements.
+class OutputFile {
+ public:
+  enum class Placement {
+    Replace,         ///< atomic replacement as described above
+    InPlace,         ///< opened like fopen "w": created or truncated where it is
+    InPlaceNoFollow  ///< as InPlace, but a symlink at `path` is refused, never followed
+  };
+
+  OutputFile();
+  ~OutputFile();
+  OutputFile(const OutputFile&) = delete;
+  OutputFile& operator=(const OutputFile&) = delete;
+
+  /// Opens `path` for writing. False with `error` set to the reason (strerror's text).
+  /// A new file gets the permissions fopen would give it (0666 less the umask); a replaced
+  /// regular file keeps its permission bits and, where allowed, its owner and group.
+  bool open(const char* path, Placement placement, std::string& error);
+  /// The stream to write to; null when not open or already closed.
+  std::FILE* stream() const { return m_Stream; }
+  /// Flushes and closes the stream. False with the reason when this or any earlier write
+  /// failed. Does nothing, successfully, when the stream is already closed.
+  bool close(std::string& error);
+  /// Closes the stream if needed, then renames the temporary file over the target. Does
+  /// nothing for a file written in place. False with the reason; the target is then
+  /// untouched and the temporary file is removed.
+  bool commit(std::string& error);
+  /// Closes the stream and removes the uncommitted temporary file; the target stays as it was.
+  void discard();
+  /// Removes the target when it is a regular file this object wrote (committed, or written
+  /// in place under its own name) and still the same file. Never removes a device, a file
+  /// reached through a symlink, or one it did not open. True when removed.
+  bool removeWritten();
+
+ private:
+  struct Sink;
+  std::unique_ptr<Sink> m_Sink;
+  std::FILE* m_Stream = nullptr;
+  std::string m_Path;
+  std::string m_Temporary;
+  bool m_Removable = false;  ///< a regular file at m_Path with this device and inode is ours
+  uint64_t m_Device = 0;
+  uint64_t m_Inode = 0;
 };
 
 /// Receives the output of a child process.
 class ChildOutput {
  public:
   virtual ~ChildOutput() = default;
-  /// One piece of the child's output (standard output and standard error). Returns true to
-  /// keep receiving.
-  virtual bool OnOutput(const char* text) = 0;
+  /// One piece of the child's output (standard output and standard error, as it arrives; any
+  /// byte, NUL included). Returns true to keep receiving.
+  virtual bool OnOutput(std::string_view text) = 0;
   /// Called once when the child has ended.
   virtual void OnEnd() {}
 };
 
 class Process {
  public:
-  /// Runs `commandLine` without a shell: the line is split into words at blanks and tabs
-  /// (double quotes group a word), the first word is looked up on PATH. The child's standard
-  /// output and standard error go to `receiver`; returns after the child has ended. Returns 0
-  /// only for a normal exit with code 0; otherwise the child's exit code, 128 plus the number
-  /// of the signal that killed it, or -1 when it could not be started (not found, for one).
-  /// Standard input is /dev/null; a NUL byte in the output ends a piece and is not passed on.
-  /// `flags` and the three booleans are accepted for compatibility.
-  int RunNoWindow(const char* commandLine, std::unique_ptr<ChildOutput> receiver,
-                  unsigned flags, bool hideWindow, bool captureOutput, bool detach);
+  /// The path of the program `name` (a bare file name): the one in the folder of this
+  /// executable when there is one, else the first in a PATH folder. Empty and relative PATH
+  /// entries are skipped, so nothing is ever taken from the current folder. Empty when none
+  /// is found.
+  static std::string findProgram(std::string_view name);
+
+  /// Runs the program at the path `argv[0]` (not looked up) with the arguments `argv[1..]`,
+  /// passed as they are, without a shell. The child starts in a process group of its own,
+  /// registered with Interrupt (whose handlers this installs) while it runs, so a signal to
+  /// this process stops it and all it started. It inherits no open file but its standard
+  /// streams: standard input is /dev/null, standard output and standard error go to
+  /// `receiver` (which may be null). Returns after the child has ended: 0 only for a normal
+  /// exit with code 0; otherwise the child's exit code, 128 plus the number of the signal that
+  /// killed it, or -1 when it could not be started.
+  static int run(const std::vector<std::string>& argv, ChildOutput* receiver);
 };
 
 /// What an interrupted run leaves behind. Once installed, SIGINT, SIGTERM and SIGHUP stop

@@ -162,6 +162,10 @@ class ScanExtractor {
   /// errors met.
   int Parse(Language language);
 
+  /// The registered design files Parse could not read (missing, unreadable, a directory), in
+  /// command-line order; their reasons went to standard error. Valid after Parse.
+  const std::vector<std::string>& unreadableFiles() const;
+
   /// Looks `unit` up. Returns 0 when found (it becomes the unit getPorts reports), nonzero
   /// otherwise.
   int findDesignUnit(const char* library, const char* unit, DesignUnitSearch search);

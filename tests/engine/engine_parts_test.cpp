@@ -96,7 +96,7 @@ TEST(KeywordTable, SortedPrefixFreeAndFoundIgnoringCase) {
   for (int i = 0; i < kKeywordCount; ++i) {
     const std::string_view word = keywordWord(i);
     ASSERT_FALSE(word.empty()) << i;
-    EXPECT_EQ(word[0], i < 26 ? '%' : '@') << word;
+    EXPECT_EQ(word[0], i < kVariableCount ? '%' : '@') << word;
     if (i > 0) {
       EXPECT_LT(keywordWord(i - 1), word);
     }
@@ -189,6 +189,113 @@ TEST(Trace, FailedConditionLinesShowTokensUpToNul) {
             "doToken() processing token=@FOO@| with condition test failed.\n"
             "doToken() called: szToken=|pTokList=0\n"
             "doToken() processing token=| with condition test failed.\n");
+}
+
+// The name index and the cached wildcard results must answer exactly as a walk over all ports
+// comparing names by the @IFHAS rules would, through case switches, mappings and iterations.
+TEST(NameSearch, AgreesWithAWalkOverAllPorts) {
+  unsigned state = 2024;
+  const auto pick = [&state](unsigned n) {
+    state = state * 1103515245u + 12345u;
+    return (state >> 16) % n;
+  };
+  const auto randomName = [&](const char* letters, unsigned count) {
+    std::string name;
+    for (unsigned length = 1 + pick(3); length > 0; --length) name += letters[pick(count)];
+    return name;
+  };
+  std::vector<int> kinds;
+  for (int i = 0; i < kKeywordCount; ++i)
+    if (portKindFor(i) != nullptr) kinds.push_back(i);
+
+  for (int round = 0; round < 40; ++round) {
+    std::vector<handlers_test::PortSpec> ports;
+    std::vector<std::string> names;
+    for (unsigned i = 0, n = 1 + pick(12); i < n; ++i) names.push_back(randomName("aAb", 3));
+    for (const std::string& name : names) {
+      const bool bus = pick(2) == 0;
+      ports.push_back({name.c_str(), bus ? 1 : -1, bus ? 0 : -1, "IOBN"[pick(4)]});
+    }
+    std::vector<std::string> mapped(ports.size());
+    std::string templateText;
+    std::string expected;
+    bool foldCase = false;
+    for (int step = 0; step < 30; ++step) {
+      const unsigned what = pick(8);
+      if (what == 0) {
+        foldCase = !foldCase;
+        templateText += foldCase ? "@SET CASESENSITIVEIF=OFF@" : "@SET CASESENSITIVEIF=ON@";
+      } else if (what == 1) {
+        const std::string from = randomName("aAbc", 4);
+        const std::string to = "m" + std::to_string(step);
+        templateText += "@MAPSIGNAL " + from + " TO " + to + "@";
+        for (size_t i = 0; i < ports.size(); ++i) {
+          if (names[i] == from) {
+            mapped[i] = to;
+            break;
+          }
+        }
+      } else {
+        const int kind = kinds[pick(static_cast<unsigned>(kinds.size()))];
+        const std::string pattern = pick(6) == 0 ? "*" : randomName("aAb?", 4);
+        const PortKind& selection = *portKindFor(kind);
+        bool found = false;
+        for (size_t i = 0; i < ports.size(); ++i) {
+          bool same = names[i].size() == pattern.size();
+          for (size_t c = 0; same && c < pattern.size(); ++c) {
+            const auto fold = [foldCase](char x) {
+              return foldCase ? static_cast<char>(std::tolower(static_cast<unsigned char>(x))) : x;
+            };
+            same = pattern[c] == '?' || fold(pattern[c]) == fold(names[i][c]);
+          }
+          if ((pattern == "*" || same) && selection.selects(ports[i].dir, ports[i].left != -1))
+            found = true;
+        }
+        std::string word(keywordWord(kind).substr(1));
+        word.pop_back();
+        templateText += "@IFHAS " + word + "=" + pattern + "@1@ENDIF@@IFNHAS " + word + "=" +
+                        pattern + "@0@ENDIF@";
+        expected += found ? "1" : "0";
+      }
+    }
+    std::string list;
+    for (size_t i = 0; i < ports.size(); ++i)
+      list += (i > 0 ? "," : "") + (mapped[i].empty() ? names[i] : mapped[i]);
+    const std::string whole = templateText + "@SET SIGDELIM=,@@MAP@%signal%";
+    EXPECT_EQ(runTemplate(whole, ports).output, expected + list) << whole;
+    // Replayed in an iteration, every pass sees the same answers.
+    const std::string body =
+        "@SET SIGDELIM=|@@ITERATE@%SIGNAL%@SET CASESENSITIVEIF=ON@" + templateText + "@ENDITERATE@";
+    std::string passes;
+    for (size_t i = 0; i < ports.size(); ++i) passes += (i > 0 ? "|" : "") + expected;
+    EXPECT_EQ(runTemplate(body, ports).output, passes) << body;
+  }
+}
+
+TEST(TokenReader, TokenLengthIsBounded) {
+  const std::string limit(TokenReader::kMaxTokenSize, 'x');
+  const std::string tooLong = handlers_test::errorAt(
+      1, "Token: the token that starts on line 1 is longer than the limit of 16777216 bytes "
+         "(16 MB).");
+  struct BoundRow {
+    std::string templateText;
+    size_t outputSize;
+    std::string message;
+  };
+  const BoundRow rows[] = {
+      {limit, limit.size(), handlers_test::kNoError},
+      {limit + "x", 0, tooLong},
+      {"a\n%" + limit + "%", 2,
+       handlers_test::errorAt(2, "Token: the token that starts on line 2 is longer than the "
+                                 "limit of 16777216 bytes (16 MB).")},
+      {"@ITERATE@%" + limit, 0, tooLong},
+      {"@ITERATE@%PORT%" + limit + "x@ENDITERATE@", 0, tooLong},
+  };
+  for (const BoundRow& row : rows) {
+    const handlers_test::Run run = runTemplate(row.templateText, {{"a", -1, -1, 'I'}});
+    EXPECT_EQ(run.output.size(), row.outputSize) << row.templateText.substr(0, 20);
+    EXPECT_EQ(run.message, row.message) << row.templateText.substr(0, 20);
+  }
 }
 
 TEST(Output, FailedWriteStopsWithoutMessage) {

@@ -4,6 +4,7 @@
 
 #include <cstdint>
 #include <cstdio>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -49,11 +50,13 @@ inline void fillPorts(StbDataList& data, const std::vector<PortSpec>& ports) {
   for (const PortSpec& p : ports) data.appendOwned(new PortRecord(p.name, p.left, p.right, p.dir));
 }
 
-/// Expands `templateText` over `ports` with a fresh processor (module "top", ext "vhd").
-inline Run runTemplate(std::string_view templateText, const std::vector<PortSpec>& ports,
-                       bool traced = false) {
-  StbDataList data("prj", "top", "out.vhd", "vhd", "pinforge", "", "title", "date");
-  fillPorts(data, ports);
+/// Design data with the header values every run here uses (module "top", ext "vhd").
+inline StbDataList* newDesignData() {
+  return new StbDataList("prj", "top", "out.vhd", "vhd", "pinforge", "", "title", "date");
+}
+
+/// Expands `templateText` over `data` with a fresh processor.
+inline Run runOn(std::string_view templateText, StbDataList& data, bool traced = false) {
   std::FILE* in = fileWith(templateText);
   std::FILE* out = std::tmpfile();
   std::FILE* debug = traced ? std::tmpfile() : nullptr;
@@ -71,6 +74,14 @@ inline Run runTemplate(std::string_view templateText, const std::vector<PortSpec
   std::fclose(out);
   std::fclose(in);
   return run;
+}
+
+/// Expands `templateText` over `ports` with a fresh processor (module "top", ext "vhd").
+inline Run runTemplate(std::string_view templateText, const std::vector<PortSpec>& ports,
+                       bool traced = false) {
+  const std::unique_ptr<StbDataList> data(newDesignData());
+  fillPorts(*data, ports);
+  return runOn(templateText, *data, traced);
 }
 
 /// The message recorded for a template error on `line`.

@@ -62,8 +62,13 @@ void onSignal(int number) {
   stopChildGroup();
   for (Slot& slot : g_Slots)
     if (slot.used) ::unlink(slot.path);
-  // End with the signal's own status, as the caller of a killed program expects.
+  // End with the signal's own status, as the caller of a killed program expects. The signal
+  // is blocked while its handler runs, so it is unblocked for the default action to take it.
   ::signal(number, SIG_DFL);
+  sigset_t own;
+  sigemptyset(&own);
+  sigaddset(&own, number);
+  ::sigprocmask(SIG_UNBLOCK, &own, nullptr);
   ::raise(number);
   ::_exit(128 + number);
 }

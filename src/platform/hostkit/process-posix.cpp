@@ -1,14 +1,16 @@
-// Child processes on a POSIX system: the command line is split into words without a shell,
-// the child is spawned with its standard output and standard error on pipes, and both pipes
-// are drained together until the child closes them, so neither can fill up and stall it.
+// Child processes on a POSIX system: the child is spawned in a process group of its own with
+// its standard output and standard error on pipes, and both pipes are drained together until
+// the child closes them, so neither can fill up and stall it.
 #include <fcntl.h>
 #include <poll.h>
+#include <signal.h>
 #include <spawn.h>
+#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
 #include <cerrno>
-#include <memory>
+#include <cstdlib>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -22,34 +24,16 @@ namespace {
 constexpr int kNotStarted = -1;
 constexpr int kSignalBase = 128;
 
-// Blanks and tabs separate words; a double-quoted stretch keeps its blanks and loses its quotes.
-std::vector<std::string> splitCommandLine(std::string_view line) {
-  std::vector<std::string> words;
-  std::string word;
-  bool inWord = false;
-  bool quoted = false;
-  for (char c : line) {
-    if (c == '"') {
-      quoted = !quoted;
-      inWord = true;
-    } else if (!quoted && (c == ' ' || c == '\t')) {
-      if (inWord) words.push_back(std::move(word));
-      word.clear();
-      inWord = false;
-    } else {
-      word.push_back(c);
-      inWord = true;
-    }
-  }
-  if (inWord) words.push_back(std::move(word));
-  return words;
+bool isExecutableFile(const std::string& path) {
+  struct stat status {};
+  return ::stat(path.c_str(), &status) == 0 && S_ISREG(status.st_mode) &&
+         ::access(path.c_str(), X_OK) == 0;
 }
 
 // A file descriptor that closes itself.
 class Descriptor {
  public:
   Descriptor() = default;
-  explicit Descriptor(int fd) : m_Fd(fd) {}
   Descriptor(const Descriptor&) = delete;
   Descriptor& operator=(const Descriptor&) = delete;
   ~Descriptor() { reset(); }
@@ -75,7 +59,8 @@ struct Pipe {
   }
 };
 
-// The spawn attributes of the child: stdin from /dev/null, stdout and stderr on the pipes.
+// The file actions of the child: stdin from /dev/null, stdout and stderr on the pipes, and
+// every other descriptor closed, so the child cannot hold our output or error file open.
 class SpawnActions {
  public:
   SpawnActions() { m_Valid = ::posix_spawn_file_actions_init(&m_Actions) == 0; }
@@ -89,7 +74,8 @@ class SpawnActions {
            ::posix_spawn_file_actions_addopen(&m_Actions, STDIN_FILENO, "/dev/null", O_RDONLY,
                                               0) == 0 &&
            ::posix_spawn_file_actions_adddup2(&m_Actions, outWrite, STDOUT_FILENO) == 0 &&
-           ::posix_spawn_file_actions_adddup2(&m_Actions, errWrite, STDERR_FILENO) == 0;
+           ::posix_spawn_file_actions_adddup2(&m_Actions, errWrite, STDERR_FILENO) == 0 &&
+           ::posix_spawn_file_actions_addclosefrom_np(&m_Actions, STDERR_FILENO + 1) == 0;
   }
   const posix_spawn_file_actions_t* get() const { return &m_Actions; }
 
@@ -98,27 +84,54 @@ class SpawnActions {
   bool m_Valid = false;
 };
 
-// Hands each read piece on as NUL-terminated text; a NUL inside the output ends a piece.
-class Forwarder {
+// The attributes of the child: a process group of its own, so that stopping it on a signal
+// also stops what it started, and the signal mask we had before the spawn.
+class SpawnAttributes {
  public:
-  explicit Forwarder(Host::ChildOutput* receiver) : m_Receiver(receiver) {}
-  void deliver(const char* data, size_t length) {
-    size_t start = 0;
-    while (m_Receiver != nullptr && start < length) {
-      std::string_view rest(data + start, length - start);
-      const size_t end = rest.find('\0');
-      const std::string piece(rest.substr(0, end));
-      start += piece.size() + 1;
-      if (!piece.empty() && !m_Receiver->OnOutput(piece.c_str())) m_Receiver = nullptr;
-    }
+  explicit SpawnAttributes(const sigset_t& mask) {
+    m_Initialised = ::posix_spawnattr_init(&m_Attributes) == 0;
+    m_Valid = m_Initialised &&
+              ::posix_spawnattr_setflags(&m_Attributes,
+                                         POSIX_SPAWN_SETPGROUP | POSIX_SPAWN_SETSIGMASK) == 0 &&
+              ::posix_spawnattr_setpgroup(&m_Attributes, 0) == 0 &&
+              ::posix_spawnattr_setsigmask(&m_Attributes, &mask) == 0;
   }
+  SpawnAttributes(const SpawnAttributes&) = delete;
+  SpawnAttributes& operator=(const SpawnAttributes&) = delete;
+  ~SpawnAttributes() {
+    if (m_Initialised) ::posix_spawnattr_destroy(&m_Attributes);
+  }
+  bool valid() const { return m_Valid; }
+  const posix_spawnattr_t* get() const { return &m_Attributes; }
 
  private:
-  Host::ChildOutput* m_Receiver;
+  posix_spawnattr_t m_Attributes{};
+  bool m_Initialised = false;
+  bool m_Valid = false;
 };
 
-// Reads both pipes until each has reached its end.
-void drain(Descriptor& out, Descriptor& err, Forwarder& forwarder) {
+// Holds back SIGINT, SIGTERM and SIGHUP between the spawn and the child's registration: a
+// signal in that gap would end us and leave the child running unseen.
+class HeldSignals {
+ public:
+  HeldSignals() {
+    sigset_t held;
+    sigemptyset(&held);
+    for (int number : {SIGINT, SIGTERM, SIGHUP}) sigaddset(&held, number);
+    ::pthread_sigmask(SIG_BLOCK, &held, &m_Previous);
+  }
+  HeldSignals(const HeldSignals&) = delete;
+  HeldSignals& operator=(const HeldSignals&) = delete;
+  ~HeldSignals() { ::pthread_sigmask(SIG_SETMASK, &m_Previous, nullptr); }
+  const sigset_t& previous() const { return m_Previous; }
+
+ private:
+  sigset_t m_Previous;
+};
+
+// Reads both pipes until each has reached its end. Once the receiver declines, the output is
+// still read, so the child never blocks on a full pipe, but no longer passed on.
+void drain(Descriptor& out, Descriptor& err, Host::ChildOutput* receiver) {
   char buffer[65536];
   while (out.get() >= 0 || err.get() >= 0) {
     pollfd watched[2] = {{out.get(), POLLIN, 0}, {err.get(), POLLIN, 0}};
@@ -133,10 +146,13 @@ void drain(Descriptor& out, Descriptor& err, Forwarder& forwarder) {
     for (int i = 0; i < 2; ++i) {
       if (watched[i].fd < 0 || watched[i].revents == 0) continue;
       const ssize_t got = ::read(watched[i].fd, buffer, sizeof buffer);
-      if (got > 0)
-        forwarder.deliver(buffer, static_cast<size_t>(got));
-      else if (got == 0 || errno != EINTR)
+      if (got > 0) {
+        if (receiver != nullptr &&
+            !receiver->OnOutput(std::string_view(buffer, static_cast<size_t>(got))))
+          receiver = nullptr;
+      } else if (got == 0 || errno != EINTR) {
         descriptors[i]->reset();
+      }
     }
   }
 }
@@ -151,7 +167,7 @@ int waitFor(pid_t child) {
 }
 
 int spawnAndCollect(const std::vector<std::string>& words, Host::ChildOutput* receiver) {
-  if (words.empty()) return kNotStarted;
+  if (words.empty() || words[0].empty()) return kNotStarted;
   Pipe out;
   Pipe err;
   SpawnActions actions;
@@ -160,27 +176,55 @@ int spawnAndCollect(const std::vector<std::string>& words, Host::ChildOutput* re
   std::vector<char*> argv;
   for (const std::string& word : words) argv.push_back(const_cast<char*>(word.c_str()));
   argv.push_back(nullptr);
+  Host::Interrupt::install();
   pid_t child = 0;
-  if (::posix_spawnp(&child, argv[0], actions.get(), nullptr, argv.data(), environ) != 0)
-    return kNotStarted;
+  {
+    HeldSignals held;
+    const SpawnAttributes attributes(held.previous());
+    if (!attributes.valid() ||
+        ::posix_spawn(&child, argv[0], actions.get(), attributes.get(), argv.data(), environ) !=
+            0)
+      return kNotStarted;
+    Host::Interrupt::setChildGroup(child);
+  }
   // Only the child may hold the writing ends, or the pipes would never report their end.
   out.write.reset();
   err.write.reset();
-  Forwarder forwarder(receiver);
-  drain(out.read, err.read, forwarder);
-  return waitFor(child);
+  drain(out.read, err.read, receiver);
+  const int status = waitFor(child);
+  Host::Interrupt::setChildGroup(0);
+  return status;
 }
 
 }  // namespace
 
 namespace Host {
 
-int Process::RunNoWindow(const char* commandLine, std::unique_ptr<ChildOutput> receiver,
-                         unsigned /*flags*/, bool /*hideWindow*/, bool /*captureOutput*/,
-                         bool /*detach*/) {
-  const int status =
-      commandLine != nullptr ? spawnAndCollect(splitCommandLine(commandLine), receiver.get())
-                             : kNotStarted;
+std::string Process::findProgram(std::string_view name) {
+  if (name.empty() || name.find('/') != std::string_view::npos) return std::string();
+  const std::string exeDir = File::executableDirectory();
+  if (!exeDir.empty() && isExecutableFile(exeDir + '/' + std::string(name)))
+    return exeDir + '/' + std::string(name);
+  const char* path = std::getenv("PATH");
+  std::string_view rest = path != nullptr ? path : "";
+  while (!rest.empty()) {
+    const size_t colon = rest.find(':');
+    const std::string_view dir = rest.substr(0, colon);
+    // An empty or relative entry means the current folder; a program is never taken from there.
+    if (dir.starts_with('/')) {
+      std::string candidate(dir);
+      candidate += '/';
+      candidate += name;
+      if (isExecutableFile(candidate)) return candidate;
+    }
+    if (colon == std::string_view::npos) break;
+    rest.remove_prefix(colon + 1);
+  }
+  return std::string();
+}
+
+int Process::run(const std::vector<std::string>& argv, ChildOutput* receiver) {
+  const int status = spawnAndCollect(argv, receiver);
   if (receiver != nullptr) receiver->OnEnd();
   return status;
 }

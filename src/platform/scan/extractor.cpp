@@ -7,29 +7,6 @@
 #include "platform/scan/common/diagnostics.h"
 #include "platform/scan/language_reader.h"
 
-ScanPort::ScanPort(std::string name, std::string typeName, int direction, int sourceLine)
-    : m_Name(std::move(name)),
-      m_TypeName(std::move(typeName)),
-      m_Direction(direction),
-      m_SourceLine(sourceLine) {}
-
-void ScanPort::setRange(int32_t left, int32_t right, bool ascending) {
-  m_HasRange = true;
-  m_Left = left;
-  m_Right = right;
-  m_Ascending = ascending;
-}
-
-const ScanPort* ScanPortList::firstPort() const {
-  return m_Ports.empty() ? nullptr : m_Ports.data();
-}
-
-const ScanPort* ScanPortList::nextPort(const ScanPort* port) const {
-  if (port == nullptr) return nullptr;
-  const ScanPort* next = port + 1;
-  return next < m_Ports.data() + m_Ports.size() ? next : nullptr;
-}
-
 ScanExtractor::ScanExtractor() : m_Diagnostics(std::make_unique<scan::Diagnostics>(stderr)) {}
 
 ScanExtractor::~ScanExtractor() = default;
@@ -49,6 +26,10 @@ int ScanExtractor::Parse(Language language) {
                                  : scan::makeVhdlReader(*m_Diagnostics, m_Settings);
   m_Reader->indexFiles(m_Files);
   return static_cast<int>(m_Diagnostics->errorCount());
+}
+
+const std::vector<std::string>& ScanExtractor::unreadableFiles() const {
+  return m_Diagnostics->unreadableFiles();
 }
 
 int ScanExtractor::findDesignUnit(const char* library, const char* unit, DesignUnitSearch search) {

@@ -79,6 +79,7 @@ void Diagnostics::warning(const SourceBuffer& source, size_t offset, std::string
 }
 
 void Diagnostics::fileError(std::string_view path, std::string_view text) {
+  m_UnreadableFiles.emplace_back(path);
   report({Severity::Error, nullptr, std::string(path), 0, std::string(text)});
 }
 

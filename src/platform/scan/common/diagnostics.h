@@ -6,6 +6,7 @@
 #include <cstdio>
 #include <string>
 #include <string_view>
+#include <vector>
 
 namespace scan {
 
@@ -29,11 +30,14 @@ class Diagnostics {
   void report(const Diagnostic& diagnostic);
   void error(const SourceBuffer& source, size_t offset, std::string_view text);
   void warning(const SourceBuffer& source, size_t offset, std::string_view text);
-  /// "file: error: text" for a file that cannot be read at all.
+  /// "file: error: text" for a design file that cannot be read at all; the path is also
+  /// kept for unreadableFiles().
   void fileError(std::string_view path, std::string_view text);
 
   size_t errorCount() const { return m_Errors; }
   size_t warningCount() const { return m_Warnings; }
+  /// The paths given to fileError, in order; a run with any of them has failed.
+  const std::vector<std::string>& unreadableFiles() const { return m_UnreadableFiles; }
 
   /// The printed form of one message, without the cap; exposed for tests.
   static std::string format(const Diagnostic& diagnostic);
@@ -44,6 +48,7 @@ class Diagnostics {
   size_t m_Printed = 0;
   size_t m_Errors = 0;
   size_t m_Warnings = 0;
+  std::vector<std::string> m_UnreadableFiles;
 };
 
 }  // namespace scan

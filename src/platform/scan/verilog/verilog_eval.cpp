@@ -50,6 +50,11 @@ bool Evaluator::fail(std::string text) {
   return false;
 }
 
+bool Evaluator::failAt(Unresolved::Kind kind, const std::string& name, std::string text) {
+  if (m_Error.empty()) m_Unresolved = {kind, name};
+  return fail(std::move(text));
+}
+
 bool Evaluator::toInteger(const Value& value, int64_t& out) {
   if (value.isReal()) {
     double r = std::round(value.asReal());
@@ -66,6 +71,7 @@ bool Evaluator::toInteger(const Value& value, int64_t& out) {
 
 bool Evaluator::evaluate(const Expr& expr, Scope& scope, Value& out) {
   m_Error.clear();
+  m_Unresolved = {};
   m_Steps = 0;
   m_Depth = 0;
   return eval(expr, scope, nullptr, out);
@@ -222,7 +228,9 @@ bool Evaluator::evalParameter(const std::string& name, Parameter& parameter, Sco
     return true;
   }
   if (parameter.isType) return fail("'" + name + "' is a type, not a value");
-  if (!parameter.value) return fail("parameter '" + name + "' has no value");
+  if (!parameter.value)
+    return failAt(Unresolved::Kind::ParameterWithoutValue, name,
+                  "parameter '" + name + "' has no value");
   if (parameter.busy) return fail("parameter '" + name + "' depends on itself");
   parameter.busy = true;
   bool ok = eval(*parameter.value, owner, nullptr, out);
@@ -251,7 +259,9 @@ bool Evaluator::evalName(const Expr& expr, Scope& scope, Locals* locals, Value& 
   Parameter* parameter = nullptr;
   if (!expr.scope.empty()) {
     Scope* package = m_Scopes.package(expr.scope);
-    if (!package) return fail("unknown package '" + expr.scope + "'");
+    if (!package)
+      return failAt(Unresolved::Kind::UnknownPackage, expr.scope,
+                    "unknown package '" + expr.scope + "'");
     auto it = package->parameters.find(expr.name);
     if (it != package->parameters.end()) {
       owner = package;
@@ -261,8 +271,9 @@ bool Evaluator::evalName(const Expr& expr, Scope& scope, Locals* locals, Value& 
     parameter = findParameter(expr.name, scope, owner);
   }
   if (!parameter)
-    return fail("unknown name '" + (expr.scope.empty() ? "" : expr.scope + "::") + expr.name +
-                "'");
+    return failAt(Unresolved::Kind::UnknownName, expr.name,
+                  "unknown name '" + (expr.scope.empty() ? "" : expr.scope + "::") + expr.name +
+                      "'");
   return evalParameter(expr.name, *parameter, *owner, out);
 }
 

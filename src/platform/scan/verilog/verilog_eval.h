@@ -26,6 +26,16 @@ class Evaluator {
 
   const std::string& error() const { return m_Error; }
 
+  /// What the last failed evaluate or integer call stopped at, when it was a name: a
+  /// parameter without value, or a package or name declared nowhere. Messages use it to say
+  /// how to fix the failure.
+  struct Unresolved {
+    enum class Kind { None, ParameterWithoutValue, UnknownPackage, UnknownName };
+    Kind kind = Kind::None;
+    std::string name;
+  };
+  const Unresolved& unresolved() const { return m_Unresolved; }
+
  private:
   using Locals = std::unordered_map<std::string, Value>;
   enum class Flow { Normal, Return };
@@ -41,6 +51,7 @@ class Evaluator {
   bool runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flow);
   bool toInteger(const Value& value, int64_t& out);
   bool fail(std::string text);
+  bool failAt(Unresolved::Kind kind, const std::string& name, std::string text);
 
   Parameter* findParameter(const std::string& name, Scope& scope, Scope*& owner);
   Function* findFunction(const std::string& name, Scope& scope, Scope*& owner);
@@ -50,6 +61,7 @@ class Evaluator {
 
   ScopeProvider& m_Scopes;
   std::string m_Error;
+  Unresolved m_Unresolved;
   size_t m_Steps = 0;
   int m_Depth = 0;
   std::string m_ReturnName;

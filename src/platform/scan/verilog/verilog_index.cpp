@@ -59,9 +59,7 @@ class IndexWalk {
   bool m_HasPending = false;
 };
 
-namespace {
-
-const char* kindName(UnitKind kind) {
+const char* unitKindName(UnitKind kind) {
   switch (kind) {
     case UnitKind::Module: return "module";
     case UnitKind::Interface: return "interface";
@@ -70,6 +68,8 @@ const char* kindName(UnitKind kind) {
   }
   return "module";
 }
+
+namespace {
 
 const char* wordName(Word word) {
   switch (word) {
@@ -182,7 +182,7 @@ void IndexWalk::registerName(DesignIndex::NameMap& names, size_t unit, const Tok
   if (at.source)
     m_Index.m_Diagnostics.warning(
         *at.source, at.offset,
-        std::string(kindName(record.kind)) + " '" + record.name + "' is already declared at " +
+        std::string(unitKindName(record.kind)) + " '" + record.name + "' is already declared at " +
             where + "; the first declaration is used");
 }
 
@@ -191,13 +191,14 @@ void IndexWalk::unit(UnitKind kind, Word end, const Token& keyword) {
   record.kind = kind;
   record.library = m_Library;
   record.start = placeOf(keyword);
+  record.unitScopeBefore = m_Index.m_UnitScope.size();
   Token name;
   bool named = read(name);
   if (named && name.kind == TokenKind::Identifier &&
       (classify(name.text) == Word::Static || classify(name.text) == Word::Automatic))
     named = read(name);
   if (!named || name.kind != TokenKind::Identifier) {
-    error(keyword, std::string("expected a name after '") + kindName(kind) + "'");
+    error(keyword, std::string("expected a name after '") + unitKindName(kind) + "'");
     if (named) unread(name);
   } else {
     record.name.assign(name.text);
@@ -207,7 +208,7 @@ void IndexWalk::unit(UnitKind kind, Word end, const Token& keyword) {
   if (!m_Index.m_Units[index].name.empty())
     registerName(kind == UnitKind::Package ? m_Index.m_Packages : m_Index.m_Designs, index, name);
   if (!body(index, end))
-    error(keyword, std::string("missing ") + wordName(end) + " for " + kindName(kind) + " '" +
+    error(keyword, std::string("missing ") + wordName(end) + " for " + unitKindName(kind) + " '" +
                        m_Index.m_Units[index].name + "'");
 }
 

@@ -37,7 +37,13 @@ struct UnitRecord {
   Place start;  ///< the unit's keyword
   /// Body statements that may declare ports, parameters, types, functions or imports.
   std::vector<Place> declarations;
+  /// How many compilation-unit declarations came before the unit: the file-level imports
+  /// among them apply to it.
+  size_t unitScopeBefore = 0;
 };
+
+/// "module", "interface", "program" or "package".
+const char* unitKindName(UnitKind kind);
 
 class DesignIndex {
  public:
@@ -51,6 +57,8 @@ class DesignIndex {
   const UnitRecord* findPackage(std::string_view name) const;
   /// Declarations outside every unit (the compilation-unit scope).
   const std::vector<Place>& unitScope() const { return m_UnitScope; }
+  /// Every unit met, in file order, duplicates included.
+  const std::vector<UnitRecord>& units() const { return m_Units; }
 
  private:
   struct Hash {

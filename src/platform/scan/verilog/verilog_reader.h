@@ -1,5 +1,6 @@
 // The Verilog/SystemVerilog reader behind the extractor: the index pass over all files as one
-// compilation unit, then the selected unit's header parse and range evaluation on demand.
+// compilation unit, then the selected unit's description on demand: its parameters (with the
+// command line's overrides), ports, declared types and package imports.
 #pragma once
 
 #include <memory>
@@ -15,9 +16,13 @@
 
 namespace scan::verilog {
 
+class Evaluator;
+class UnitReader;
+struct UnitModel;
+
 class VerilogReader final : public LanguageReader, private ScopeProvider {
  public:
-  explicit VerilogReader(Diagnostics& diagnostics);
+  explicit VerilogReader(Diagnostics& diagnostics, ScanSettings settings = {});
   ~VerilogReader() override;
 
   void indexFiles(const std::vector<DesignFileEntry>& files) override;
@@ -31,8 +36,14 @@ class VerilogReader final : public LanguageReader, private ScopeProvider {
   Scope* package(const std::string& name) override;
   Scope* compilationUnit() override;
   void prepare(std::vector<std::string> designDirectories);
+  void defineMacros();
+  bool applyOverrides(UnitModel& model, UnitReader& reader);
+  std::vector<ScanGeneric> describeParameters(UnitModel& model, Evaluator& evaluator);
+  std::vector<std::string> missingPackages(const UnitModel& model);
+  std::string context(const UnitModel& model, UnitReader& reader);
 
   Diagnostics& m_Diagnostics;
+  ScanSettings m_Settings;
   MacroTable m_Macros;
   std::unique_ptr<SourceStore> m_Sources;
   std::unique_ptr<DesignIndex> m_Index;

@@ -6,6 +6,7 @@
 #include <optional>
 #include <string>
 #include <unordered_map>
+#include <unordered_set>
 #include <vector>
 
 #include "platform/scan/common/value.h"
@@ -28,6 +29,7 @@ struct Scope {
   bool isCompilationUnit = false;
   std::unordered_map<std::string, Parameter> parameters;
   std::unordered_map<std::string, std::shared_ptr<TypeSpec>> typedefs;
+  std::unordered_set<std::string> unpackedTypedefs;  ///< typedefs with unpacked dimensions
   std::unordered_map<std::string, std::shared_ptr<Function>> functions;
   std::vector<std::string> wildcardImports;               ///< import pkg::*
   std::unordered_map<std::string, std::string> namedImports;  ///< name -> package

@@ -5,8 +5,10 @@
 
 #include "platform/scan.h"
 #include "platform/scan/common/diagnostics.h"
+#include "platform/scan/common/source_buffer.h"
 #include "platform/scan/verilog/verilog_parser.h"
 #include "platform/scan/verilog/verilog_preprocessor.h"
+#include "platform/scan/verilog/verilog_text.h"
 
 namespace scan::verilog {
 
@@ -77,12 +79,22 @@ bool startsAnsiPort(Parser& parser) {
   }
 }
 
-void readImports(Parser& parser, Scope& scope) {
+// A name as it must be written back: an escaped name needs the blank that ends it.
+std::string nameText(std::string_view name) {
+  std::string text(name);
+  if (!text.empty() && text.front() == '\\') text += ' ';
+  return text;
+}
+
+// `import a::*, b::x;` (the keyword already taken). With `written`, the statement is also
+// written back in one canonical spelling, which holds no macro uses.
+void readImports(Parser& parser, Scope& scope, std::vector<std::string>* written = nullptr) {
   TokenStream& tokens = parser.tokens();
   if (tokens.peek().kind == TokenKind::String) {  // DPI import
     parser.skipStatement();
     return;
   }
+  std::string text = "import ";
   do {
     if (tokens.peek().kind != TokenKind::Identifier) {
       parser.fail("expected a package name after 'import'");
@@ -90,36 +102,71 @@ void readImports(Parser& parser, Scope& scope) {
     }
     std::string package(tokens.take().text);
     if (!parser.expectSymbol("::")) return;
+    if (text.size() > 7) text += ", ";
+    text += nameText(package) + "::";
     if (tokens.acceptSymbol("*")) {
       scope.wildcardImports.push_back(package);
+      text += '*';
     } else if (tokens.peek().kind == TokenKind::Identifier) {
-      scope.namedImports.emplace(std::string(tokens.take().text), package);
+      std::string name(tokens.take().text);
+      text += nameText(name);
+      scope.namedImports.emplace(std::move(name), package);
     } else {
       parser.fail("expected a name or '*' after '::'");
       return;
     }
   } while (tokens.acceptSymbol(","));
-  parser.expectSymbol(";");
+  if (parser.expectSymbol(";") && written) written->push_back(text + ";");
 }
 
-// A parameter list, up to (not including) the closing ')' or ';'.
-void readParameters(Parser& parser, Scope& scope) {
+// A type written as a value (`parameter type T = word_t`, `-g T=...`): a bare type name is
+// no declaration here, so nothing follows it.
+bool typeValue(Parser& parser, TypeSpec& type) {
+  TokenStream& tokens = parser.tokens();
+  if (parser.dataType(type)) return true;
+  if (parser.failed() || tokens.peek().kind != TokenKind::Identifier ||
+      classify(tokens.peek().text) != Word::None)
+    return false;
+  type.base = TypeSpec::Base::Named;
+  type.name.assign(tokens.take().text);
+  if (tokens.acceptSymbol("::")) {
+    if (tokens.peek().kind != TokenKind::Identifier) return false;
+    type.scope = type.name;
+    type.name.assign(tokens.take().text);
+  }
+  type.written = type.name;
+  parser.dimensions(type.packed);
+  return !parser.failed();
+}
+
+// A parameter list, up to (not including) the closing ')' or ';'. `local` says whether
+// entries before any keyword are localparams; the overridable ones go to `declared` when
+// it is given.
+void readParameters(Parser& parser, Scope& scope, bool local = false,
+                    std::vector<ParameterDeclaration>* declared = nullptr) {
   TokenStream& tokens = parser.tokens();
   std::shared_ptr<TypeSpec> type;
+  std::string typeText;
   bool isType = false;
   for (;;) {
     Word word = tokens.peekWord();
     if (word == Word::Parameter || word == Word::Localparam) {
       tokens.take();
+      local = word == Word::Localparam;
       type.reset();
+      typeText.clear();
       isType = false;
     }
+    Token typeStart = tokens.peek();
     if (tokens.acceptWord(Word::Type)) {
       isType = true;
       type.reset();
+      typeText = "type";
     } else {
       TypeSpec written;
       if (parser.dataType(written)) {
+        typeText = writtenBetween(typeStart, tokens.peek());
+        if (typeText.empty()) typeText = written.written;
         type = std::make_shared<TypeSpec>(std::move(written));
         isType = false;
       }
@@ -129,25 +176,34 @@ void readParameters(Parser& parser, Scope& scope) {
       parser.fail("expected a parameter name");
       return;
     }
-    std::string name(tokens.take().text);
+    Token nameToken = tokens.take();
+    std::string name(nameToken.text);
     std::vector<Dimension> unpacked;
     parser.dimensions(unpacked);
     Parameter parameter;
     parameter.type = type;
     parameter.isType = isType;
+    std::string defaultText;
     if (tokens.acceptSymbol("=")) {
+      Token valueStart = tokens.peek();
       if (isType) {
         auto value = std::make_shared<TypeSpec>();
-        if (!parser.dataType(*value)) {
+        if (!typeValue(parser, *value)) {
           parser.fail("expected a type after '='");
           return;
         }
         parameter.typeValue = value;
+        defaultText = writtenBetween(valueStart, tokens.peek());
+        if (defaultText.empty()) defaultText = value->written;
       } else {
         parameter.value = parser.expression();
         if (!parameter.value) return;
+        defaultText = writtenBetween(valueStart, tokens.peek());
       }
     }
+    if (declared && !local)
+      declared->push_back({name, isType, typeText, std::move(defaultText), nameToken.source,
+                           nameToken.offset});
     scope.parameters.emplace(std::move(name), std::move(parameter));
     if (!tokens.acceptSymbol(",")) return;
   }
@@ -163,7 +219,9 @@ void readTypedef(Parser& parser, Scope& scope) {
   std::string name(tokens.take().text);
   std::vector<Dimension> unpacked;
   parser.dimensions(unpacked);
-  if (parser.expectSymbol(";")) scope.typedefs.emplace(std::move(name), std::move(type));
+  if (!parser.expectSymbol(";")) return;
+  if (!unpacked.empty()) scope.unpackedTypedefs.insert(name);
+  scope.typedefs.emplace(std::move(name), std::move(type));
 }
 
 // The declarations any scope may hold; false when the statement is something else.
@@ -200,6 +258,7 @@ void readAnsiPorts(Parser& parser, UnitModel& model) {
     int direction = directionOf(tokens.peekWord());
     if (direction) tokens.take();
     bool hasType = false;
+    Token typeStart = tokens.peek();
     if (tokens.acceptWord(Word::Interface)) {
       port.type.base = TypeSpec::Base::Named;
       port.type.isInterface = true;
@@ -217,12 +276,17 @@ void readAnsiPorts(Parser& parser, UnitModel& model) {
       parser.fail("expected a port name");
       return;
     }
+    if (hasType) {
+      port.typeText = writtenBetween(typeStart, name);
+      if (port.typeText.empty()) port.typeText = port.type.written;
+    }
     port.name.assign(name.text);
     port.source = name.source;
     port.offset = name.offset;
     tokens.take();
     std::vector<Dimension> unpacked;
     parser.dimensions(unpacked);
+    port.unpacked = !unpacked.empty();
     if (tokens.acceptSymbol("=") && !parser.expression()) return;
     if (port.type.isInterface) {
       port.direction = ScanPort::InterfacePort;
@@ -231,6 +295,7 @@ void readAnsiPorts(Parser& parser, UnitModel& model) {
     } else if (!hasType && previous) {
       port.direction = previous->direction;
       port.type = previous->type;
+      port.typeText = previous->typeText;
       port.maybeInterface = previous->maybeInterface;
     } else {
       port.direction = previous ? previous->direction : ScanPort::Inout;
@@ -287,7 +352,7 @@ void readNonAnsiList(Parser& parser, UnitModel& model) {
     }
     if (tokens.peek().isSymbol(")")) return;
     PortReference ref;
-    const Token& at = tokens.peek();
+    const Token at = tokens.peek();
     ref.source = at.source;
     ref.offset = at.offset;
     if (tokens.acceptSymbol(".")) {
@@ -304,6 +369,7 @@ void readNonAnsiList(Parser& parser, UnitModel& model) {
       if (!readPortExpression(parser, ref)) return;
       if (!concatenation) ref.name = ref.members[0].signal;
     }
+    ref.text = writtenBetween(at, tokens.peek());
     model.headerList.push_back(std::move(ref));
     if (!tokens.acceptSymbol(",")) return;
   }
@@ -315,13 +381,14 @@ void readHeader(Parser& parser, UnitModel& model) {
   if (!tokens.acceptWord(Word::Static)) tokens.acceptWord(Word::Automatic);
   model.scope.name.assign(tokens.take().text);
   while (tokens.acceptWord(Word::Import)) {
-    readImports(parser, model.scope);
+    readImports(parser, model.scope, &model.imports);
     if (parser.failed()) return;
   }
   if (tokens.acceptSymbol("#")) {
+    model.parameterList = true;
     if (!parser.expectSymbol("(")) return;
     if (!tokens.acceptSymbol(")")) {
-      readParameters(parser, model.scope);
+      readParameters(parser, model.scope, false, &model.parameters);
       if (parser.failed() || !parser.expectSymbol(")")) return;
     }
   }
@@ -339,12 +406,24 @@ void readHeader(Parser& parser, UnitModel& model) {
 }
 
 // Body statements of a unit: scope items, and for non-ANSI headers the port declarations
-// and the net or variable declarations of the listed names.
+// and the net or variable declarations of the listed names. A unit without a `#(...)` list
+// is parameterised by its body's parameters; the imports of a non-ANSI body are part of the
+// context its port declarations need.
 void readBodyItem(Parser& parser, UnitModel& model,
                   const std::unordered_set<std::string>& listed) {
   TokenStream& tokens = parser.tokens();
-  if (readScopeItem(parser, model.scope)) return;
   Word word = tokens.peekWord();
+  if (word == Word::Parameter && !model.parameterList) {
+    readParameters(parser, model.scope, false, &model.parameters);
+    if (!parser.failed()) parser.expectSymbol(";");
+    return;
+  }
+  if (word == Word::Import && !model.ansi) {
+    tokens.take();
+    readImports(parser, model.scope, &model.imports);
+    return;
+  }
+  if (readScopeItem(parser, model.scope)) return;
   int direction = directionOf(word);
   if (direction) tokens.take();
   if (model.ansi && direction) {
@@ -352,7 +431,10 @@ void readBodyItem(Parser& parser, UnitModel& model,
     return;
   }
   TypeSpec type;
+  Token typeStart = tokens.peek();
   bool hasType = parser.dataType(type);
+  std::string typeText = hasType ? writtenBetween(typeStart, tokens.peek()) : std::string();
+  if (hasType && typeText.empty()) typeText = type.written;
   if (!direction && !hasType) {
     parser.skipStatement();
     return;
@@ -365,20 +447,24 @@ void readBodyItem(Parser& parser, UnitModel& model,
     const Token& name = tokens.peek();
     if (name.kind != TokenKind::Identifier) break;
     std::string text(name.text);
+    const SourceBuffer* source = name.source;
+    size_t offset = name.offset;
+    tokens.take();
+    std::vector<Dimension> unpacked;
+    parser.dimensions(unpacked);
     if (direction) {
       PortDeclaration port;
       port.name = text;
       port.type = type;
+      port.typeText = typeText;
+      port.unpacked = !unpacked.empty();
       port.direction = direction;
-      port.source = name.source;
-      port.offset = name.offset;
+      port.source = source;
+      port.offset = offset;
       model.declared.emplace(text, std::move(port));
     } else if (listed.count(text)) {
-      model.netTypes.emplace(text, type);
+      model.netTypes.emplace(text, NetDeclaration{type, typeText, !unpacked.empty()});
     }
-    tokens.take();
-    std::vector<Dimension> unpacked;
-    parser.dimensions(unpacked);
     if (tokens.peek().isSymbol("=")) break;
   } while (!parser.failed() && tokens.acceptSymbol(","));
   parser.skipStatement();
@@ -411,6 +497,47 @@ void UnitReader::readScope(const std::vector<Place>& places, Scope& scope) {
     session.readAt(place, [&](Parser& parser) {
       if (!readScopeItem(parser, scope)) parser.skipStatement();
     });
+}
+
+std::vector<std::string> UnitReader::readImports(const std::vector<Place>& places, size_t count) {
+  Session session(*this);
+  std::vector<std::string> imports;
+  Scope ignored;
+  for (size_t i = 0; i < count && i < places.size(); ++i)
+    session.readAt(places[i], [&](Parser& parser) {
+      if (parser.tokens().acceptWord(Word::Import))
+        verilog::readImports(parser, ignored, &imports);
+      else
+        parser.skipStatement();
+    });
+  return imports;
+}
+
+bool UnitReader::readValue(const SourceBuffer& buffer, bool isType, ExprPtr& value,
+                           std::shared_ptr<TypeSpec>& type) {
+  size_t errors = m_Diagnostics.errorCount();
+  MacroTable macros = m_Macros.replay(m_Macros.logSize());
+  Preprocessor pre(&m_Diagnostics, macros, m_Sources);
+  pre.start(buffer, 0, 0);
+  TokenStream tokens(pre);
+  Parser parser(tokens);
+  if (isType) {
+    type = std::make_shared<TypeSpec>();
+    if (!typeValue(parser, *type) && !parser.failed()) parser.fail("expected a data type");
+  } else {
+    value = parser.expression();
+  }
+  if (!parser.failed() && !tokens.atEnd())
+    parser.fail("unexpected '" + std::string(tokens.peek().text.substr(0, 40)) +
+                "' after the value");
+  // The lexer reports what it skipped (an unterminated string or comment) on its own.
+  if (!parser.failed()) return m_Diagnostics.errorCount() == errors;
+  const Token& at = parser.errorAt();
+  if (at.source)
+    m_Diagnostics.error(*at.source, at.offset, parser.errorText());
+  else
+    m_Diagnostics.fileError(buffer.path(), parser.errorText());
+  return false;
 }
 
 }  // namespace scan::verilog

@@ -22,6 +22,8 @@ class SourceStore;
 struct PortDeclaration {
   std::string name;
   TypeSpec type;
+  std::string typeText;  ///< the data type as written, normalised; empty when none is
+  bool unpacked = false;  ///< unpacked dimensions follow the name
   int direction = 0;
   /// No direction was written and the type may name an interface; decided once types are
   /// known.
@@ -40,6 +42,25 @@ struct PortReference {
   };
   std::string name;  ///< empty for an unnamed concatenation
   std::vector<Member> members;
+  std::string text;  ///< the entry as written, normalised
+  const SourceBuffer* source = nullptr;
+  size_t offset = 0;
+};
+
+/// A net or variable declaration of a non-ANSI port's signal.
+struct NetDeclaration {
+  TypeSpec type;
+  std::string typeText;
+  bool unpacked = false;
+};
+
+/// A parameter a user may override: one of the `#(...)` list, or of the body of a unit
+/// without that list. `localparam`s are not recorded.
+struct ParameterDeclaration {
+  std::string name;
+  bool isType = false;
+  std::string typeText;     ///< "type" for a type parameter; empty when untyped
+  std::string defaultText;  ///< empty when there is no default
   const SourceBuffer* source = nullptr;
   size_t offset = 0;
 };
@@ -47,10 +68,14 @@ struct PortReference {
 struct UnitModel {
   Scope scope;
   bool ansi = true;
+  bool parameterList = false;                   ///< the header has a `#(...)` list
+  std::vector<ParameterDeclaration> parameters;  ///< in declaration order
+  /// Package imports of the header and, for non-ANSI units, of the body: "import p::*;".
+  std::vector<std::string> imports;
   std::vector<PortDeclaration> ports;           ///< ANSI ports, in order
   std::vector<PortReference> headerList;        ///< non-ANSI header, in order
   std::unordered_map<std::string, PortDeclaration> declared;  ///< non-ANSI direction declarations
-  std::unordered_map<std::string, TypeSpec> netTypes;         ///< net/variable declarations
+  std::unordered_map<std::string, NetDeclaration> netTypes;   ///< net/variable declarations
 };
 
 /// Reads units, packages and the compilation-unit scope from their recorded places.
@@ -62,6 +87,13 @@ class UnitReader {
   void readUnit(const UnitRecord& unit, UnitModel& model);
   /// Reads the declarations at `places` into `scope` (packages, compilation unit).
   void readScope(const std::vector<Place>& places, Scope& scope);
+  /// The package imports among the first `count` of `places`, one "import p::*;" each.
+  std::vector<std::string> readImports(const std::vector<Place>& places, size_t count);
+
+  /// Reads `text` (held by `buffer`) as one constant expression, or as a data type when
+  /// `isType`; the whole text must be used. On failure reports the error and returns false.
+  bool readValue(const SourceBuffer& buffer, bool isType, ExprPtr& value,
+                 std::shared_ptr<TypeSpec>& type);
 
  private:
   class Session;

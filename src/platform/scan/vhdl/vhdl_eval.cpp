@@ -36,6 +36,25 @@ bool Evaluator::failWith(std::string reason) {
   return false;
 }
 
+bool Evaluator::constant(UnitScope* unit, Decl& decl, Value& out) {
+  m_Reason.clear();
+  m_Steps = 0;
+  return constantValue(unit, decl, out);
+}
+
+bool Evaluator::evaluate(const EvalContext& context, ExprId id, Value& out) {
+  m_Reason.clear();
+  m_Steps = 0;
+  return eval(context, id, out);
+}
+
+std::pair<UnitScope*, Decl*> Evaluator::declarationOf(
+    const EvalContext& context, const std::vector<std::string_view>& typeMark) {
+  if (typeMark.empty()) return {nullptr, nullptr};
+  Found f = resolveMark(context, typeMark);
+  return {f.unit, f.decl};
+}
+
 bool Evaluator::step() {
   if (++m_Steps <= kStepLimit) return true;
   return failWith("a function did not finish within " + std::to_string(kStepLimit) + " steps");

@@ -54,6 +54,16 @@ class Evaluator {
   /// Why the last evaluation failed.
   const std::string& reason() const { return m_Reason; }
 
+  /// The value of generic or constant `decl` of `unit`, evaluated once and cached; false
+  /// with reason() set when it has none.
+  bool constant(UnitScope* unit, Decl& decl, Value& out);
+  /// The value of expression `id` of `context.unit`; false with reason() set.
+  bool evaluate(const EvalContext& context, ExprId id, Value& out);
+  /// The declaration `typeMark` names as seen from `context`, and its unit; a null
+  /// declaration for predefined and undeclared types.
+  std::pair<UnitScope*, Decl*> declarationOf(const EvalContext& context,
+                                             const std::vector<std::string_view>& typeMark);
+
  private:
   struct Found {
     UnitScope* unit = nullptr;

@@ -216,6 +216,8 @@ void DesignIndex::addSource(std::unique_ptr<SourceBuffer> source, std::string_vi
 }
 
 void DesignIndex::registerUnit(UnitRecord unit, size_t nameOffset, const SourceBuffer& source) {
+  m_Met.push_back(unit);
+  m_Met.back().uses.clear();
   if (unit.kind == UnitKind::Architecture || unit.kind == UnitKind::Configuration) return;
   std::string key = unitKey(unit.kind, unit.library, unit.name);
   auto [it, inserted] = m_ByKey.try_emplace(std::move(key), m_Units.size());

@@ -52,6 +52,9 @@ class DesignIndex {
   const SourceBuffer& source(const UnitRecord& unit) const { return *m_Sources[unit.file]; }
   /// Every registered unit (architectures and configurations are not kept).
   const std::vector<UnitRecord>& units() const { return m_Units; }
+  /// Every unit header read, in file order: architectures, configurations and ignored
+  /// duplicates too; their use clauses are not kept.
+  const std::vector<UnitRecord>& unitsMet() const { return m_Met; }
   /// Normalized library names in the order of their first registration.
   const std::vector<std::string>& libraries() const { return m_Libraries; }
 
@@ -62,6 +65,7 @@ class DesignIndex {
   std::vector<std::unique_ptr<SourceBuffer>> m_Sources;
   std::vector<std::string> m_Libraries;
   std::vector<UnitRecord> m_Units;
+  std::vector<UnitRecord> m_Met;
   std::unordered_map<std::string, size_t> m_ByKey;
 };
 

@@ -3,10 +3,11 @@
 // port names, directions, lines and bounds found there must equal what the extractor reports.
 #include <gtest/gtest.h>
 
+#include <cctype>
+#include <cstdlib>
 #include <filesystem>
 #include <iostream>
 #include <map>
-#include <regex>
 #include <set>
 #include <string>
 #include <vector>
@@ -46,17 +47,51 @@ std::string plainName(std::string name) {
 
 // Whether `line` lies inside one of the "file:l1.c1-l2.c2" spans of a Yosys src attribute.
 bool lineInSource(const std::string& src, int line) {
-  static const std::regex span(R"(:(\d+)\.\d+-(\d+)\.\d+)");
-  for (std::sregex_iterator it(src.begin(), src.end(), span), end; it != end; ++it)
-    if (line >= std::atoi((*it)[1].str().c_str()) && line <= std::atoi((*it)[2].str().c_str()))
-      return true;
+  // Reads "D+.D+-D+.D+" at `at`: the first and last line of a span.
+  auto span = [&src](size_t at, int& first, int& last) {
+    int* bounds[2] = {&first, &last};
+    for (int part = 0; part < 4; ++part) {
+      const size_t digits = at;
+      while (at < src.size() && std::isdigit(static_cast<unsigned char>(src[at]))) ++at;
+      if (at == digits) return false;
+      if (part % 2 == 0) *bounds[part / 2] = std::atoi(src.c_str() + digits);
+      if (part < 3 && (at == src.size() || src[at++] != (part % 2 == 0 ? '.' : '-')))
+        return false;
+    }
+    return true;
+  };
+  for (size_t colon = src.find(':'); colon != std::string::npos; colon = src.find(':', colon + 1)) {
+    int first = 0;
+    int last = 0;
+    if (span(colon + 1, first, last) && line >= first && line <= last) return true;
+  }
   return false;
 }
 
-// Files other fixtures may need first: packages and macro definitions.
+// Files other fixtures may need first: packages and macro definitions. Either starts a line
+// (after white space): "package NAME ;" or "`define ".
 bool isSharedFile(const std::string& text) {
-  static const std::regex shared(R"((^|\n)\s*(package\s+\w+\s*;|`define\s))");
-  return std::regex_search(text, shared);
+  auto isBlank = [](char c) { return std::isspace(static_cast<unsigned char>(c)) != 0; };
+  auto isWord = [](char c) { return std::isalnum(static_cast<unsigned char>(c)) || c == '_'; };
+  auto skip = [&text](size_t at, auto&& matches) {
+    while (at < text.size() && matches(text[at])) ++at;
+    return at;
+  };
+  for (size_t line = 0;; ++line) {
+    const size_t at = skip(line, isBlank);
+    if (text.compare(at, 7, "`define") == 0 && at + 7 < text.size() && isBlank(text[at + 7]))
+      return true;
+    if (text.compare(at, 7, "package") == 0) {
+      const size_t name = skip(at + 7, isBlank);
+      const size_t nameEnd = skip(name, isWord);
+      const size_t semicolon = skip(nameEnd, isBlank);
+      if (name > at + 7 && nameEnd > name && semicolon < text.size() && text[semicolon] == ';')
+        return true;
+    }
+    line = text.find('\n', line);
+    if (line == std::string::npos) break;
+  }
+  return false;
 }
 
 std::string describeRange(const ScanPort& port) {

@@ -4,11 +4,11 @@
 // bounds; the extractor must agree on all of it.
 #include <gtest/gtest.h>
 
+#include <cctype>
 #include <cstdlib>
 #include <filesystem>
 #include <iostream>
 #include <map>
-#include <regex>
 #include <set>
 #include <string>
 #include <vector>
@@ -49,9 +49,14 @@ const char* const kStd = "--std=08";
 const char* const kRelaxed = "-frelaxed";
 const char* const kProbeArchitecture = "pinforge_probe";
 
+bool isDigit(char c) { return c >= '0' && c <= '9'; }
+
 bool isInteger(const std::string& image) {
-  static const std::regex integer("-?[0-9]+");
-  return std::regex_match(image, integer);
+  size_t at = !image.empty() && image[0] == '-' ? 1 : 0;
+  if (at == image.size()) return false;
+  for (; at < image.size(); ++at)
+    if (!isDigit(image[at])) return false;
+  return true;
 }
 
 int modeCode(const std::string& mode) {
@@ -64,30 +69,100 @@ int modeCode(const std::string& mode) {
 }
 
 std::string withoutComments(const std::string& text) {
-  static const std::regex comment("--[^\n]*");
-  return std::regex_replace(text, comment, "");
+  std::string code;
+  size_t at = 0;
+  for (size_t dashes; (dashes = text.find("--", at)) != std::string::npos;) {
+    code.append(text, at, dashes - at);
+    at = text.find('\n', dashes);
+    if (at == std::string::npos) return code;
+  }
+  code.append(text, at);
+  return code;
+}
+
+bool isWordChar(char c) { return std::isalnum(static_cast<unsigned char>(c)) || c == '_'; }
+
+// A word of VHDL text: an identifier (lower case), an extended identifier or one other
+// character, and what directly precedes it.
+struct Word {
+  std::string text;
+  bool afterDot = false;    ///< a selected name's suffix, such as `work.entity`
+  bool afterBlank = false;  ///< white space separates it from what comes before
+  bool isName() const {
+    return isIdentifier() || (text.size() > 2 && text[0] == '\\' && text.back() == '\\');
+  }
+  bool isIdentifier() const { return !text.empty() && isWordChar(text[0]); }
+};
+
+// The words of comment-free text. Enough to spot unit headers and library clauses; strings
+// and character literals are not told apart, as the fixtures do not need it.
+std::vector<Word> wordsOf(const std::string& code) {
+  std::vector<Word> words;
+  size_t at = 0;
+  while (at < code.size()) {
+    const size_t start = at;
+    while (at < code.size() && std::isspace(static_cast<unsigned char>(code[at]))) ++at;
+    if (at == code.size()) break;
+    Word word;
+    word.afterBlank = at > start;
+    word.afterDot = at > 0 && code[at - 1] == '.';
+    size_t end = at + 1;
+    if (isWordChar(code[at])) {
+      while (end < code.size() && isWordChar(code[end])) ++end;
+    } else if (code[at] == '\\') {
+      const size_t close = code.find('\\', at + 1);
+      if (close != std::string::npos && close > at + 1) end = close + 1;
+    }
+    word.text = code.substr(at, end - at);
+    if (word.isIdentifier()) word.text = lowerCase(word.text);
+    words.push_back(std::move(word));
+    at = end;
+  }
+  return words;
+}
+
+// Whether words[at] is `keyword` as a word of its own, not a selected name's suffix.
+bool isKeyword(const std::vector<Word>& words, size_t at, std::string_view keyword) {
+  return at < words.size() && words[at].text == keyword && !words[at].afterDot;
+}
+
+// Whether words[at] is a name (identifier, or extended identifier when allowed) set off by
+// white space from the word before it.
+bool isSpacedName(const std::vector<Word>& words, size_t at, bool extended = false) {
+  return at < words.size() && words[at].afterBlank &&
+         (extended ? words[at].isName() : words[at].isIdentifier());
+}
+
+bool isSpaced(const std::vector<Word>& words, size_t at, std::string_view text) {
+  return at < words.size() && words[at].afterBlank && words[at].text == text;
 }
 
 // Declares a package of its own (not a package body or instantiation): such files are
 // analysed ahead of every fixture so fixtures can use packages from other files.
 bool declaresPackage(const std::string& text) {
-  static const std::regex package(R"((^|[^\w.])package\s+\w+\s+is\s+(?!new\b))",
-                                  std::regex::icase | std::regex::ECMAScript);
-  return std::regex_search(withoutComments(text), package);
+  const std::vector<Word> words = wordsOf(withoutComments(text));
+  for (size_t i = 0; i < words.size(); ++i)
+    if (isKeyword(words, i, "package") && isSpacedName(words, i + 1) &&
+        isSpaced(words, i + 2, "is") &&
+        (i + 3 == words.size() || (words[i + 3].afterBlank && words[i + 3].text != "new")))
+      return true;
+  return false;
 }
 
 // Library names from library clauses other than the predefined ones.
 std::set<std::string> namedLibraries(const std::string& text) {
-  static const std::regex clause(R"((^|[^\w.])library\s+([\w\s,]+);)", std::regex::icase);
-  static const std::regex name(R"(\w+)");
   std::set<std::string> libraries;
-  const std::string code = withoutComments(text);
-  for (std::sregex_iterator it(code.begin(), code.end(), clause), end; it != end; ++it) {
-    const std::string names = (*it)[2].str();
-    for (std::sregex_iterator n(names.begin(), names.end(), name); n != end; ++n) {
-      const std::string library = lowerCase(n->str());
+  const std::vector<Word> words = wordsOf(withoutComments(text));
+  for (size_t i = 0; i < words.size(); ++i) {
+    if (!isKeyword(words, i, "library") || i + 1 == words.size() || !words[i + 1].afterBlank)
+      continue;
+    std::vector<std::string> names;
+    size_t at = i + 1;
+    for (; at < words.size() && (words[at].isIdentifier() || words[at].text == ","); ++at)
+      if (words[at].isIdentifier()) names.push_back(words[at].text);
+    if (at == i + 1 || at == words.size() || words[at].text != ";") continue;
+    for (const std::string& library : names)
       if (library != "ieee" && library != "std" && library != "work") libraries.insert(library);
-    }
   }
   return libraries;
 }
@@ -126,19 +201,31 @@ ProbeKind nextKind(ProbeKind kind) {
 // Reads the "P|index|kind|fields..." lines of a probe run.
 std::vector<GhdlBounds> parseReports(const std::string& output, size_t portCount) {
   std::vector<GhdlBounds> bounds(portCount);
-  static const std::regex report(R"(\(report note\): P\|(\d+)\|([ASEN])([^\n]*))");
-  static const std::regex field(R"(\|([^|]*))");
-  for (std::sregex_iterator it(output.begin(), output.end(), report), end; it != end; ++it) {
-    const size_t index = std::strtoul((*it)[1].str().c_str(), nullptr, 10);
+  const std::string marker = "(report note): P|";
+  for (size_t at = 0; (at = output.find(marker, at)) != std::string::npos;) {
+    at += marker.size();
+    size_t digits = at;
+    while (digits < output.size() && isDigit(output[digits])) ++digits;
+    if (digits == at || digits + 1 >= output.size() || output[digits] != '|' ||
+        std::string_view("ASEN").find(output[digits + 1]) == std::string_view::npos)
+      continue;
+    const size_t index = std::strtoul(output.c_str() + at, nullptr, 10);
+    const char kind = output[digits + 1];
+    const size_t lineEnd = std::min(output.find('\n', digits), output.size());
+    const std::string rest = output.substr(digits + 2, lineEnd - digits - 2);
+    at = lineEnd;
     if (index >= portCount) continue;
+    // Each field runs from a '|' to the next one.
     std::vector<std::string> fields;
-    const std::string rest = (*it)[3].str();
-    for (std::sregex_iterator f(rest.begin(), rest.end(), field); f != end; ++f)
-      fields.push_back((*f)[1].str());
+    for (size_t bar = rest.find('|'); bar != std::string::npos;) {
+      const size_t next = rest.find('|', bar + 1);
+      fields.push_back(rest.substr(bar + 1, next == std::string::npos ? next : next - bar - 1));
+      bar = next;
+    }
     fields.resize(3);
     GhdlBounds& b = bounds[index];
     b.reported = true;
-    switch ((*it)[2].str()[0]) {
+    switch (kind) {
       case 'A':
         b.kind = ProbeKind::Array;
         b.left = fields[0];
@@ -165,22 +252,49 @@ std::vector<GhdlBounds> parseReports(const std::string& output, size_t portCount
   return bounds;
 }
 
+// The probe file's line of each GHDL message "...pinforge_probe.vhd:LINE:COL:...", one per
+// message line, in order.
+std::vector<int> probeErrorLines(const std::string& output) {
+  const std::string file = "pinforge_probe.vhd:";
+  std::vector<int> lines;
+  for (size_t start = 0; start < output.size();) {
+    const size_t end = std::min(output.find('\n', start), output.size());
+    // The last mention in the line wins, as a message may quote another location first.
+    for (size_t at = output.rfind(file, end); at != std::string::npos && at >= start;
+         at = at == 0 ? std::string::npos : output.rfind(file, at - 1)) {
+      size_t line = at + file.size(), column = line;
+      while (column < end && isDigit(output[column])) ++column;
+      if (column == line || column >= end || output[column] != ':') continue;
+      size_t after = column + 1;
+      while (after < end && isDigit(output[after])) ++after;
+      if (after == column + 1 || after >= end || output[after] != ':') continue;
+      lines.push_back(std::atoi(output.c_str() + line));
+      break;
+    }
+    start = end + 1;
+  }
+  return lines;
+}
+
 // The design units a file declares, as keys that clash exactly when GHDL would see one unit
 // defined twice.
 std::set<std::string> unitKeys(const std::string& text) {
-  static const std::regex unit(
-      R"((^|[^\w.])(entity|package\s+body|package|configuration|context)\s+(\w+|\\[^\\]+\\)\s+(is|of)\b)",
-      std::regex::icase);
-  static const std::regex architecture(R"((^|[^\w.])architecture\s+(\w+)\s+of\s+(\w+)\s+is\b)",
-                                       std::regex::icase);
-  static const std::regex blanks(R"(\s+)");
   std::set<std::string> keys;
-  const std::string code = withoutComments(text);
-  for (std::sregex_iterator it(code.begin(), code.end(), unit), end; it != end; ++it)
-    keys.insert(std::regex_replace(lowerCase((*it)[2].str()), blanks, " ") + " " +
-                lowerCase((*it)[3].str()));
-  for (std::sregex_iterator it(code.begin(), code.end(), architecture), end; it != end; ++it)
-    keys.insert("architecture " + lowerCase((*it)[2].str()) + " of " + lowerCase((*it)[3].str()));
+  const std::vector<Word> words = wordsOf(withoutComments(text));
+  auto isOrOf = [&](size_t at) { return isSpaced(words, at, "is") || isSpaced(words, at, "of"); };
+  for (size_t i = 0; i < words.size(); ++i) {
+    if (isKeyword(words, i, "architecture") && isSpacedName(words, i + 1) &&
+        isSpaced(words, i + 2, "of") && isSpacedName(words, i + 3) && isSpaced(words, i + 4, "is"))
+      keys.insert("architecture " + words[i + 1].text + " of " + words[i + 3].text);
+    if (isKeyword(words, i, "package") && isSpaced(words, i + 1, "body") &&
+        isSpacedName(words, i + 2, true) && isOrOf(i + 3)) {
+      keys.insert("package body " + lowerCase(words[i + 2].text));
+      continue;
+    }
+    for (const char* kind : {"entity", "package", "configuration", "context"})
+      if (isKeyword(words, i, kind) && isSpacedName(words, i + 1, true) && isOrOf(i + 2))
+        keys.insert(std::string(kind) + " " + lowerCase(words[i + 1].text));
+  }
   return keys;
 }
 
@@ -339,12 +453,9 @@ class GhdlDifferential : public ::testing::TestWithParam<std::string> {
       const ToolRun run = ghdl({"-a", path}, workdir);
       if (run.status == 0) return true;
 
-      static const std::regex error(R"((?:^|\n)[^\n]*pinforge_probe\.vhd:(\d+):\d+:)");
       bool changed = false;
       std::set<int> handled;
-      for (std::sregex_iterator it(run.output.begin(), run.output.end(), error), end; it != end;
-           ++it) {
-        const int errorLine = std::atoi((*it)[1].str().c_str());
+      for (const int errorLine : probeErrorLines(run.output)) {
         if (!handled.insert(errorLine).second) continue;  // one step per line and round
         const auto port = portOfLine.find(errorLine);
         if (port != portOfLine.end()) {

@@ -1,0 +1,1 @@
+module top #(parameter W = (8

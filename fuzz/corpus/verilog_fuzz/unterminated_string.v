@@ -1,0 +1,2 @@
+module top #(parameter S = "abc)(input a);
+endmodule

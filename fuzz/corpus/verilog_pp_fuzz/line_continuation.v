@@ -1,0 +1,5 @@
+`define LONG(a) a + \
+  a + \
+  a
+module top(input [`LONG(1):0] a);
+endmodule

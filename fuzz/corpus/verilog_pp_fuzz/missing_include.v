@@ -1,0 +1,3 @@
+`include "nowhere.vh"
+module top(input a);
+endmodule

@@ -1,0 +1,7 @@
+`include "a.vh"
+module top(input a);
+endmodule
+//--- a.vh
+`include "b.vh"
+//--- b.vh
+`include "a.vh"

@@ -1,0 +1,3 @@
+`define A `A
+module top(input [`A:0] a);
+endmodule

@@ -1,0 +1,5 @@
+`include "loop.vh"
+module top(input a);
+endmodule
+//--- loop.vh
+`include "loop.vh"

@@ -1,0 +1,4 @@
+`ifdef FUZZ
+module top(input a);
+`ifndef WIDTH
+endmodule

@@ -1,0 +1,1 @@
+entity top is generic (W : natural := (8

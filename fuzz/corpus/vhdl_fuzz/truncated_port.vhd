@@ -1,0 +1,1 @@
+entity top is port (a : in bit; b : ou

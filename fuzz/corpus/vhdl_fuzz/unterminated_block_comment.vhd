@@ -1,0 +1,2 @@
+entity top is port (a : in bit; /* b : out bit);
+end;

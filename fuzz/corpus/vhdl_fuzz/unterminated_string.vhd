@@ -1,0 +1,1 @@
+entity top is generic (S : string := "abc); port (a : in bit); end;

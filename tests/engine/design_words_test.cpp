@@ -1,0 +1,347 @@
+// Templates over designs that carry what the declarations say beyond names and bounds: generics,
+// context, declared port types and modes, port patterns, and ranges nobody could evaluate.
+#include <gtest/gtest.h>
+
+#include <memory>
+#include <optional>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "engine/handlers_fixture.h"
+
+namespace {
+
+using handlers_test::errorAt;
+
+struct TypedPort {
+  TypedPort(std::string name_, int32_t left_, int32_t right_, char dir_, std::string type_,
+            PortTypeKind kind_)
+      : name(std::move(name_)), left(left_), right(right_), dir(dir_), type(std::move(type_)),
+        kind(kind_) {}
+
+  std::string name;
+  int32_t left;
+  int32_t right;
+  char dir;
+  std::string type;
+  PortTypeKind kind;
+  PortMode mode = PortMode::FromLetter;
+  std::optional<std::string> problem;
+};
+
+struct Design {
+  DesignLanguage language;
+  std::vector<TypedPort> ports;
+  std::vector<GenericRecord> generics;
+  std::string context;
+};
+
+std::unique_ptr<StbDataList> build(const Design& design) {
+  std::unique_ptr<StbDataList> data(handlers_test::newDesignData());
+  data->m_Language = design.language;
+  data->m_Generics = design.generics;
+  data->m_Context = design.context;
+  for (const TypedPort& p : design.ports) {
+    auto* record = new PortRecord(p.name, p.left, p.right, p.dir);
+    record->m_DeclaredType = p.type;
+    record->m_Kind = p.kind;
+    record->m_Mode = p.mode;
+    if (p.problem) record->setRangeUnknown(*p.problem);
+    data->appendOwned(record);
+  }
+  return data;
+}
+
+TypedPort withMode(TypedPort port, PortMode mode) {
+  port.mode = mode;
+  return port;
+}
+
+TypedPort unknownRange(TypedPort port, std::string problem) {
+  port.problem = std::move(problem);
+  return port;
+}
+
+using K = PortTypeKind;
+
+const Design kEmpty{DesignLanguage::Vhdl, {}, {}, ""};
+
+const Design kVhdl{
+    DesignLanguage::Vhdl,
+    {{"clk", -1, -1, 'I', "std_ulogic", K::Bit},
+     {"rst_n", -1, -1, 'I', "std_logic", K::Bit},
+     {"data", 15, 0, 'I', "std_ulogic_vector(WIDTH-1 downto 0)", K::BitVector},
+     withMode({"q", -1, -1, 'O', "std_logic", K::Bit}, PortMode::Buffer),
+     {"trace", -1, -1, 'O', "trace_t", K::Record},
+     {"st", -1, -1, 'B', "state_t", K::Enum},
+     {"cnt", 3, 0, 'O', "integer range 0 to 15", K::Integer},
+     {"n", -1, -1, 'N', "", K::Other}},
+    {{"WIDTH", "natural", "8", "16"},
+     {"MODE", "string", "\"fast\"", "\"fast\""},
+     {"INIT", "std_logic_vector(WIDTH-1 downto 0)", "(others => '0')", ""}},
+    "library ieee;\nuse ieee.std_logic_1164.all;\n"};
+
+const Design kVerilog{
+    DesignLanguage::Verilog,
+    {{"clk", -1, -1, 'I', "wire", K::Bit},
+     {"d", 7, 0, 'I', "logic [W-1:0]", K::BitVector},
+     {"q", -1, -1, 'O', "logic", K::Bit},
+     {"io", -1, -1, 'B', "wire", K::Bit},
+     {"s", -1, -1, 'B', "bus_if.slave", K::Interface},
+     withMode({"r", -1, -1, 'O', "int", K::Integer}, PortMode::Ref)},
+    {{"W", "", "8", "8"}, {"T", "int unsigned", "4", "4"}},
+    "import axi_pkg::*;\n"};
+
+const std::string kProblem =
+    "std_logic_vector(WIDTH-1 downto 0): generic WIDTH has no default; give it with -g "
+    "WIDTH=VALUE";
+
+const Design kUnknown{
+    DesignLanguage::Vhdl,
+    {{"en", -1, -1, 'I', "std_logic", K::Bit},
+     unknownRange({"data", -1, -1, 'I', "std_logic_vector(WIDTH-1 downto 0)", K::BitVector},
+                  kProblem),
+     unknownRange({"arr", -1, -1, 'O', "rec_array_t(0 to N-1)", K::Array}, "N has no value"),
+     {"q", 3, 0, 'O', "std_logic_vector(3 downto 0)", K::BitVector}},
+    {},
+    ""};
+
+std::string rangeError(int line, const std::string& port, const std::string& problem) {
+  return "Error - Template file line " + std::to_string(line) + " needs the range of port " +
+         port + ", which could not be evaluated:\n" + problem + "\n";
+}
+
+struct Row {
+  const char* name;
+  const Design* design;
+  std::string templateText;
+  std::string output;
+  std::string message;  // empty: the run finishes without error
+};
+
+class DesignWordsTest : public ::testing::TestWithParam<Row> {};
+
+TEST_P(DesignWordsTest, WritesWholeOutputAndResult) {
+  const Row& row = GetParam();
+  const std::unique_ptr<StbDataList> data = build(*row.design);
+  const handlers_test::Run run = handlers_test::runOn(row.templateText, *data);
+  EXPECT_EQ(run.output, row.output);
+  const bool ok = row.message.empty();
+  EXPECT_EQ(run.completed, ok);
+  EXPECT_EQ(run.status, ok ? 0u : 2u);
+  EXPECT_EQ(run.message, ok ? handlers_test::kNoError : row.message);
+}
+
+std::string rowName(const ::testing::TestParamInfo<Row>& info) { return info.param.name; }
+
+const std::string kGenericOnly = " may only occur inside an @ITERATE@%GENERIC% body.";
+const std::string kPortsOnly = " may only occur inside an @ITERATE@ over ports.";
+
+INSTANTIATE_TEST_SUITE_P(
+    Generics, DesignWordsTest,
+    ::testing::Values(
+        Row{"List", &kVhdl, "(%generic%)", "(WIDTH, MODE, INIT)", ""},
+        Row{"ListCaseAndWrap", &kVhdl, "@LOWCASE@@SET OUTLINEWIDTH=3@%generic%",
+            "width, \nmode, \ninit", ""},
+        Row{"ListEmpty", &kEmpty, "[%generic%]", "[]", ""},
+        Row{"ListInPortBody", &kVerilog, "@ITERATE@%IPORT%@ITERATOR@:%generic%@ENDITERATE@",
+            "clk:W, T, d:W, T", ""},
+        Row{"VhdlClause", &kVhdl,
+            "@SET SIGDELIM=;\n@@ITERATE@%GENERIC%@ITERATOR@ : @GENERIC_TYPE@ := "
+            "@GENERIC_DEFAULT@ -- @GENERIC_VALUE@@ENDITERATE@",
+            "WIDTH : natural := 8 -- 16;\nMODE : string := \"fast\" -- \"fast\";\n"
+            "INIT : std_logic_vector(WIDTH-1 downto 0) := (others => '0') -- ",
+            ""},
+        Row{"VerilogParameterList", &kVerilog,
+            "#(@ITERATE@%generic%.@ITERATOR@(@GENERIC_VALUE@)@ENDITERATE@)", "#(.W(8), .T(4))",
+            ""},
+        Row{"NamesTakeCaseValuesDoNot", &kVhdl,
+            "@UPCASE@@ITERATE@%GENERIC%@LOWCASE@@ITERATOR@=@GENERIC_VALUE@@ENDITERATE@",
+            "width=16, mode=\"fast\", init=", ""},
+        Row{"NoGenericNoPass", &kEmpty, "x@ITERATE@%GENERIC%y@ENDITERATE@z", "xz", ""},
+        Row{"IfHas", &kVhdl,
+            "@IFHAS GENERIC=WIDTH@1@ENDIF@@IFHAS GENERIC=width@2@ENDIF@"
+            "@IFNHAS GENERIC=*@3@ENDIF@@IFHAS generic=?ODE@4@ENDIF@"
+            "@SET CASESENSITIVEIF=OFF@@IFHAS GENERIC=width@5@ENDIF@@IFHAS GENERIC=MOD@6@ENDIF@",
+            "145", ""},
+        Row{"IfHasWritesClauseOnlyWhenThereIsOne", &kEmpty,
+            "@IFHAS GENERIC=*@generic (%generic%);@ENDIF@port", "port", ""},
+        Row{"IfHasInGenericBody", &kVhdl,
+            "@ITERATE@%GENERIC%@IFHAS GENERIC=MODE@@ITERATOR@@ENDIF@@ENDITERATE@",
+            "WIDTH, MODE, INIT", ""},
+        Row{"ErrorInBodyStops", &kVhdl, "@ITERATE@%GENERIC%@ITERATOR@@FOO@@ENDITERATE@", "WIDTH",
+            errorAt(1, "Keyword: @FOO@ is not a valid Variable or Directive name.")},
+        Row{"FieldOutside", &kVhdl, "a@GENERIC_TYPE@", "a",
+            errorAt(1, "@GENERIC_TYPE@" + kGenericOnly)},
+        Row{"FieldInPortBody", &kVhdl, "@ITERATE@%PORT%@GENERIC_VALUE@@ENDITERATE@", ", ",
+            errorAt(1, "@GENERIC_VALUE@" + kGenericOnly)},
+        Row{"DefaultOutside", &kVhdl, "@GENERIC_DEFAULT@", "",
+            errorAt(1, "@GENERIC_DEFAULT@" + kGenericOnly)},
+        Row{"PortWordInGenericBody", &kVhdl, "@ITERATE@%GENERIC%@PORT_TYPE@@ENDITERATE@", "",
+            errorAt(1, "@PORT_TYPE@" + kPortsOnly)},
+        Row{"TypeDecInGenericBody", &kVhdl, "@ITERATE@%GENERIC%@VHDL_TYPEDEC@@ENDITERATE@", "",
+            errorAt(1, "@VHDL_TYPEDEC@" + kPortsOnly)},
+        Row{"PortListInGenericBody", &kVhdl, "@ITERATE@%GENERIC%%port%@ENDITERATE@", "",
+            errorAt(1, "Variables: %IPORT% %OBPORT% %OPORT% %BPORT% %PORT% %NODE% %SIGNAL% are "
+                       "not valid within @ITERATE@")},
+        Row{"NestedInPortBody", &kVhdl, "@ITERATE@%PORT%@ITERATE@%GENERIC%@ENDITERATE@", ", ",
+            errorAt(1, "@ITERATE@ may not occur inside an @ITERATE@ body.")},
+        Row{"Context", &kVhdl, "%context%entity",
+            "library ieee;\nuse ieee.std_logic_1164.all;\nentity", ""},
+        Row{"ContextKeepsCase", &kVerilog, "@UPCASE@%CONTEXT%", "import axi_pkg::*;\n", ""},
+        Row{"ContextEmpty", &kEmpty, "[%context%]", "[]", ""}),
+    rowName);
+
+INSTANTIATE_TEST_SUITE_P(
+    PortWords, DesignWordsTest,
+    ::testing::Values(
+        Row{"VhdlEntityPorts", &kVhdl,
+            "@SET SIGDELIM=;\n@@ITERATE@%SIGNAL%@ITERATOR@ : @PORT_MODE@ @PORT_TYPE@@ENDITERATE@",
+            "clk : in std_ulogic;\nrst_n : in std_logic;\n"
+            "data : in std_ulogic_vector(WIDTH-1 downto 0);\nq : buffer std_logic;\n"
+            "trace : out trace_t;\nst : inout state_t;\ncnt : out integer range 0 to 15;\nn :  ",
+            ""},
+        Row{"VerilogPorts", &kVerilog,
+            "@ITERATE@%SIGNAL%[@PORT_MODE@|@PORT_TYPE@|@ITERATOR@]@ENDITERATE@",
+            "[input|wire|clk], [input|logic [W-1:0]|d], [output|logic|q], [inout|wire|io], "
+            "[|bus_if.slave|s], [ref|int|r]",
+            ""},
+        Row{"WordsIgnoreCaseMode", &kVhdl,
+            "@UPCASE@@ITERATE@%IPORT%@PORT_MODE@ @PORT_TYPE@@ENDITERATE@",
+            "in std_ulogic, in std_logic, in std_ulogic_vector(WIDTH-1 downto 0)", ""},
+        Row{"ExpandedBitsKeepType", &kVerilog,
+            "@EXPANDBUS@@ITERATE@%IBUSPORT%@ITERATOR@:@PORT_TYPE@@ENDITERATE@",
+            "d_7_:logic [W-1:0], d_6_:logic [W-1:0], d_5_:logic [W-1:0], d_4_:logic [W-1:0], "
+            "d_3_:logic [W-1:0], d_2_:logic [W-1:0], d_1_:logic [W-1:0], d_0_:logic [W-1:0]",
+            ""},
+        Row{"TypeOutside", &kVhdl, "x\n@PORT_TYPE@", "x\n", errorAt(2, "@PORT_TYPE@" + kPortsOnly)},
+        Row{"ModeOutside", &kVhdl, "@PORT_MODE@", "", errorAt(1, "@PORT_MODE@" + kPortsOnly)},
+        Row{"TypeDecKeepsDeclaredTypeOfNonBitPorts", &kVhdl,
+            "@SET SIGDELIM=;@@ITERATE@%SIGNAL%@VHDL_TYPEDEC@@ENDITERATE@",
+            "std_logic;std_logic;std_logic_vector(15 downto 0);std_logic;trace_t;state_t;"
+            "std_logic_vector(3 downto 0);std_logic",
+            ""},
+        Row{"TypeDecOfInterfaceAndInteger", &kVerilog,
+            "@ITERATE@%BPORT%@VHDL_TYPEDEC@@ENDITERATE@|@ITERATE@%OPORT%@VHDL_TYPEDEC@@ENDITERATE@",
+            "std_logic, bus_if.slave|std_logic, std_logic", ""}),
+    rowName);
+
+const Design kOnePort{DesignLanguage::Vhdl, {{"Clk_In", -1, -1, 'I', "", K::Other}}, {}, ""};
+const std::string kIfPortForm = errorAt(
+    1, "Invalid syntax for @IFPORT or @IFNPORT directive, must be of the form:\n@IFPORT PATTERN@");
+
+INSTANTIATE_TEST_SUITE_P(
+    IfPort, DesignWordsTest,
+    ::testing::Values(
+        Row{"Testbench", &kVhdl,
+            "@ITERATE@%IPORT%@IFPORT clk*@C@ENDIF@@IFPORT rst*@R@ENDIF@@IFPORT *_n@N@ENDIF@"
+            "@IFNPORT clk@=@ITERATOR@@ENDIF@@ENDITERATE@",
+            "C, RN=rst_n, =data", ""},
+        Row{"CaseRuleOfIfHas", &kOnePort,
+            "@ITERATE@%PORT%@IFPORT clk*@1@ENDIF@@SET CASESENSITIVEIF=OFF@"
+            "@IFPORT clk*@2@ENDIF@@ENDITERATE@",
+            "2", ""},
+        Row{"DeclaredNameNotMapped", &kOnePort,
+            "@MAPSIGNAL Clk_In TO x@@MAP@@ITERATE@%PORT%@IFPORT x@1@ENDIF@"
+            "@IFPORT Clk_In@@ITERATOR@@ENDIF@@ENDITERATE@",
+            "x", ""},
+        Row{"EachBitOfExpandedBus", &kVerilog,
+            "@EXPANDBUS@@ITERATE@%IPORT%@IFPORT d@@ITERATOR@@ENDIF@@ENDITERATE@",
+            ", d_7_, d_6_, d_5_, d_4_, d_3_, d_2_, d_1_, d_0_", ""},
+        Row{"NestsWithIfHas", &kOnePort,
+            "@ITERATE@%PORT%@IFHAS PORT=Clk_In@@IFNPORT zz@@IFPORT *@x@ENDIF@@ENDIF@@ENDIF@"
+            "@ENDITERATE@",
+            "x", ""},
+        Row{"FailedBlockCountsIt", &kOnePort,
+            "@IFHAS PORT=zz@@IFPORT@@IFNPORT a b@@ENDIF@@ENDIF@@ENDIF@<>", "<>", ""},
+        Row{"FailedBlockOutsideIteration", &kOnePort, "@IFHAS PORT=zz@@IFPORT x@@ENDIF@@ENDIF@.",
+            ".", ""},
+        Row{"Outside", &kOnePort, "@IFPORT x@@ENDIF@", "",
+            errorAt(1, "@IFPORT and @IFNPORT" + kPortsOnly)},
+        Row{"InGenericBody", &kVhdl, "@ITERATE@%GENERIC%@IFNPORT x@@ENDIF@@ENDITERATE@", "",
+            errorAt(1, "@IFPORT and @IFNPORT" + kPortsOnly)},
+        Row{"NoPattern", &kOnePort, "@ITERATE@%PORT%@IFPORT@@ENDIF@@ENDITERATE@", "", kIfPortForm},
+        Row{"TwoPatterns", &kOnePort, "@ITERATE@%PORT%@IFPORT a b@@ENDIF@@ENDITERATE@", "",
+            kIfPortForm}),
+    rowName);
+
+// One pattern row: does the port's name match?
+struct GlobRow {
+  const char* name;
+  const char* pattern;
+  bool matches;
+};
+
+TEST(IfPort, Patterns) {
+  const GlobRow rows[] = {
+      {"clk", "clk", true},       {"clk", "clk*", true},      {"clk_a", "clk*", true},
+      {"sclk", "clk*", false},    {"sys_clk", "*_clk", true}, {"clk", "*_clk", false},
+      {"rst_n", "*_n", true},     {"rst_n", "r?t_?", true},   {"rst", "r?t_?", false},
+      {"a", "?", true},           {"", "*", true},            {"ab", "?", false},
+      {"abcbc", "a*bc", true},    {"abcbd", "a*bc", false},   {"aXbXc", "*X*X*", true},
+      {"aXb", "*X*X*", false},    {"a*b", "a\\*b", false},    {"mississippi", "*ss*ss*i", true},
+      {"Data", "data", false},    {"data", "d**a", true},     {"x", "", false},
+  };
+  for (const GlobRow& row : rows) {
+    const Design design{DesignLanguage::Vhdl, {{row.name, -1, -1, 'I', "", K::Other}}, {}, ""};
+    const std::unique_ptr<StbDataList> data = build(design);
+    const std::string templateText = std::string("@ITERATE@%PORT%@IFPORT ") + row.pattern +
+                                     "@y@ENDIF@@IFNPORT " + row.pattern + "@n@ENDIF@@ENDITERATE@";
+    const handlers_test::Run run = handlers_test::runOn(templateText, *data);
+    if (*row.pattern == '\0') {
+      EXPECT_NE(run.status, 0u) << "an empty pattern is a syntax error";
+      continue;
+    }
+    EXPECT_EQ(run.output, row.matches ? "y" : "n") << row.name << " vs " << row.pattern;
+  }
+}
+
+const std::string kDataError = rangeError(1, "data", kProblem);
+
+INSTANTIATE_TEST_SUITE_P(
+    UnknownRange, DesignWordsTest,
+    ::testing::Values(
+        Row{"NamesAndTypesStillWork", &kUnknown,
+            "%port%|%signal%|@ITERATE@%PORT%@ITERATOR@ : @PORT_MODE@ @PORT_TYPE@@ENDITERATE@|"
+            "@IFHAS IPORT=data@y@ENDIF@@MAPSIGNAL data TO d@@MAP@%iport%",
+            "en, data, arr, q|en, data, arr, q|en : in std_logic, data : in "
+            "std_logic_vector(WIDTH-1 downto 0), arr : out rec_array_t(0 to N-1), q : out "
+            "std_logic_vector(3 downto 0)|yen, d",
+            ""},
+        Row{"ShowRange", &kUnknown, "@SHOWRANGE@%iport%", "en, ", kDataError},
+        Row{"ShowRangeInIteration", &kUnknown,
+            "@ITERATE@%IPORT%@SHOWRANGE@@ITERATOR@@ENDITERATE@", "en, ", kDataError},
+        Row{"ExpandBus", &kUnknown, "@EXPANDBUS@%iport%", "en", kDataError},
+        Row{"ExpandBusIteration", &kUnknown, "@EXPANDBUS@@ITERATE@%IPORT%x@ENDITERATE@", "x",
+            kDataError},
+        Row{"BusList", &kUnknown, "%ibusport%", "", kDataError},
+        Row{"ScalarList", &kUnknown, "%iscalarport%", "en", kDataError},
+        Row{"ScalarListOfOtherDirection", &kUnknown, "%bscalarport%.", ".", ""},
+        Row{"ScalarIteration", &kUnknown, "@ITERATE@%SCALARPORT%@ITERATOR@@ENDITERATE@", "en",
+            kDataError},
+        Row{"IfHasBusPort", &kUnknown, "@IFHAS BUSPORT=data@y@ENDIF@", "", kDataError},
+        Row{"IfHasBusPortWildcard", &kUnknown, "@IFHAS IBUSPORT=d?t?@y@ENDIF@", "", kDataError},
+        Row{"IfHasBusPortOtherName", &kUnknown, "@IFHAS BUSPORT=q@y@ENDIF@", "y", ""},
+        Row{"TypeDec", &kUnknown, "\n@ITERATE@%IPORT%@VHDL_TYPEDEC@@ENDITERATE@", "\nstd_logic, ",
+            rangeError(2, "data", kProblem)},
+        Row{"TypeDecOfArrayWritesDeclaredType", &kUnknown,
+            "@ITERATE@%OPORT%@VHDL_TYPEDEC@@ENDITERATE@",
+            "rec_array_t(0 to N-1), std_logic_vector(3 downto 0)", ""},
+        Row{"ProblemTextIsNotCut", &kUnknown, "@SHOWRANGE@%oport%", "",
+            rangeError(1, "arr", "N has no value")}),
+    rowName);
+
+TEST(UnknownRange, LongProblemTextIsKeptWhole) {
+  const std::string problem(600, 'p');
+  const Design design{
+      DesignLanguage::Vhdl,
+      {unknownRange({"w", -1, -1, 'I', "std_logic_vector(N-1 downto 0)", K::BitVector}, problem)},
+      {},
+      ""};
+  const std::unique_ptr<StbDataList> data = build(design);
+  const handlers_test::Run run = handlers_test::runOn("@EXPANDBUS@%port%", *data);
+  EXPECT_EQ(run.message, rangeError(1, "w", problem));
+}
+
+}  // namespace

@@ -1,0 +1,246 @@
+// The Tcl driver script's head built from design data made here, so the generics, declared
+// types, context and language are checked whatever the readers fill in; and read back by a
+// real tclsh, so every byte a value may hold arrives as it was.
+#include "tcl_driver_script.h"
+
+#include <gtest/gtest.h>
+
+#include <cstdio>
+#include <memory>
+#include <optional>
+#include <ostream>
+#include <string>
+#include <vector>
+
+#include "run_context.h"
+#include "support/process.h"
+#include "support/scratch_dir.h"
+
+namespace {
+
+using namespace pinforge_test;
+
+struct Port {
+  std::string name;
+  int32_t left;
+  int32_t right;
+  char dir;
+  std::string type;
+  bool rangeUnknown = false;
+};
+
+struct Design {
+  DesignLanguage language = DesignLanguage::Vhdl;
+  std::vector<Port> ports = {};
+  std::vector<GenericRecord> generics = {};
+  std::string context = "";
+};
+
+/// A run context as the front end leaves it for a Tcl template, holding `design`.
+std::unique_ptr<RunContext> contextFor(const Design& design) {
+  auto context = std::make_unique<RunContext>();
+  context->m_ModuleName = "top";
+  context->m_ProjectName = "demo";
+  context->m_OutputFileName = "out.txt";
+  context->m_InputFileName = "design.vhd";
+  context->m_TemplateFileName = "t.tcl";
+  context->m_DesignData = std::make_unique<StbDataList>("demo", "top", "out", "txt", "pinforge",
+                                                        "", "", "");
+  StbDataList& data = *context->m_DesignData;
+  data.m_Language = design.language;
+  data.m_Generics = design.generics;
+  data.m_Context = design.context;
+  for (const Port& p : design.ports) {
+    auto* record = new PortRecord(p.name, p.left, p.right, p.dir);
+    record->m_DeclaredType = p.type;
+    if (p.rangeUnknown) record->setRangeUnknown("N has no value; give it with -g N=VALUE");
+    data.appendOwned(record);
+  }
+  return context;
+}
+
+constexpr const char* kNames =
+    "# This file drives input variables to the tcl template file\n"
+    "#   given below in the \"source\" command.\n"
+    "set ModuleName \"top\"\n"
+    "set ProjectName \"demo\"\n"
+    "set ProjectFile \"\"\n"
+    "set ProjectName \"demo\"\n"
+    "set OutputFileName \"out.txt\"\n"
+    "set InputFileName \"design.vhd\"\n"
+    "set TemplateFileName \"t.tcl\"\n"
+    "set ErrorFileName \"__UNDEFINED__\"\n"
+    "set LibLocation \"\"\n"
+    "\n"
+    "# Port Definitions\n";
+
+struct HeadCase {
+  const char* name;
+  Design design;
+  std::string ports;    ///< the port lines, PortName to TotalPorts
+  std::string details;  ///< everything after them
+};
+
+const HeadCase kHeadCases[] = {
+    {.name = "VhdlGenericsTypesAndUnknownBound",
+     .design = {.ports = {{"clk", -1, -1, 'I', "std_ulogic"},
+                          {"data", 15, 0, 'O', "std_logic_vector(WIDTH-1 downto 0)"},
+                          {"wide", -1, -1, 'B', "std_logic_vector(N-1 downto 0)", true},
+                          {"st", -1, -1, 'O', "state_t"}},
+                .generics = {{"WIDTH", "natural", "8", "16"}, {"N", "positive", "", ""}},
+                .context = "library ieee;\nuse ieee.std_logic_1164.all;"},
+     .ports = "set PortName [ list  \"clk\" \"data\" \"wide\" \"st\" ]\n"
+              "set LeftRange [ list  -1 15 \"\" -1 ]\n"
+              "set RightRange [ list  -1 0 \"\" -1 ]\n"
+              "set PortDir [ list  \"I\" \"O\" \"B\" \"O\" ]\n"
+              "set TotalPorts 4\n",
+     .details = "\n# Generic Definitions\n"
+                "set GenericName [ list  \"WIDTH\" \"N\" ]\n"
+                "set GenericType [ list  \"natural\" \"positive\" ]\n"
+                "set GenericDefault [ list  \"8\" \"\" ]\n"
+                "set GenericValue [ list  \"16\" \"\" ]\n"
+                "set TotalGenerics 2\n"
+                "\n# Declared Types and Context\n"
+                "set PortType [ list  \"std_ulogic\" \"std_logic_vector(WIDTH-1 downto 0)\" "
+                "\"std_logic_vector(N-1 downto 0)\" \"state_t\" ]\n"
+                "set Context \"library ieee;\nuse ieee.std_logic_1164.all;\"\n"
+                "set Language \"vhdl\"\n"},
+    {.name = "VerilogWithoutGenericsOrContext",
+     .design = {.language = DesignLanguage::Verilog, .ports = {{"a", 3, 0, 'I', ""}}},
+     .ports = "set PortName [ list  \"a\" ]\n"
+              "set LeftRange [ list  3 ]\n"
+              "set RightRange [ list  0 ]\n"
+              "set PortDir [ list  \"I\" ]\n"
+              "set TotalPorts 1\n",
+     .details = "\n# Generic Definitions\n"
+                "set GenericName [ list  ]\n"
+                "set GenericType [ list  ]\n"
+                "set GenericDefault [ list  ]\n"
+                "set GenericValue [ list  ]\n"
+                "set TotalGenerics 0\n"
+                "\n# Declared Types and Context\n"
+                "set PortType [ list  \"\" ]\n"
+                "set Context \"\"\n"
+                "set Language \"verilog\"\n"},
+    {.name = "NoPortsAtAll",
+     .design = {.language = DesignLanguage::Verilog,
+                .generics = {{"P", "", "4", "4"}},
+                .context = "import pkg::*;"},
+     .ports = "set PortName [ list  ]\nset LeftRange [ list  ]\nset RightRange [ list  ]\n"
+              "set PortDir [ list  ]\nset TotalPorts 0\n",
+     .details = "\n# Generic Definitions\n"
+                "set GenericName [ list  \"P\" ]\n"
+                "set GenericType [ list  \"\" ]\n"
+                "set GenericDefault [ list  \"4\" ]\n"
+                "set GenericValue [ list  \"4\" ]\n"
+                "set TotalGenerics 1\n"
+                "\n# Declared Types and Context\n"
+                "set PortType [ list  ]\n"
+                "set Context \"import pkg::*;\"\n"
+                "set Language \"verilog\"\n"},
+    {.name = "TclSpecialsEscapedEverywhere",
+     .design = {.ports = {{"p", -1, -1, 'I', "t\"[x]"}},
+                .generics = {{"S", "string", "\"$a\\b\"", "\"[exit 3]\""}},
+                .context = "use work.p;\r\n-- \x1a end"},
+     .ports = "set PortName [ list  \"p\" ]\nset LeftRange [ list  -1 ]\n"
+              "set RightRange [ list  -1 ]\nset PortDir [ list  \"I\" ]\nset TotalPorts 1\n",
+     .details = "\n# Generic Definitions\n"
+                "set GenericName [ list  \"S\" ]\n"
+                "set GenericType [ list  \"string\" ]\n"
+                "set GenericDefault [ list  \"\\\"\\$a\\\\b\\\"\" ]\n"
+                "set GenericValue [ list  \"\\\"\\[exit 3\\]\\\"\" ]\n"
+                "set TotalGenerics 1\n"
+                "\n# Declared Types and Context\n"
+                "set PortType [ list  \"t\\\"\\[x\\]\" ]\n"
+                "set Context \"use work.p;\\r\n-- \\032 end\"\n"
+                "set Language \"vhdl\"\n"},
+};
+
+void PrintTo(const HeadCase& c, std::ostream* os) { *os << c.name; }
+
+class TclDriverHead : public testing::TestWithParam<HeadCase> {};
+
+// The names and port lines come first exactly as they always have (a bound that could not be
+// evaluated aside), and the new variables follow them.
+TEST_P(TclDriverHead, KeepsTheOldLinesAndAppendsTheDesignDetails) {
+  const HeadCase& c = GetParam();
+  EXPECT_EQ(tclDriverScriptHead(*contextFor(c.design)), kNames + c.ports + c.details);
+}
+
+INSTANTIATE_TEST_SUITE_P(Designs, TclDriverHead, testing::ValuesIn(kHeadCases),
+                         [](const testing::TestParamInfo<HeadCase>& info) {
+                           return std::string(info.param.name);
+                         });
+
+/// Runs `script` with tclsh in `dir` (with a locale that reads the script byte by byte).
+RunResult runTcl(const ScratchDir& dir, const std::string& script) {
+  if (!dir.write("driver.tcl", script)) return {};
+  return runProgram({findOnPath("tclsh"), "driver.tcl"}, dir.path(), {{"LC_ALL", "C"}});
+}
+
+std::string hex(std::string_view bytes) {
+  std::string text;
+  char pair[3];
+  for (unsigned char byte : bytes) {
+    std::snprintf(pair, sizeof pair, "%02x", byte);
+    text += pair;
+  }
+  return text;
+}
+
+// Writes every item of the new variables in hex, one per line, so nothing Tcl does to a
+// value can hide.
+constexpr const char* kHexDump =
+    "proc hex {v} { binary scan $v H* h; return $h }\n"
+    "set f [open values.txt w]\n"
+    "foreach name {GenericName GenericType GenericDefault GenericValue PortType} {\n"
+    "  foreach item [set $name] { puts $f \"$name [hex $item]\" }\n"
+    "}\n"
+    "puts $f \"TotalGenerics $TotalGenerics\"\n"
+    "puts $f \"Context [hex $Context]\"\n"
+    "puts $f \"Language $Language\"\n"
+    "foreach l $LeftRange r $RightRange { puts $f \"Range <$l> <$r>\" }\n"
+    "close $f\n";
+
+TEST(TclDriverRoundTrip, EveryByteOfEveryValueReachesTheTemplate) {
+  if (findOnPath("tclsh").empty()) GTEST_SKIP() << "tclsh is not installed";
+  std::string everyByte;
+  for (int byte = 0; byte < 256; ++byte) everyByte += static_cast<char>(byte);
+  const std::string tclWords = "{a b} \"q\" $x [exit 7] \\ \\\n; # }{";
+  const Design design = {
+      .language = DesignLanguage::Verilog,
+      .ports = {{"a", 7, 0, 'I', everyByte}, {"b", -1, -1, 'O', tclWords, true}},
+      .generics = {{"G1", everyByte, tclWords, "\r\n"}, {tclWords, "", "", everyByte}},
+      .context = everyByte + tclWords};
+  ScratchDir dir;
+  const RunResult run = runTcl(dir, tclDriverScriptHead(*contextFor(design)) + kHexDump);
+  ASSERT_EQ(run.status, 0) << run.err;
+  EXPECT_EQ(dir.read("values.txt"),
+            "GenericName " + hex("G1") + "\nGenericName " + hex(tclWords) + "\n" +
+                "GenericType " + hex(everyByte) + "\nGenericType \n" +
+                "GenericDefault " + hex(tclWords) + "\nGenericDefault \n" +
+                "GenericValue " + hex("\r\n") + "\nGenericValue " + hex(everyByte) + "\n" +
+                "PortType " + hex(everyByte) + "\nPortType " + hex(tclWords) + "\n" +
+                "TotalGenerics 2\n" + "Context " + hex(everyByte + tclWords) + "\n" +
+                "Language verilog\n" + "Range <7> <0>\nRange <> <>\n");
+}
+
+// A bound that could not be evaluated can be tested for, and stops a template that computes
+// with it instead of letting it write a width.
+TEST(TclDriverRoundTrip, UnknownBoundIsTestableAndStopsArithmetic) {
+  if (findOnPath("tclsh").empty()) GTEST_SKIP() << "tclsh is not installed";
+  const Design design = {.ports = {{"wide", 7, 0, 'I', "std_logic_vector(N-1 downto 0)", true}}};
+  const std::string head = tclDriverScriptHead(*contextFor(design));
+  ScratchDir dir;
+  const RunResult test =
+      runTcl(dir, head + "puts [expr {[lindex $LeftRange 0] eq \"\" ? \"unknown\" : \"known\"}]\n");
+  EXPECT_EQ(test.status, 0) << test.err;
+  EXPECT_EQ(test.out, "unknown\n");
+  const RunResult compute =
+      runTcl(dir, head + "puts [expr {[lindex $LeftRange 0] - [lindex $RightRange 0] + 1}]\n");
+  EXPECT_NE(compute.status, 0);
+  EXPECT_EQ(compute.out, "");
+  EXPECT_NE(compute.err.find("empty string"), std::string::npos) << compute.err;
+}
+
+}  // namespace
