@@ -7,8 +7,9 @@
 
 #include <algorithm>
 #include <cstdlib>
-#include <memory>
 #include <string>
+#include <string_view>
+#include <vector>
 
 #include "platform/hostkit.h"
 #include "platform/wide_text-win32.h"
@@ -55,7 +56,7 @@ void writeRaw(DWORD stream, const std::string& text) {
 class Collector : public Host::ChildOutput {
  public:
   explicit Collector(std::string* into) : m_Into(into) {}
-  bool OnOutput(const char* text) override {
+  bool OnOutput(std::string_view text) override {
     m_Into->append(text);
     return true;
   }
@@ -70,18 +71,35 @@ std::string ownPath() {
   return narrow(path);
 }
 
-int run(const std::string& commandLine, std::string& output, const wchar_t* childMode = nullptr) {
+int run(const std::vector<std::string>& argv, std::string& output,
+        const wchar_t* childMode = nullptr) {
   ::SetEnvironmentVariableW(L"PINFORGE_TEST_CHILD", childMode);
-  Host::Process process;
-  const int status = process.RunNoWindow(commandLine.c_str(), std::make_unique<Collector>(&output),
-                                         0, true, true, false);
+  Collector collector(&output);
+  const int status = Host::Process::run(argv, &collector);
   ::SetEnvironmentVariableW(L"PINFORGE_TEST_CHILD", nullptr);
   return status;
 }
 
+/// Sets PATH for the lifetime of the guard.
+class PathChange {
+ public:
+  explicit PathChange(const std::wstring& value) {
+    m_Saved.resize(32768);
+    m_Saved.resize(::GetEnvironmentVariableW(L"PATH", m_Saved.data(),
+                                             static_cast<DWORD>(m_Saved.size())));
+    ::SetEnvironmentVariableW(L"PATH", value.c_str());
+  }
+  ~PathChange() { ::SetEnvironmentVariableW(L"PATH", m_Saved.c_str()); }
+  PathChange(const PathChange&) = delete;
+  PathChange& operator=(const PathChange&) = delete;
+
+ private:
+  std::wstring m_Saved;
+};
+
 TEST(ProcessWin32, DrainsBothStreamsOfABusyChild) {
   std::string output;
-  EXPECT_EQ(run('"' + ownPath() + '"', output, L"flood"), 0);
+  EXPECT_EQ(run({ownPath()}, output, L"flood"), 0);
   EXPECT_EQ(output.size(), 2 * kFloodBytes);
   EXPECT_EQ(static_cast<size_t>(std::count(output.begin(), output.end(), 'e')), kFloodBytes);
 }
@@ -89,47 +107,53 @@ TEST(ProcessWin32, DrainsBothStreamsOfABusyChild) {
 TEST(ProcessWin32, ReturnsTheExitCode) {
   for (const wchar_t* code : {L"7", L"255", L"1000"}) {
     std::string output;
-    EXPECT_EQ(run('"' + ownPath() + '"', output, code), std::wcstol(code, nullptr, 10));
+    EXPECT_EQ(run({ownPath()}, output, code), std::wcstol(code, nullptr, 10));
   }
   std::string output;
-  EXPECT_EQ(run("pinforge-no-such-program", output), -1);
-  EXPECT_EQ(run("", output), -1);
+  EXPECT_EQ(run({"C:\\pinforge\\no-such-program.exe"}, output), -1);
+  EXPECT_EQ(run({}, output), -1);
+  EXPECT_EQ(run({""}, output), -1);
 }
 
-TEST(ProcessWin32, WordsArriveAsSplit) {
-  const struct {
-    const char* words;
-    const char* arrived;
-  } cases[] = {
-      {"plain", "plain|"},
-      {"\"two words\" x", "two words|x|"},
-      {"a\\b \"c:\\dir with space\\\\\"", "a\\b|c:\\dir with space\\\\|"},
-  };
-  for (const auto& c : cases) {
-    SCOPED_TRACE(c.words);
-    std::string output;
-    EXPECT_EQ(run('"' + ownPath() + "\" " + c.words, output, L"args"), 0);
-    EXPECT_EQ(output, c.arrived);
-  }
+TEST(ProcessWin32, ArgumentsArriveAsGiven) {
+  const std::vector<std::string> arguments = {
+      "plain", "two words", "a\\b", "c:\\dir with space\\", "quote\"inside", "", "\xc3\xa9t\xc3\xa9"};
+  std::vector<std::string> argv = {ownPath()};
+  argv.insert(argv.end(), arguments.begin(), arguments.end());
+  std::string output;
+  EXPECT_EQ(run(argv, output, L"args"), 0);
+  std::string expected;
+  for (const std::string& argument : arguments) expected += argument + "|";
+  EXPECT_EQ(output, expected);
 }
 
-TEST(ProcessWin32, RunsBatchFilesByPathAndFromPath) {
+TEST(ProcessWin32, RunsBatchFiles) {
   ScratchFolder folder;
   ASSERT_TRUE(folder.write("pf stub.cmd", "@echo stub %~1\r\n@exit /b 5\r\n"));
   std::string output;
-  EXPECT_EQ(run('"' + folder.file("pf stub.cmd") + "\" \"x y\"", output), 5);
+  EXPECT_EQ(run({folder.file("pf stub.cmd"), "x y"}, output), 5);
   EXPECT_EQ(output, "stub x y\r\n");
+}
 
+TEST(ProcessWin32, FindsProgramsBesideUsThenOnPathWithTheirExtensions) {
+  ScratchFolder folder;
   ASSERT_TRUE(folder.write("pfstub.cmd", "@echo found\r\n"));
-  std::wstring path(32768, L'\0');
-  path.resize(::GetEnvironmentVariableW(L"PATH", path.data(), static_cast<DWORD>(path.size())));
-  const std::wstring folderName = widen(folder.file(""));
-  ::SetEnvironmentVariableW(L"PATH", (folderName + L";" + path).c_str());
-  output.clear();
-  const int status = run("pfstub", output);
-  ::SetEnvironmentVariableW(L"PATH", path.c_str());
-  EXPECT_EQ(status, 0);
-  EXPECT_EQ(output, "found\r\n");
+  ASSERT_TRUE(folder.write("pfdata.txt", ""));
+  const std::string exeDir = Host::File::executableDirectory();
+  {
+    PathChange path(L"relative;" + widen(folder.file("")) + L";C:\\windows\\system32");
+    EXPECT_EQ(Host::Process::findProgram("pfstub"), folder.file("pfstub.cmd"));
+    EXPECT_EQ(Host::Process::findProgram("pfstub.cmd"), folder.file("pfstub.cmd"));
+    EXPECT_EQ(Host::Process::findProgram("pfdata"), "");
+    EXPECT_EQ(Host::Process::findProgram("test_windows"), exeDir + "\\test_windows.exe");
+    for (const char* refused : {"", "a\\pfstub", "a/pfstub", "c:pfstub"})
+      EXPECT_EQ(Host::Process::findProgram(refused), "") << refused;
+    std::string output;
+    EXPECT_EQ(run({Host::Process::findProgram("pfstub")}, output), 0);
+    EXPECT_EQ(output, "found\r\n");
+  }
+  PathChange path(L"relative");
+  EXPECT_EQ(Host::Process::findProgram("pfstub"), "");
 }
 
 }  // namespace

@@ -1,6 +1,6 @@
-// Child processes on Windows: the command line is split into words as on other systems, the
-// program is looked up on PATH with the PATHEXT extensions, and the child runs with its
-// standard output and standard error on two pipes. A second thread drains standard error while
+// Child processes on Windows: programs are looked up with the PATHEXT extensions, batch files
+// run under the command interpreter, and the child runs with its standard output and standard
+// error on two pipes. A second thread drains standard error while
 // the caller's thread drains standard output, so neither pipe can fill up and stall the child.
 // Each child runs in a job object, so that an interrupt also ends whatever the child started.
 #include <windows.h>
@@ -20,29 +20,6 @@ using Host::win32::narrow;
 using Host::win32::widen;
 
 constexpr int kNotStarted = -1;
-
-// Blanks and tabs separate words; a double-quoted stretch keeps its blanks and loses its quotes.
-std::vector<std::string> splitCommandLine(std::string_view line) {
-  std::vector<std::string> words;
-  std::string word;
-  bool inWord = false;
-  bool quoted = false;
-  for (char c : line) {
-    if (c == '"') {
-      quoted = !quoted;
-      inWord = true;
-    } else if (!quoted && (c == ' ' || c == '\t')) {
-      if (inWord) words.push_back(std::move(word));
-      word.clear();
-      inWord = false;
-    } else {
-      word.push_back(c);
-      inWord = true;
-    }
-  }
-  if (inWord) words.push_back(std::move(word));
-  return words;
-}
 
 std::string environmentValue(const wchar_t* name) {
   const DWORD needed = ::GetEnvironmentVariableW(name, nullptr, 0);
@@ -64,31 +41,29 @@ std::vector<std::string> splitList(std::string_view list) {
   return items;
 }
 
-bool isFile(const std::string& path) { return Host::File::isfile(path.c_str()); }
-
 bool endsWithIgnoringCase(std::string_view text, std::string_view tail) {
   return text.size() >= tail.size() &&
          Host::StringBase(text.substr(text.size() - tail.size())).Compare(tail, 1) == 0;
 }
 
-/// The file `program` names: itself when it holds a folder, else the first match on PATH.
-/// A name without an extension also tries each PATHEXT extension, as the command prompt does.
-std::string findProgram(const std::string& program) {
-  std::vector<std::string> extensions = splitList(environmentValue(L"PATHEXT"));
-  if (extensions.empty()) extensions = {".COM", ".EXE", ".BAT", ".CMD"};
-  const bool hasExtension = !Host::FileName(program).GetExtension().IsEmpty();
-  const auto tryIn = [&](const std::string& base) -> std::string {
-    if (hasExtension && isFile(base)) return base;
-    for (const std::string& extension : extensions)
-      if (isFile(base + extension)) return base + extension;
-    return std::string();
-  };
-  if (program.find_first_of("/\\:") != std::string::npos) return tryIn(program);
-  for (const std::string& folder : splitList(environmentValue(L"PATH"))) {
-    const char last = folder.back();
-    const std::string found = tryIn(folder + (last == '\\' || last == '/' ? "" : "\\") + program);
-    if (!found.empty()) return found;
-  }
+/// "C:\\..." or "\\\\server\\...": a folder that does not depend on the current one.
+bool isAbsoluteFolder(std::string_view folder) {
+  const auto separator = [](char c) { return c == '\\' || c == '/'; };
+  if (folder.size() >= 3 && folder[1] == ':' && separator(folder[2])) return true;
+  return folder.size() >= 2 && separator(folder[0]) && separator(folder[1]);
+}
+
+/// `name` in `folder`: as written when it has an extension, else with the first PATHEXT
+/// extension that names a file, as the command prompt looks programs up.
+std::string programIn(std::string_view folder, std::string_view name,
+                      const std::vector<std::string>& extensions) {
+  std::string base(folder);
+  if (base.back() != '\\' && base.back() != '/') base += '\\';
+  base += name;
+  if (!Host::FileName(name).GetExtension().IsEmpty())
+    return Host::File::isfile(base.c_str()) ? base : std::string();
+  for (const std::string& extension : extensions)
+    if (Host::File::isfile((base + extension).c_str())) return base + extension;
   return std::string();
 }
 
@@ -114,22 +89,19 @@ std::string quoteWord(const std::string& word) {
 
 /// The image to start and the command line it receives. A batch file runs under the command
 /// interpreter, which takes the whole quoted line after /s /c as written.
-bool buildLaunch(const std::vector<std::string>& words, std::wstring& image,
+void buildLaunch(const std::vector<std::string>& argv, std::wstring& image,
                  std::wstring& commandLine) {
-  const std::string program = findProgram(words[0]);
-  if (program.empty()) return false;
-  std::string line = quoteWord(program);
-  for (size_t i = 1; i < words.size(); ++i) line += ' ' + quoteWord(words[i]);
-  if (endsWithIgnoringCase(program, ".cmd") || endsWithIgnoringCase(program, ".bat")) {
+  std::string line = quoteWord(argv[0]);
+  for (size_t i = 1; i < argv.size(); ++i) line += ' ' + quoteWord(argv[i]);
+  if (endsWithIgnoringCase(argv[0], ".cmd") || endsWithIgnoringCase(argv[0], ".bat")) {
     std::string shell = environmentValue(L"ComSpec");
     if (shell.empty()) shell = "cmd.exe";
     image = widen(shell);
     commandLine = widen(quoteWord(shell) + " /d /s /c \"" + line + '"');
   } else {
-    image = widen(program);
+    image = widen(argv[0]);
     commandLine = widen(line);
   }
-  return true;
 }
 
 class Handle {
@@ -165,21 +137,16 @@ struct Pipe {
   }
 };
 
-// Hands each read piece on as NUL-terminated text; a NUL inside the output ends a piece. Both
-// reading threads deliver through it, one at a time.
+// Passes what both reading threads get on to the receiver, one piece at a time. Once the
+// receiver declines, the output is still read, so the child never blocks on a full pipe, but
+// no longer passed on.
 class Forwarder {
  public:
   explicit Forwarder(Host::ChildOutput* receiver) : m_Receiver(receiver) {}
   void deliver(const char* data, size_t length) {
     std::lock_guard<std::mutex> guard(m_Lock);
-    size_t start = 0;
-    while (m_Receiver != nullptr && start < length) {
-      std::string_view rest(data + start, length - start);
-      const size_t end = rest.find('\0');
-      const std::string piece(rest.substr(0, end));
-      start += piece.size() + 1;
-      if (!piece.empty() && !m_Receiver->OnOutput(piece.c_str())) m_Receiver = nullptr;
-    }
+    if (m_Receiver != nullptr && !m_Receiver->OnOutput(std::string_view(data, length)))
+      m_Receiver = nullptr;
   }
 
  private:
@@ -205,10 +172,11 @@ HANDLE makeJob() {
   return job;
 }
 
-int spawnAndCollect(const std::vector<std::string>& words, Host::ChildOutput* receiver) {
+int spawnAndCollect(const std::vector<std::string>& argv, Host::ChildOutput* receiver) {
+  if (argv.empty() || !Host::win32::usableName(argv[0])) return kNotStarted;
   std::wstring image;
   std::wstring commandLine;
-  if (words.empty() || !buildLaunch(words, image, commandLine)) return kNotStarted;
+  buildLaunch(argv, image, commandLine);
   Pipe out;
   Pipe err;
   SECURITY_ATTRIBUTES inherit{sizeof(SECURITY_ATTRIBUTES), nullptr, TRUE};
@@ -231,6 +199,7 @@ int spawnAndCollect(const std::vector<std::string>& words, Host::ChildOutput* re
     return kNotStarted;
   Handle processHandle(process.hProcess);
   Handle threadHandle(process.hThread);
+  Host::Interrupt::install();
   Handle job(makeJob());
   if (job.valid() && ::AssignProcessToJobObject(job.get(), process.hProcess))
     Host::Interrupt::setChildGroup(static_cast<long>(reinterpret_cast<intptr_t>(job.get())));
@@ -255,14 +224,27 @@ int spawnAndCollect(const std::vector<std::string>& words, Host::ChildOutput* re
 
 namespace Host {
 
-int Process::RunNoWindow(const char* commandLine, std::unique_ptr<ChildOutput> receiver,
-                         unsigned /*flags*/, bool /*hideWindow*/, bool /*captureOutput*/,
-                         bool /*detach*/) {
-  const int status =
-      commandLine != nullptr ? spawnAndCollect(splitCommandLine(commandLine), receiver.get())
-                             : kNotStarted;
-  if (receiver != nullptr) receiver->OnEnd();
-  return status;
+std::string Process::findProgram(std::string_view name) {
+  if (name.empty() || name.find_first_of(std::string_view("/\\:\0", 4)) != std::string_view::npos)
+    return std::string();
+  std::vector<std::string> extensions = splitList(environmentValue(L"PATHEXT"));
+  if (extensions.empty()) extensions = {".COM", ".EXE", ".BAT", ".CMD"};
+  const std::string exeDir = File::executableDirectory();
+  if (!exeDir.empty()) {
+    std::string found = programIn(exeDir, name, extensions);
+    if (!found.empty()) return found;
+  }
+  for (const std::string& folder : splitList(environmentValue(L"PATH"))) {
+    // A relative entry depends on the current folder; a program is never taken from there.
+    if (!isAbsoluteFolder(folder)) continue;
+    std::string found = programIn(folder, name, extensions);
+    if (!found.empty()) return found;
+  }
+  return std::string();
+}
+
+int Process::run(const std::vector<std::string>& argv, ChildOutput* receiver) {
+  return spawnAndCollect(argv, receiver);
 }
 
 }  // namespace Host
