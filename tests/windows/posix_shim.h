@@ -4,6 +4,7 @@
 #pragma once
 
 #include <direct.h>
+#include <stdio.h>
 #include <stdlib.h>
 #include <string.h>
 
@@ -29,6 +30,18 @@ inline char* mkdtemp(char* pattern) {
     if (_mkdir(pattern) == 0) return pattern;
   }
   return nullptr;
+}
+
+// A read-only memory stream, made as a temporary file holding the bytes.
+inline FILE* fmemopen(void* buffer, size_t size, const char* /*mode*/) {
+  FILE* stream = tmpfile();
+  if (stream == nullptr) return nullptr;
+  if (fwrite(buffer, 1, size, stream) != size) {
+    fclose(stream);
+    return nullptr;
+  }
+  rewind(stream);
+  return stream;
 }
 
 // x86-64 Windows pages are 4 KiB.

@@ -162,6 +162,34 @@ void drain(HANDLE pipe, Forwarder& forwarder) {
     forwarder.deliver(buffer, got);
 }
 
+/// The attribute list that limits what a child inherits to the given handles.
+class HandleList {
+ public:
+  HandleList(HANDLE* handles, size_t count) {
+    SIZE_T size = 0;
+    ::InitializeProcThreadAttributeList(nullptr, 1, 0, &size);
+    m_Storage.resize(size);
+    auto* list = reinterpret_cast<LPPROC_THREAD_ATTRIBUTE_LIST>(m_Storage.data());
+    if (size == 0 || !::InitializeProcThreadAttributeList(list, 1, 0, &size)) return;
+    m_List = list;
+    if (!::UpdateProcThreadAttribute(list, 0, PROC_THREAD_ATTRIBUTE_HANDLE_LIST, handles,
+                                     count * sizeof(HANDLE), nullptr, nullptr)) {
+      ::DeleteProcThreadAttributeList(list);
+      m_List = nullptr;
+    }
+  }
+  ~HandleList() {
+    if (m_List != nullptr) ::DeleteProcThreadAttributeList(m_List);
+  }
+  HandleList(const HandleList&) = delete;
+  HandleList& operator=(const HandleList&) = delete;
+  LPPROC_THREAD_ATTRIBUTE_LIST get() const { return m_List; }
+
+ private:
+  std::vector<char> m_Storage;
+  LPPROC_THREAD_ATTRIBUTE_LIST m_List = nullptr;
+};
+
 /// A job that ends its processes when its last handle closes: when we end, so does the child.
 HANDLE makeJob() {
   HANDLE job = ::CreateJobObjectW(nullptr, nullptr);
@@ -184,18 +212,24 @@ int spawnAndCollect(const std::vector<std::string>& argv, Host::ChildOutput* rec
                              OPEN_EXISTING, 0, nullptr));
   if (!out.open() || !err.open() || !input.valid()) return kNotStarted;
 
-  STARTUPINFOW startup{};
-  startup.cb = sizeof startup;
-  startup.dwFlags = STARTF_USESTDHANDLES;
-  startup.hStdInput = input.get();
-  startup.hStdOutput = out.write.get();
-  startup.hStdError = err.write.get();
+  // The child inherits these three handles and nothing else, so it cannot hold our output
+  // or error file open.
+  HANDLE inherited[3] = {input.get(), out.write.get(), err.write.get()};
+  HandleList handles(inherited, 3);
+  STARTUPINFOEXW startup{};
+  startup.StartupInfo.cb = sizeof startup;
+  startup.StartupInfo.dwFlags = STARTF_USESTDHANDLES;
+  startup.StartupInfo.hStdInput = inherited[0];
+  startup.StartupInfo.hStdOutput = inherited[1];
+  startup.StartupInfo.hStdError = inherited[2];
+  startup.lpAttributeList = handles.get();
   // Without a console of our own, a console child would open a window of its own.
-  DWORD creation = CREATE_SUSPENDED | CREATE_UNICODE_ENVIRONMENT;
+  DWORD creation = CREATE_SUSPENDED | CREATE_UNICODE_ENVIRONMENT | EXTENDED_STARTUPINFO_PRESENT;
   if (::GetConsoleWindow() == nullptr) creation |= CREATE_NO_WINDOW;
   PROCESS_INFORMATION process{};
-  if (!::CreateProcessW(image.c_str(), commandLine.data(), nullptr, nullptr, TRUE, creation,
-                        nullptr, nullptr, &startup, &process))
+  if (handles.get() == nullptr ||
+      !::CreateProcessW(image.c_str(), commandLine.data(), nullptr, nullptr, TRUE, creation,
+                        nullptr, nullptr, &startup.StartupInfo, &process))
     return kNotStarted;
   Handle processHandle(process.hProcess);
   Handle threadHandle(process.hThread);
