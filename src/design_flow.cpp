@@ -11,6 +11,7 @@
 
 #include "engine/forge.h"
 #include "run_context.h"
+#include "run_hints.h"
 
 namespace {
 
@@ -43,6 +44,7 @@ bool runDesignFlow(RunContext& context) {
 }
 
 bool runStages(RunContext& context) {
+  context.m_Extractor.configure(context.m_ScanSettings);
   context.m_Extractor.Parse(context.m_Language);
   if (!reportUnreadableFiles(context)) return false;
   if (context.m_Extractor.findDesignUnit("work", context.m_ModuleName.c_str(),
@@ -51,11 +53,20 @@ bool runStages(RunContext& context) {
     text += context.m_ModuleName.view();
     text += ") not found.";
     context.reportMessage(text, RunContext::Severity::Error);
+    const std::string hint =
+        unitNotFoundHint(context.m_ModuleName.view(), context.m_Extractor.listUnits());
+    if (!hint.empty()) context.reportMessage(hint, RunContext::Severity::Warning);
+    reportLanguageHint(context);
     return false;
   }
-  if (!checkUnitHeader(context)) return false;
+  if (!checkUnitHeader(context)) {
+    reportLanguageHint(context);
+    return false;
+  }
+  if (!checkGenericOverrides(context)) return false;
   if (!prepareRun(context)) return false;
   if (!buildPortList(context)) return false;
+  buildUnitData(context);
   if (Host::FileName(context.m_TemplateFileName.view()).GetExtension().Compare(".tcl", 0) == 0)
     return handOverOutput(context) && context.runTclGenerator();
   return runTemplateEngine(context);
@@ -70,6 +81,21 @@ bool reportUnreadableFiles(RunContext& context) {
     context.reportMessage(text, RunContext::Severity::Error);
   }
   return unreadable.empty();
+}
+
+void reportLanguageHint(RunContext& context) {
+  const std::string hint =
+      languageHint(context.m_Extractor.files(), context.m_Language == ScanExtractor::Verilog);
+  if (!hint.empty()) context.reportMessage(hint, RunContext::Severity::Warning);
+}
+
+bool checkGenericOverrides(RunContext& context) {
+  for (const std::string& name : context.m_Extractor.unknownOverrides())
+    context.reportMessage(
+        unknownGenericMessage(context.m_ModuleName.view(), name,
+                              context.m_Extractor.getGenerics(), context.m_Verilog != 0),
+        RunContext::Severity::Error);
+  return !context.hasErrors();
 }
 
 bool checkUnitHeader(RunContext& context) {
@@ -133,7 +159,10 @@ bool runTemplateEngine(RunContext& context) {
   {
     Forge forge(context.m_OutputStream, context.m_TemplateStream, context.m_DebugStream,
                 context.m_DesignData.get());
+    forge.setTemplateName(context.m_TemplateFileName.view());
     forge.processTemplate();
+    for (const std::string& warning : forge.warnings())
+      context.reportMessage("WARNING: " + warning, RunContext::Severity::Warning);
     std::string message;
     if (forge.getResult(message) != 0) {
       std::string text = "FATAL: ";

@@ -2,6 +2,8 @@
 // files, checks the required inputs, runs the design flow and decides the exit status.
 #pragma once
 
+#include <string_view>
+
 class RunContext;
 class UT_CMDARGS;
 
@@ -9,7 +11,8 @@ class UT_CMDARGS;
 inline constexpr const char* kUsageText =
     "pinforge {-lib <libname> {<vhdfile>}} \t[-lang vhdl|verilog] \t[-module <module_name>] "
     "[-prj <project>] [-template <template_file>] \t[-o <stbfile>] [-err <errfile>] "
-    "[-deleteonerror] [--nodelist] [--a] [--inc]";
+    "[-deleteonerror] [--nodelist] [--a] [--inc] {-g <name>=<value>} {-D <macro>} {-I <incdir>} "
+    "[--list]";
 
 /// One whole run of the program over the process's arguments; returns the exit status (0 on
 /// success, 1 when errors occurred). Installs the interrupt handlers and closes the "-err"
@@ -23,3 +26,11 @@ void registerLibraries(RunContext& context, const UT_CMDARGS& parser);
 /// True when the module, project and input file names were given and the output and template
 /// streams are open.
 bool checkRequiredInputs(const RunContext& context);
+
+/// The declaration of switch `name` in the usage text without its enclosing brackets
+/// ("-prj <project>", "-lib <libname> {<vhdfile>}"); empty for an undeclared switch.
+std::string_view usageOf(std::string_view name);
+
+/// Reads every -g, -D and -I into the context's reader settings, reporting each malformed one
+/// as an error; true when all were well formed.
+bool readScanSettings(RunContext& context, const UT_CMDARGS& parser);

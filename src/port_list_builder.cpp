@@ -1,10 +1,12 @@
 // Turns the found unit's ports into the run's port records: direction letters, bounds, the
-// bit width of integer ranges (with a warning, since only symbols can use it) and, in debug
-// mode, one line per port on standard output.
+// bit width of integer ranges (with a warning, since only symbols can use it), declared types
+// and, in debug mode, one line per port on standard output; and copies the unit's generics
+// and context into the design data.
 #include <algorithm>
 #include <bit>
 #include <cstdint>
 #include <cstdio>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <utility>
@@ -31,11 +33,53 @@ char directionLetter(int code) {
   switch (code) {
     case ScanPort::Input:
       return 'I';
+    // An interface port carries signals both ways.
     case ScanPort::Inout:
+    case ScanPort::InterfacePort:
       return 'B';
     default:
       return 'O';
   }
+}
+
+PortTypeKind kindOf(const ScanPort& port) {
+  switch (port.direction() == ScanPort::InterfacePort ? ScanPort::Kind::Interface : port.kind()) {
+    case ScanPort::Kind::Bit:
+      return PortTypeKind::Bit;
+    case ScanPort::Kind::BitVector:
+      return PortTypeKind::BitVector;
+    case ScanPort::Kind::Integer:
+      return PortTypeKind::Integer;
+    case ScanPort::Kind::Record:
+      return PortTypeKind::Record;
+    case ScanPort::Kind::Array:
+      return PortTypeKind::Array;
+    case ScanPort::Kind::Enum:
+      return PortTypeKind::Enum;
+    case ScanPort::Kind::Interface:
+      return PortTypeKind::Interface;
+    case ScanPort::Kind::Other:
+      break;
+  }
+  return PortTypeKind::Other;
+}
+
+PortMode modeOf(int direction) {
+  switch (direction) {
+    case ScanPort::Buffer:
+      return PortMode::Buffer;
+    case ScanPort::Linkage:
+      return PortMode::Linkage;
+    case ScanPort::Ref:
+      return PortMode::Ref;
+    default:
+      return PortMode::FromLetter;
+  }
+}
+
+/// VHDL names ignore case, Verilog names do not.
+bool sameName(std::string_view a, std::string_view b, bool verilog) {
+  return verilog ? a == b : Host::StringBase(a).Compare(b, 1) == 0;
 }
 
 /// Integer-like types whose range gives a value span rather than a bit range.
@@ -119,11 +163,34 @@ bool buildPortList(RunContext& context) {
       if (isIntegerType(context.m_CurrentPortType)) applyIntegerRule(context, *port);
       context.m_CurrentRangeKind = port->isAscending() != 0 ? kRangeTo : kRangeDownto;
     }
-    context.m_DesignData->appendOwned(new PortRecord(context.m_CurrentPortName.view(),
-                                                     context.m_CurrentLeft,
-                                                     context.m_CurrentRight, letter));
+    // A range the reader could not evaluate has no bounds; the record carries its problem.
+    if (port->rangeUnknown()) context.m_CurrentLeft = context.m_CurrentRight = -1;
+    auto record = std::make_unique<PortRecord>(context.m_CurrentPortName.view(),
+                                               context.m_CurrentLeft, context.m_CurrentRight,
+                                               letter);
+    record->m_DeclaredType = port->declaredType();
+    record->m_Kind = kindOf(*port);
+    record->m_Mode = modeOf(port->direction());
+    if (port->rangeUnknown()) record->setRangeUnknown(port->rangeProblem());
+    context.m_DesignData->appendOwned(record.release());
     if (context.m_Debug) printDebugLine(context, port->direction());
     resetScratch(context);
   }
   return !context.hasErrors();
+}
+
+void buildUnitData(RunContext& context) {
+  StbDataList& data = *context.m_DesignData;
+  const bool verilog = context.m_Verilog != 0;
+  data.m_Language = verilog ? DesignLanguage::Verilog : DesignLanguage::Vhdl;
+  data.m_Context = context.m_Extractor.getContext();
+  data.m_Generics.clear();
+  for (const ScanGeneric& generic : context.m_Extractor.getGenerics()) {
+    GenericRecord record{generic.name, generic.typeText, generic.defaultText,
+                         generic.value.value_or(generic.defaultText)};
+    // A name given twice takes its last -g.
+    for (const auto& [name, value] : context.m_ScanSettings.genericOverrides)
+      if (sameName(name, generic.name, verilog)) record.m_Value = value;
+    data.m_Generics.push_back(std::move(record));
+  }
 }

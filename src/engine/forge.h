@@ -11,6 +11,7 @@
 #include <string>
 #include <string_view>
 #include <unordered_map>
+#include <vector>
 
 #include "data/port_record.h"
 #include "data/typed_lists.h"
@@ -27,7 +28,8 @@ class Forge {
   enum RangePosition : uint32_t { AsPrefix = 0, AsPostfix = 1 };
   /// Status values.
   enum : uint32_t { kStatusOk = 0, kStatusTemplateError = 2 };
-  /// Deepest nesting of @IFHAS/@IFNHAS/@IFPORT/@IFNPORT blocks.
+  /// Deepest nesting of conditional blocks (@IFHAS, @IFPORT, @IFDEFAULT@, @IFTYPED@ and their
+  /// negations together).
   static constexpr uint32_t kMaxConditionalDepth = 9;
   /// m_Message keeps at most this many bytes.
   static constexpr size_t kMessageCapacity = 255;
@@ -49,6 +51,11 @@ class Forge {
   void reportRangeError(const PortRecord& port);
   /// True once an error has been recorded.
   bool failed() const { return m_Status != kStatusOk; }
+  /// The template's name as the user gave it; warnings name the template by it.
+  void setTemplateName(std::string_view name) { m_TemplateName = name; }
+  /// The warnings of the expansion, in the order they arose, each one line without a newline.
+  /// A template that stops with an error has none about its end.
+  const std::vector<std::string>& warnings() const { return m_Warnings; }
 
   // --- Main loop and dispatch (dispatch.cpp) ---
   /// Expands the whole template. True when it ran to its end without a stop.
@@ -86,11 +93,20 @@ class Forge {
 
   // --- Conditionals (conditionals.cpp) ---
   bool doIf(std::string_view token, bool isIfHas);
-  /// @IFPORT / @IFNPORT: tests the name of `port` (null outside a port iteration) against a
-  /// pattern in which "*" matches any run and "?" one character.
+  /// @IFPORT / @IFNPORT: tests the name of `port` (null outside a port iteration) against
+  /// alternatives separated by "|", each a pattern in which "*" matches any run and "?" one
+  /// character.
   bool doIfPort(std::string_view token, bool isIfPort, const PortRecord* port);
+  /// @IFDEFAULT@, @IFNDEFAULT@, @IFTYPED@, @IFNTYPED@ (keyword `index`): tests whether the
+  /// current generic has default text, or whether the current generic or `port` (null outside
+  /// a port iteration) has declared type text.
+  bool doIfDeclared(int index, const PortRecord* port);
   bool doEndIf();
-  bool addCondition(uint32_t value);
+  /// Opens a block kept (value 2) or dropped (value 1), opened by keyword `index` on the
+  /// current line.
+  bool addCondition(uint32_t value, int index);
+  /// After a template that ran to its end: the warning about a block still open, if any.
+  void warnAboutOpenBlock();
   int compareSignalName(std::string_view name, std::string_view pattern) const;
   /// Whether a port selected by port-list keyword `kind` has a name matching `pattern` (the
   /// @IFHAS rules); null (after reporting) when deciding needs a range that is unknown.
@@ -173,6 +189,9 @@ class Forge {
   bool m_Map = false;
   bool m_CaseSensitiveIf = true;
   uint32_t m_Conditions[11] = {0};
+  /// For each open block: the keyword that opened it and the template line it was on.
+  int m_ConditionWords[11] = {0};
+  int32_t m_ConditionLines[11] = {0};
   /// The bus that selectPort is handing out bit by bit, if any; its record is the current bit.
   std::unique_ptr<ExpansionList> m_Expansion;
   uint32_t m_Column = 0;
@@ -193,4 +212,6 @@ class Forge {
   /// Results of @IFHAS tests by kind, case rule and pattern: the ports and generics do not
   /// change during an expansion, so a test repeated in an iteration body is answered once.
   std::unordered_map<std::string, bool> m_MatchResults;
+  std::string m_TemplateName;
+  std::vector<std::string> m_Warnings;
 };

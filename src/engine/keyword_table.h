@@ -1,11 +1,11 @@
-// The template language's vocabulary: the 61 variable and directive words in one sorted table,
+// The template language's vocabulary: the 65 variable and directive words in one sorted table,
 // the prefix lookup that maps a token to its word, and the port-list kinds (which ports each of
 // the seventeen port-list variables selects).
 #pragma once
 
 #include <string_view>
 
-/// Indices of the keyword table. Variables come first (0-27), then directives (28-60). The
+/// Indices of the keyword table. Variables come first (0-27), then directives (28-64). The
 /// order is the table's sort order and is relied on by callers that store an index.
 enum Keyword : int {
   kKwBBusPort = 0,
@@ -45,38 +45,42 @@ enum Keyword : int {
   kKwGenericDefault = 34,
   kKwGenericType = 35,
   kKwGenericValue = 36,
-  kKwIfHas = 37,
-  kKwIfNHas = 38,
-  kKwIfNPort = 39,
-  kKwIfPort = 40,
-  kKwInvCase = 41,
-  kKwIterate = 42,
-  kKwIterator = 43,
-  kKwLowCase = 44,
-  kKwMap = 45,
-  kKwMapSignal = 46,
-  kKwNoExpandBus = 47,
-  kKwNoMap = 48,
-  kKwNoShowRange = 49,
-  kKwNoSuppresNewLine = 50,
-  kKwPercent = 51,
-  kKwPortMode = 52,
-  kKwPortType = 53,
-  kKwSameCase = 54,
-  kKwSet = 55,
-  kKwShowRange = 56,
-  kKwSuppresNewLine = 57,
-  kKwTab = 58,
-  kKwUpCase = 59,
-  kKwVhdlTypeDec = 60,
+  kKwIfDefault = 37,
+  kKwIfHas = 38,
+  kKwIfNDefault = 39,
+  kKwIfNHas = 40,
+  kKwIfNPort = 41,
+  kKwIfNTyped = 42,
+  kKwIfPort = 43,
+  kKwIfTyped = 44,
+  kKwInvCase = 45,
+  kKwIterate = 46,
+  kKwIterator = 47,
+  kKwLowCase = 48,
+  kKwMap = 49,
+  kKwMapSignal = 50,
+  kKwNoExpandBus = 51,
+  kKwNoMap = 52,
+  kKwNoShowRange = 53,
+  kKwNoSuppresNewLine = 54,
+  kKwPercent = 55,
+  kKwPortMode = 56,
+  kKwPortType = 57,
+  kKwSameCase = 58,
+  kKwSet = 59,
+  kKwShowRange = 60,
+  kKwSuppresNewLine = 61,
+  kKwTab = 62,
+  kKwUpCase = 63,
+  kKwVhdlTypeDec = 64,
 };
 
 /// Number of words in the table.
-inline constexpr int kKeywordCount = 61;
+inline constexpr int kKeywordCount = 65;
 /// Number of variable words ("%...%"); they come before every directive.
 inline constexpr int kVariableCount = 28;
 /// lookupKeyword's result for a token that begins with neither "%" nor "@" (plain text).
-inline constexpr int kKwPlainText = 61;
+inline constexpr int kKwPlainText = 65;
 /// lookupKeyword's result for a keyword token that matches no word.
 inline constexpr int kKwNoMatch = -1;
 
@@ -85,7 +89,7 @@ inline constexpr int kKwNoMatch = -1;
 /// kKwNoMatch when no word matches.
 int lookupKeyword(std::string_view token);
 
-/// The table word of `index` (lower case, as stored); empty for an index outside 0-60.
+/// The table word of `index` (lower case, as stored); empty for an index outside 0-64.
 std::string_view keywordWord(int index);
 
 /// Which ports a port-list kind selects by width.

@@ -131,6 +131,7 @@ TEST_P(DesignWordsTest, WritesWholeOutputAndResult) {
   EXPECT_EQ(run.completed, ok);
   EXPECT_EQ(run.status, ok ? 0u : 2u);
   EXPECT_EQ(run.message, ok ? handlers_test::kNoError : row.message);
+  EXPECT_TRUE(run.warnings.empty()) << run.warnings.front();
 }
 
 std::string rowName(const ::testing::TestParamInfo<Row>& info) { return info.param.name; }
@@ -227,9 +228,75 @@ INSTANTIATE_TEST_SUITE_P(
             "std_logic, bus_if.slave|std_logic, std_logic", ""}),
     rowName);
 
+// Generics with and without default and type, ports with and without declared type.
+const Design kDeclared{DesignLanguage::Verilog,
+                       {{"clk", -1, -1, 'I', "wire", K::Bit},
+                        {"d", 1, 0, 'I', "", K::Other},
+                        {"q", -1, -1, 'O', "logic", K::Bit}},
+                       {{"WIDTH", "natural", "8", "8"},
+                        {"DEPTH", "positive", "", "16"},
+                        {"P", "", "4", "4"}},
+                       ""};
+
+// `word` as the innermost of `depth` nested blocks inside a generic iteration.
+std::string nestedInGenericBody(const std::string& word, int depth) {
+  std::string text = "@ITERATE@%GENERIC%";
+  for (int i = 1; i < depth; ++i) text += "@IFHAS PORT=*@";
+  text += word + "x";
+  for (int i = 0; i < depth; ++i) text += "@ENDIF@";
+  return text + "@ENDITERATE@";
+}
+
+const std::string kDefaultOnly =
+    "@IFDEFAULT@ and @IFNDEFAULT@ may only occur inside an @ITERATE@%GENERIC% body.";
+const std::string kTypedOnly =
+    "@IFTYPED@ and @IFNTYPED@ may only occur inside an @ITERATE@ over ports or generics.";
+
+INSTANTIATE_TEST_SUITE_P(
+    IfDefaultIfTyped, DesignWordsTest,
+    ::testing::Values(
+        Row{"VhdlClauseDefaultsOnlyWhereGiven", &kDeclared,
+            "@SET SIGDELIM=;@@ITERATE@%GENERIC%@ITERATOR@@IFDEFAULT@ := @GENERIC_DEFAULT@@ENDIF@"
+            "@ENDITERATE@",
+            "WIDTH := 8;DEPTH;P := 4", ""},
+        Row{"NoDefault", &kDeclared,
+            "@ITERATE@%GENERIC%@IFNDEFAULT@-g @ITERATOR@=@GENERIC_VALUE@@ENDIF@@ENDITERATE@",
+            ", -g DEPTH=16, ", ""},
+        Row{"VerilogParameterTypes", &kDeclared,
+            "@ITERATE@%GENERIC%parameter @IFTYPED@@GENERIC_TYPE@ @ENDIF@@ITERATOR@@ENDITERATE@",
+            "parameter natural WIDTH, parameter positive DEPTH, parameter P", ""},
+        Row{"UntypedGeneric", &kDeclared, "@ITERATE@%GENERIC%@IFNTYPED@@ITERATOR@@ENDIF@@ENDITERATE@",
+            ", , P", ""},
+        Row{"PortTypes", &kDeclared,
+            "@ITERATE@%SIGNAL%@IFTYPED@@PORT_TYPE@ @ENDIF@@IFNTYPED@? @ENDIF@@ITERATOR@"
+            "@ENDITERATE@",
+            "wire clk, ? d, logic q", ""},
+        Row{"NestWithIfHasAndIfPort", &kDeclared,
+            "@ITERATE@%PORT%@IFHAS GENERIC=P@@IFNPORT q@@IFTYPED@<@ITERATOR@>@ENDIF@@ENDIF@"
+            "@ENDIF@@ENDITERATE@",
+            "<clk>, , ", ""},
+        Row{"FailedBlockCountsThem", &kDeclared,
+            "@IFHAS PORT=zz@@IFDEFAULT@@IFNTYPED@@ENDIF@@IFTYPED@@IFNDEFAULT@@ENDIF@@ENDIF@x"
+            "@ENDIF@@ENDIF@y",
+            "y", ""},
+        Row{"NineLevels", &kDeclared, nestedInGenericBody("@IFDEFAULT@", 9), "x, , x", ""},
+        Row{"TenthLevel", &kDeclared, nestedInGenericBody("@IFNTYPED@", 10), "",
+            errorAt(1, "Maximum number of nested @IFHAS or @IFNHAS directives exceeded.")},
+        Row{"DefaultOutside", &kDeclared, "a@IFDEFAULT@b@ENDIF@", "a", errorAt(1, kDefaultOnly)},
+        Row{"NoDefaultInPortBody", &kDeclared, "@ITERATE@%PORT%@IFNDEFAULT@@ENDIF@@ENDITERATE@",
+            ", ", errorAt(1, kDefaultOnly)},
+        Row{"TypedOutside", &kDeclared, "x\n@IFNTYPED@", "x\n", errorAt(2, kTypedOnly)},
+        Row{"WordTakesNoArgument", &kDeclared,
+            "@ITERATE@%GENERIC%@IFDEFAULT x@@ENDIF@@ENDITERATE@", "",
+            errorAt(1, "Keyword: @IFDEFAULT x@ is not a valid Variable or Directive name.")}),
+    rowName);
+
 const Design kOnePort{DesignLanguage::Vhdl, {{"Clk_In", -1, -1, 'I', "", K::Other}}, {}, ""};
 const std::string kIfPortForm = errorAt(
     1, "Invalid syntax for @IFPORT or @IFNPORT directive, must be of the form:\n@IFPORT PATTERN@");
+const std::string kIfPortAlternative = errorAt(
+    1, "Invalid syntax for @IFPORT or @IFNPORT directive, an alternative is empty:\n"
+       "@IFPORT PATTERN|PATTERN@");
 
 INSTANTIATE_TEST_SUITE_P(
     IfPort, DesignWordsTest,
@@ -263,7 +330,22 @@ INSTANTIATE_TEST_SUITE_P(
             errorAt(1, "@IFPORT and @IFNPORT" + kPortsOnly)},
         Row{"NoPattern", &kOnePort, "@ITERATE@%PORT%@IFPORT@@ENDIF@@ENDITERATE@", "", kIfPortForm},
         Row{"TwoPatterns", &kOnePort, "@ITERATE@%PORT%@IFPORT a b@@ENDIF@@ENDITERATE@", "",
-            kIfPortForm}),
+            kIfPortForm},
+        Row{"Alternatives", &kVhdl,
+            "@ITERATE@%IPORT%@IFPORT clk*|*clk|*_clk_i@C@ENDIF@"
+            "@IFNPORT rst*|*reset*@=@ITERATOR@@ENDIF@@ENDITERATE@",
+            "C=clk, , =data", ""},
+        Row{"AlternativesFollowCaseRule", &kOnePort,
+            "@SET CASESENSITIVEIF=OFF@@ITERATE@%PORT%@IFPORT x|CLK_IN@y@ENDIF@@ENDITERATE@", "y",
+            ""},
+        Row{"EmptyAlternativeBetween", &kOnePort,
+            "@ITERATE@%PORT%@IFPORT a||b@@ENDIF@@ENDITERATE@", "", kIfPortAlternative},
+        Row{"EmptyFirstAlternative", &kOnePort, "@ITERATE@%PORT%@IFNPORT |a@@ENDIF@@ENDITERATE@",
+            "", kIfPortAlternative},
+        Row{"EmptyLastAlternative", &kOnePort, "@ITERATE@%PORT%@IFPORT a|@@ENDIF@@ENDITERATE@", "",
+            kIfPortAlternative},
+        Row{"LoneBar", &kOnePort, "@ITERATE@%PORT%@IFPORT |@@ENDIF@@ENDITERATE@", "",
+            kIfPortAlternative}),
     rowName);
 
 // One pattern row: does the port's name match?
@@ -282,6 +364,10 @@ TEST(IfPort, Patterns) {
       {"abcbc", "a*bc", true},    {"abcbd", "a*bc", false},   {"aXbXc", "*X*X*", true},
       {"aXb", "*X*X*", false},    {"a*b", "a\\*b", false},    {"mississippi", "*ss*ss*i", true},
       {"Data", "data", false},    {"data", "d**a", true},     {"x", "", false},
+      {"sys_clk", "clk*|*clk", true},   {"x_clk_i", "clk*|*clk|*_clk_i", true},
+      {"clkx", "a|*x", true},           {"b", "a|b", true},
+      {"a|b", "a|b", false},            {"ab", "a|b", false},
+      {"a|b", "a?b", true},
   };
   for (const GlobRow& row : rows) {
     const Design design{DesignLanguage::Vhdl, {{row.name, -1, -1, 'I', "", K::Other}}, {}, ""};

@@ -171,6 +171,13 @@ TEST(Trace, HandlerLines) {
        "doIterate() Iterating for signal=d\n"
        "doIterate() Iterating for signal=d\n"},
       {"@ITERATE@%module%", "eatIterate() Iterator=%module%\n"},
+      {"@IFHAS PORT=zz@@IfTyped@@ENDIF@@ENDIF@",
+       "doIf() called: token=@IFHAS PORT=zz@|Condition=1\n"
+       "addCondition() called: condition=1\n"
+       "doIfDeclared() called: token=@iftyped@\n"
+       "addCondition() called: condition=1\n"
+       "doEndIf() called: m_ConditionalDepth=2\n"
+       "doEndIf() called: m_ConditionalDepth=1\n"},
   };
   for (const auto& [templateText, lines] : rows) {
     EXPECT_EQ(handlerLines(runTemplate(templateText, ports, true).trace), lines) << templateText;

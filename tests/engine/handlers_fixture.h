@@ -1,5 +1,5 @@
 // Runs one template through a processor over in-memory design data and captures what it wrote:
-// the output, the result status and message, and (on request) the trace lines.
+// the output, the result status, message and warnings, and (on request) the trace lines.
 #pragma once
 
 #include <cstdint>
@@ -26,7 +26,11 @@ struct Run {
   std::string message;
   bool completed = false;
   std::string trace;
+  std::vector<std::string> warnings;
 };
+
+/// The template name every run here gives the processor.
+inline constexpr std::string_view kTemplateName = "t.tmpl";
 
 /// A temporary file holding `text`, positioned at its start. The caller closes it.
 inline std::FILE* fileWith(std::string_view text) {
@@ -63,8 +67,10 @@ inline Run runOn(std::string_view templateText, StbDataList& data, bool traced =
   Run run;
   {
     Forge forge(out, in, debug, &data);
+    forge.setTemplateName(kTemplateName);
     run.completed = forge.processTemplate();
     run.status = forge.getResult(run.message);
+    run.warnings = forge.warnings();
   }
   run.output = readAll(out);
   if (debug != nullptr) {

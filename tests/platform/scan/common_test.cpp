@@ -1,6 +1,7 @@
 // The shared scan pieces: checked arithmetic, offsets to lines, and message formatting.
 #include <gtest/gtest.h>
 
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include <cstdint>
@@ -153,6 +154,17 @@ TEST(SourceBuffer, ReportsWhyAFileCannotBeRead) {
   EXPECT_EQ(empty->text().size(), 0u);
   EXPECT_EQ(empty->begin()[0], '\0');
   std::remove(emptyPath.c_str());
+}
+
+TEST(SourceBuffer, RefusesFifosAndDevicesWithoutBlocking) {
+  std::string fifo = ::testing::TempDir() + "/fifo_" + std::to_string(::getpid()) + ".v";
+  ASSERT_EQ(::mkfifo(fifo.c_str(), 0600), 0);
+  for (const std::string& path : {fifo, std::string("/dev/zero"), std::string("/dev/null")}) {
+    std::string error;
+    EXPECT_EQ(scan::SourceBuffer::open(path, error), nullptr) << path;
+    EXPECT_EQ(error, "not a regular file") << path;
+  }
+  std::remove(fifo.c_str());
 }
 
 }  // namespace

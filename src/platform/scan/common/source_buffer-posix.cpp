@@ -13,15 +13,38 @@
 
 namespace scan {
 
+namespace {
+
+// Only a regular file has a size to map and an end to reach: a FIFO would block the open and
+// a device such as /dev/zero never ends.
+bool refuseIrregular(const struct stat& info, std::string& error) {
+  if (S_ISREG(info.st_mode)) return false;
+  error = S_ISDIR(info.st_mode) ? "is a directory" : "not a regular file";
+  return true;
+}
+
+}  // namespace
+
 std::unique_ptr<SourceBuffer> SourceBuffer::open(const std::string& path, std::string& error) {
-  int fd = ::open(path.c_str(), O_RDONLY | O_CLOEXEC);
+  struct stat info {};
+  if (::stat(path.c_str(), &info) != 0) {
+    error = std::strerror(errno);
+    return nullptr;
+  }
+  if (refuseIrregular(info, error)) return nullptr;
+  // Non-blocking, so that a file swapped for a FIFO after the stat cannot hang the open; the
+  // fstat below then sees what was really opened.
+  int fd = ::open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
   if (fd < 0) {
     error = std::strerror(errno);
     return nullptr;
   }
-  struct stat info {};
-  if (fstat(fd, &info) != 0 || !S_ISREG(info.st_mode)) {
-    error = S_ISDIR(info.st_mode) ? "is a directory" : "not a regular file";
+  if (fstat(fd, &info) != 0) {
+    error = std::strerror(errno);
+    ::close(fd);
+    return nullptr;
+  }
+  if (refuseIrregular(info, error)) {
     ::close(fd);
     return nullptr;
   }

@@ -18,7 +18,9 @@ struct LineColumn {
 
 class SourceBuffer {
  public:
-  /// Maps `path` read-only. Returns null and sets `error` (the system's reason) on failure.
+  /// Maps `path` read-only. Returns null and sets `error` on failure: the system's reason, or
+  /// "is a directory" / "not a regular file" for anything but a regular file (a FIFO, a
+  /// device), which is refused without being opened for reading.
   static std::unique_ptr<SourceBuffer> open(const std::string& path, std::string& error);
   /// A buffer over text held in memory (preprocessed text, tests, fuzzing).
   static std::unique_ptr<SourceBuffer> fromText(std::string path, std::string text);

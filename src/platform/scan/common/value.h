@@ -17,6 +17,13 @@ class Value {
  public:
   Value() = default;
   static Value integer(int64_t v) { return Value(v); }
+  /// A Verilog unsigned integer of `width` bits (1..64): `bits` already masked to the width.
+  /// Arithmetic on it wraps at the width instead of being checked.
+  static Value unsignedInteger(int64_t bits, int width) {
+    Value value(bits);
+    value.m_UnsignedWidth = width;
+    return value;
+  }
   static Value real(double v) { return Value(v); }
   static Value boolean(bool v) { return Value(v); }
   static Value string(std::string v) { return Value(std::move(v)); }
@@ -28,6 +35,8 @@ class Value {
   bool isBoolean() const { return std::holds_alternative<bool>(m_Data); }
   bool isString() const { return std::holds_alternative<std::string>(m_Data); }
   bool isComposite() const { return std::holds_alternative<std::shared_ptr<const Composite>>(m_Data); }
+  /// The width of an unsigned integer; 0 for every other value.
+  int unsignedWidth() const { return m_UnsignedWidth; }
 
   int64_t asInteger() const { return std::get<int64_t>(m_Data); }
   double asReal() const { return std::get<double>(m_Data); }
@@ -46,6 +55,7 @@ class Value {
   std::variant<std::monostate, int64_t, double, bool, std::string,
                std::shared_ptr<const Composite>>
       m_Data;
+  int m_UnsignedWidth = 0;
 };
 
 /// An array or record value. An array keeps its index range's left bound and direction; a

@@ -10,6 +10,9 @@ namespace {
 
 constexpr size_t kMaxSteps = 1000000;
 constexpr int kMaxDepth = 200;
+// Expression nesting, parameters defined through parameters and nested statements all use
+// the native stack; this bound keeps hostile input well inside it, sanitizers included.
+constexpr int kMaxNesting = 1000;
 
 bool isComparison(const std::string& op) {
   return op == "==" || op == "!=" || op == "===" || op == "!==" || op == "==?" || op == "!=?" ||
@@ -43,6 +46,48 @@ uint64_t lowMask(int64_t width) {
   return width >= 64 ? ~uint64_t{0} : (uint64_t{1} << width) - 1;
 }
 
+// The low bit and width of x[i], x[i:j], x[i+:j] or x[i-:j].
+void selectBits(const std::string& op, int64_t i, int64_t j, bool part, int64_t& low,
+                int64_t& width) {
+  low = i;
+  width = 1;
+  if (!part) return;
+  if (op == "+:") {
+    width = j;
+  } else if (op == "-:") {
+    width = j;
+    low = i - j + 1;
+  } else {
+    low = std::min(i, j);
+    width = (i > j ? i - j : j - i) + 1;
+  }
+}
+
+Value unsignedValue(uint64_t bits, int64_t width) {
+  int w = width >= 64 ? 64 : static_cast<int>(width);
+  return Value::unsignedInteger(static_cast<int64_t>(bits & lowMask(w)), w);
+}
+
+// An operand's width in a Verilog expression: its own when unsigned, else an integer's.
+int operandWidth(const Value& v) { return v.unsignedWidth() ? v.unsignedWidth() : 32; }
+
+uint64_t unsignedPower(uint64_t base, uint64_t exponent) {
+  uint64_t result = 1;
+  for (; exponent; exponent >>= 1, base *= base)
+    if (exponent & 1) result *= base;
+  return result;
+}
+
+class NestingGuard {
+ public:
+  explicit NestingGuard(int& nesting) : m_Nesting(nesting) { ++m_Nesting; }
+  ~NestingGuard() { --m_Nesting; }
+  bool tooDeep() const { return m_Nesting > kMaxNesting; }
+
+ private:
+  int& m_Nesting;
+};
+
 }  // namespace
 
 bool Evaluator::fail(std::string text) {
@@ -74,6 +119,7 @@ bool Evaluator::evaluate(const Expr& expr, Scope& scope, Value& out) {
   m_Unresolved = {};
   m_Steps = 0;
   m_Depth = 0;
+  m_Nesting = 0;
   return eval(expr, scope, nullptr, out);
 }
 
@@ -236,15 +282,86 @@ bool Evaluator::evalParameter(const std::string& name, Parameter& parameter, Sco
   bool ok = eval(*parameter.value, owner, nullptr, out);
   parameter.busy = false;
   if (!ok) return false;
-  // A declared width truncates the value as Verilog assignment would.
-  if (parameter.type && !parameter.type->packed.empty() && out.isInteger()) {
-    int64_t width = 0;
-    if (typeWidth(*parameter.type, owner, width) && width > 0 && width < 64)
-      out = Value::integer(static_cast<int64_t>(static_cast<uint64_t>(out.asInteger()) &
-                                                lowMask(width)));
-  }
+  if (parameter.type && !convert(*parameter.type, owner, out)) return false;
   parameter.cached = out;
   return true;
+}
+
+// A declared type sets the value's width and signedness as Verilog assignment would:
+// truncated, then sign-extended or kept unsigned.
+bool Evaluator::convert(const TypeSpec& type, Scope& scope, Value& value) {
+  if (!value.isInteger()) return true;
+  int64_t width = 0;
+  bool isSigned = false;
+  switch (type.base) {
+    case TypeSpec::Base::Atom:
+      width = type.atomWidth;
+      isSigned = type.signing >= 0 && type.written != "time";
+      break;
+    case TypeSpec::Base::Bit:
+    case TypeSpec::Base::Implicit:
+      if (type.packed.empty() && type.base == TypeSpec::Base::Implicit) return true;
+      if (!typeWidth(type, scope, width)) return false;
+      isSigned = type.signing > 0;
+      break;
+    default:
+      return true;
+  }
+  if (width <= 0) return true;
+  uint64_t bits = static_cast<uint64_t>(value.asInteger()) & lowMask(width);
+  if (!isSigned) {
+    value = unsignedValue(bits, width);
+  } else {
+    if (width < 64 && (bits >> (width - 1)) & 1) bits |= ~lowMask(width);
+    value = Value::integer(static_cast<int64_t>(bits));
+  }
+  return true;
+}
+
+bool Evaluator::evalElement(const Expr& select, const std::string& name, Parameter& parameter,
+                            Scope& owner, Scope& scope, Locals* locals, Value& out) {
+  if (select.args.size() != 2) return fail("a slice of parameter array '" + name + "'");
+  Value index;
+  int64_t i = 0, left = 0, right = 0;
+  if (!eval(*select.args[1], scope, locals, index) || !toInteger(index, i)) return false;
+  const Dimension& dim = parameter.unpacked[0];
+  Value bound;
+  if (!eval(*dim.left, owner, nullptr, bound) || !toInteger(bound, left)) return false;
+  if (dim.right) {
+    if (!eval(*dim.right, owner, nullptr, bound) || !toInteger(bound, right)) return false;
+  } else {
+    right = left - 1;
+    left = 0;
+  }
+  int64_t position = left <= right ? i - left : left - i;
+  if (position < 0 || position > (left <= right ? right - left : left - right))
+    return fail("index " + std::to_string(i) + " is outside parameter array '" + name + "'");
+  const Expr* pattern = parameter.value.get();
+  if (!pattern) return fail("parameter '" + name + "' has no value");
+  if (pattern->kind != Expr::Kind::Pattern)
+    return fail("parameter array '" + name + "' is not given an assignment pattern");
+  const Expr* element = nullptr;
+  size_t at = static_cast<size_t>(position);
+  if (pattern->op == "{") {
+    size_t items = pattern->args.size() - 1;
+    if (items > 0) element = pattern->args[1 + at % items].get();
+  } else if (pattern->op == ":") {
+    for (size_t k = 0; k + 1 < pattern->args.size() && !element; k += 2) {
+      Value key;
+      int64_t keyIndex = 0;
+      if (!pattern->args[k]) continue;
+      if (!eval(*pattern->args[k], owner, nullptr, key) || !toInteger(key, keyIndex)) return false;
+      if (keyIndex == i) element = pattern->args[k + 1].get();
+    }
+    for (size_t k = 0; k + 1 < pattern->args.size() && !element; k += 2)
+      if (!pattern->args[k]) element = pattern->args[k + 1].get();
+  } else if (at < pattern->args.size()) {
+    element = pattern->args[at].get();
+  }
+  if (!element)
+    return fail("the assignment pattern of '" + name + "' has no element " + std::to_string(i));
+  if (!eval(*element, owner, nullptr, out)) return false;
+  return !parameter.type || convert(*parameter.type, owner, out);
 }
 
 bool Evaluator::evalName(const Expr& expr, Scope& scope, Locals* locals, Value& out) {
@@ -372,6 +489,14 @@ bool Evaluator::evalSystem(const Expr& expr, Scope& scope, Locals* locals, Value
   if (name == "$signed" || name == "$unsigned") {
     if (!needs(1)) return false;
     out = args[0];
+    if (!out.isInteger()) return true;
+    uint64_t bits = static_cast<uint64_t>(out.asInteger());
+    if (int w = out.unsignedWidth(); w && name == "$signed") {
+      if (w < 64 && (bits >> (w - 1)) & 1) bits |= ~lowMask(w);
+      out = Value::integer(static_cast<int64_t>(bits));
+    } else if (!w && name == "$unsigned") {
+      out = unsignedValue(bits, fitsBound(out.asInteger()) ? 32 : 64);
+    }
     return true;
   }
   if (name == "$rtoi" || name == "$itor" || name == "$floor" || name == "$ceil" ||
@@ -444,6 +569,26 @@ bool Evaluator::evalCall(const Expr& expr, Scope& scope, Locals* locals, Value& 
   return true;
 }
 
+bool Evaluator::assignSelect(const Stmt& stmt, const Value& v, Scope& scope, Locals& locals) {
+  auto target = locals.find(stmt.target);
+  if (target == locals.end()) return fail("unknown variable '" + stmt.target + "'");
+  int64_t old = 0, value = 0, i = 0, j = 0;
+  Value index;
+  if (!toInteger(target->second, old) || !toInteger(v, value)) return false;
+  if (!eval(*stmt.index, scope, &locals, index) || !toInteger(index, i)) return false;
+  if (stmt.indexEnd && (!eval(*stmt.indexEnd, scope, &locals, index) || !toInteger(index, j)))
+    return false;
+  int64_t low = 0, width = 0;
+  selectBits(stmt.selectOp, i, j, stmt.indexEnd != nullptr, low, width);
+  if (low < 0 || low >= 64 || width <= 0) return fail("bit select out of range");
+  uint64_t mask = lowMask(width) << low;
+  uint64_t bits =
+      (static_cast<uint64_t>(old) & ~mask) | ((static_cast<uint64_t>(value) << low) & mask);
+  int w = target->second.unsignedWidth();
+  target->second = w ? unsignedValue(bits, w) : Value::integer(static_cast<int64_t>(bits));
+  return true;
+}
+
 bool Evaluator::run(const std::vector<Stmt>& body, Scope& scope, Locals& locals, Flow& flow) {
   for (const Stmt& stmt : body) {
     if (!runOne(stmt, scope, locals, flow)) return false;
@@ -456,6 +601,8 @@ bool Evaluator::runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flo
   if (++m_Steps > kMaxSteps)
     return fail("constant function did not finish within " + std::to_string(kMaxSteps) +
                 " steps");
+  NestingGuard nesting(m_Nesting);
+  if (nesting.tooDeep()) return fail("evaluation is nested too deeply");
   auto truth = [&](const ExprPtr& condition, bool& result) {
     Value v;
     int64_t i = 0;
@@ -482,6 +629,7 @@ bool Evaluator::runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flo
     case Stmt::Kind::Assign: {
       Value v;
       if (!eval(*stmt.value, scope, &locals, v)) return false;
+      if (stmt.index) return assignSelect(stmt, v, scope, locals);
       if (stmt.op != "=") {
         auto it = locals.find(stmt.target);
         if (it == locals.end()) return fail("unknown variable '" + stmt.target + "'");
@@ -562,11 +710,18 @@ bool Evaluator::runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flo
 
 bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out) {
   if (++m_Steps > kMaxSteps) return fail("evaluation did not finish within the step limit");
+  NestingGuard nesting(m_Nesting);
+  if (nesting.tooDeep()) return fail("evaluation is nested too deeply");
   switch (expr.kind) {
     case Expr::Kind::Number:
+      if (expr.tooWide) return fail("the literal does not fit in 64 bits");
       if (expr.unknown) return fail("a literal with x or z bits has no numeric value");
-      out = Value::integer(expr.integer);
+      out = expr.width > 0 && !expr.isSigned
+                ? unsignedValue(static_cast<uint64_t>(expr.integer), expr.width)
+                : Value::integer(expr.integer);
       return true;
+    case Expr::Kind::Pattern:
+      return fail("an assignment pattern is not a number");
     case Expr::Kind::Real:
       out = Value::real(expr.real);
       return true;
@@ -585,7 +740,7 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
     case Expr::Kind::Replicate: {
       int64_t value = 0, width = 0;
       if (!sizedValue(expr, scope, locals, value, width)) return false;
-      out = Value::integer(value);
+      out = width > 0 ? unsignedValue(static_cast<uint64_t>(value), width) : Value::integer(value);
       return true;
     }
     case Expr::Kind::Ternary: {
@@ -600,27 +755,35 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
       return eval(*expr.args[yes ? 1 : 2], scope, locals, out);
     }
     case Expr::Kind::Select: {
+      if (const Expr& base = *expr.args[0]; base.kind == Expr::Kind::Name &&
+                                            !(locals && base.scope.empty() &&
+                                              locals->count(base.name))) {
+        Scope* owner = nullptr;
+        Parameter* parameter = nullptr;
+        if (base.scope.empty()) {
+          parameter = findParameter(base.name, scope, owner);
+        } else if (Scope* package = m_Scopes.package(base.scope)) {
+          auto it = package->parameters.find(base.name);
+          if (it != package->parameters.end()) {
+            owner = package;
+            parameter = &it->second;
+          }
+        }
+        if (parameter && !parameter->unpacked.empty())
+          return evalElement(expr, base.name, *parameter, *owner, scope, locals, out);
+      }
       Value base, index;
-      int64_t b = 0, i = 0;
+      int64_t b = 0, i = 0, j = 0;
       if (!eval(*expr.args[0], scope, locals, base) || !toInteger(base, b)) return false;
       if (!eval(*expr.args[1], scope, locals, index) || !toInteger(index, i)) return false;
-      int64_t low = i, width = 1;
       if (expr.args.size() == 3) {
         Value second;
-        int64_t j = 0;
         if (!eval(*expr.args[2], scope, locals, second) || !toInteger(second, j)) return false;
-        if (expr.op == "+:") {
-          width = j;
-        } else if (expr.op == "-:") {
-          width = j;
-          low = i - j + 1;
-        } else {
-          low = std::min(i, j);
-          width = (i > j ? i - j : j - i) + 1;
-        }
       }
+      int64_t low = 0, width = 0;
+      selectBits(expr.op, i, j, expr.args.size() == 3, low, width);
       if (low < 0 || low >= 64 || width <= 0) return fail("bit select out of range");
-      out = Value::integer(static_cast<int64_t>((static_cast<uint64_t>(b) >> low) & lowMask(width)));
+      out = unsignedValue(static_cast<uint64_t>(b) >> low, width);
       return true;
     }
     case Expr::Kind::Unary: {
@@ -634,6 +797,15 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
       int64_t v = 0;
       if (!toInteger(operand, v)) return false;
       uint64_t u = static_cast<uint64_t>(v);
+      if (int w = operand.unsignedWidth(); w && (op == "+" || op == "-" || op == "~")) {
+        out = unsignedValue(op == "+" ? u : op == "-" ? uint64_t{0} - u : ~u, w);
+        return true;
+      }
+      if (int w = operand.unsignedWidth(); w && (op == "&" || op == "~&")) {
+        bool all = u == lowMask(w);
+        out = Value::integer(op == "&" ? all : !all);
+        return true;
+      }
       int64_t r = 0;
       if (op == "+") r = v;
       else if (op == "-") {
@@ -652,9 +824,68 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
     case Expr::Kind::Binary:
       break;
   }
+  // A long left-associative chain (a + b + c + ...) is one deep left spine: walk it with a
+  // loop and recurse only into the right operands, which the parser keeps shallow.
+  std::vector<const Expr*> spine;
+  const Expr* leftmost = &expr;
+  while (leftmost->kind == Expr::Kind::Binary) {
+    spine.push_back(leftmost);
+    leftmost = leftmost->args[0].get();
+  }
+  Value acc;
+  if (!eval(*leftmost, scope, locals, acc)) return false;
+  for (auto node = spine.rbegin(); node != spine.rend(); ++node) {
+    Value result;
+    if (!binary(**node, acc, scope, locals, result)) return false;
+    acc = std::move(result);
+  }
+  out = std::move(acc);
+  return true;
+}
+
+// Unsigned operands make the operation unsigned at the wider operand's width (an integer
+// counts 32 bits), wrapping as Verilog does: with N = 32'd0, N - 1 is 4294967295.
+bool Evaluator::unsignedBinary(const std::string& op, const Value& a, const Value& b, int64_t x,
+                               int64_t y, Value& out) {
+  bool selfSized = op == "<<" || op == ">>" || op == "<<<" || op == ">>>" || op == "**";
+  int width = selfSized ? a.unsignedWidth() : std::max(operandWidth(a), operandWidth(b));
+  uint64_t mask = lowMask(width);
+  uint64_t ux = static_cast<uint64_t>(x) & mask, uy = static_cast<uint64_t>(y) & mask;
+  if (isComparison(op)) {
+    bool result = op == "<"    ? ux < uy
+                  : op == "<=" ? ux <= uy
+                  : op == ">"  ? ux > uy
+                  : op == ">=" ? ux >= uy
+                  : op[0] == '!' ? ux != uy
+                                 : ux == uy;
+    out = Value::integer(result);
+    return true;
+  }
+  uint64_t r = 0;
+  if (op == "+") r = ux + uy;
+  else if (op == "-") r = ux - uy;
+  else if (op == "*") r = ux * uy;
+  else if (op == "/" || op == "%") {
+    if (uy == 0) return fail("division by zero");
+    r = op == "/" ? ux / uy : ux % uy;
+  } else if (op == "**") {
+    if (y < 0 && !b.unsignedWidth()) r = ux == 1 ? 1 : 0;
+    else r = unsignedPower(ux, static_cast<uint64_t>(y));
+  } else if (op == "<<" || op == "<<<") r = y < 0 || y >= 64 ? 0 : ux << y;
+  else if (op == ">>" || op == ">>>") r = y < 0 || y >= 64 ? 0 : ux >> y;
+  else if (op == "&") r = ux & uy;
+  else if (op == "|") r = ux | uy;
+  else if (op == "^") r = ux ^ uy;
+  else if (op == "~^" || op == "^~") r = ~(ux ^ uy);
+  else return fail("unsupported operator '" + op + "'");
+  out = unsignedValue(r, width);
+  return true;
+}
+
+bool Evaluator::binary(const Expr& expr, const Value& a, Scope& scope, Locals* locals,
+                       Value& out) {
   const std::string& op = expr.op;
-  Value a, b;
-  if (!eval(*expr.args[0], scope, locals, a)) return false;
+  Value b;
   if (op == "&&" || op == "||") {  // short-circuit, as constant functions rely on it
     int64_t x = 0;
     bool left = a.isReal() ? a.asReal() != 0 : (toInteger(a, x) && x != 0);
@@ -694,6 +925,9 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
   }
   int64_t x = 0, y = 0, r = 0;
   if (!toInteger(a, x) || !toInteger(b, y)) return false;
+  bool selfSized = op == "<<" || op == ">>" || op == "<<<" || op == ">>>" || op == "**";
+  if (selfSized ? a.unsignedWidth() != 0 : a.unsignedWidth() || b.unsignedWidth())
+    return unsignedBinary(op, a, b, x, y, out);
   if (isComparison(op)) {
     out = Value::integer(compare(op, x, y));
     return true;

@@ -41,6 +41,14 @@ class Evaluator {
   enum class Flow { Normal, Return };
 
   bool eval(const Expr& expr, Scope& scope, Locals* locals, Value& out);
+  /// Applies the binary operator `expr` to the value `a` of its left operand.
+  bool binary(const Expr& expr, const Value& a, Scope& scope, Locals* locals, Value& out);
+  bool unsignedBinary(const std::string& op, const Value& a, const Value& b, int64_t x,
+                      int64_t y, Value& out);
+  bool convert(const TypeSpec& type, Scope& scope, Value& value);
+  bool evalElement(const Expr& select, const std::string& name, Parameter& parameter,
+                   Scope& owner, Scope& scope, Locals* locals, Value& out);
+  bool assignSelect(const Stmt& stmt, const Value& v, Scope& scope, Locals& locals);
   bool evalName(const Expr& expr, Scope& scope, Locals* locals, Value& out);
   bool evalParameter(const std::string& name, Parameter& parameter, Scope& owner, Value& out);
   bool evalSystem(const Expr& expr, Scope& scope, Locals* locals, Value& out);
@@ -64,6 +72,7 @@ class Evaluator {
   Unresolved m_Unresolved;
   size_t m_Steps = 0;
   int m_Depth = 0;
+  int m_Nesting = 0;
   std::string m_ReturnName;
 };
 

@@ -17,6 +17,12 @@ struct Expr;
 using ExprPtr = std::shared_ptr<const Expr>;
 
 struct Expr {
+  Expr() = default;
+  Expr(const Expr&) = default;
+  Expr& operator=(const Expr&) = default;
+  /// Frees the subtree with a loop: a chain of 25,000 operators must not recurse as deep.
+  ~Expr();
+
   enum class Kind {
     Number,     ///< integer literal; `unknown` when it holds x or z bits
     Real,
@@ -31,6 +37,8 @@ struct Expr {
     Replicate,  ///< {args[0]{args[1..]}}
     Select,     ///< args[0][args[1]] or args[0][args[1]:args[2]]
     TypeName,   ///< a data type used as an argument ($bits(logic [3:0]))
+    Pattern,    ///< '{args}; op "{": '{args[0]{args[1..]}}; op ":": key, value pairs (null key:
+                ///< default)
   };
   Kind kind = Kind::Number;
   std::string op;     ///< operator, or "+:"/"-:"/":" for selects
@@ -39,12 +47,30 @@ struct Expr {
   int64_t integer = 0;
   double real = 0;
   int width = 0;  ///< literal size in bits; 0 when unsized
+  bool isSigned = false;  ///< a sized literal written with 's
   bool unknown = false;
+  bool tooWide = false;  ///< an integer literal whose value does not fit in 64 bits
   std::vector<ExprPtr> args;
   std::shared_ptr<const struct TypeSpec> type;  ///< for TypeName
   const SourceBuffer* source = nullptr;
   size_t offset = 0;
 };
+
+inline Expr::~Expr() {
+  std::vector<ExprPtr> pending = std::move(args);
+  while (!pending.empty()) {
+    ExprPtr next = std::move(pending.back());
+    pending.pop_back();
+    // Only a node nobody else holds is freed now; take its children first so its own
+    // destructor finds none. Every node is made non-const, so casting the constness away is
+    // sound.
+    if (next.use_count() == 1) {
+      std::vector<ExprPtr>& children = const_cast<Expr&>(*next).args;
+      for (ExprPtr& child : children) pending.push_back(std::move(child));
+      children.clear();
+    }
+  }
+}
 
 struct Dimension {
   ExprPtr left;
@@ -68,6 +94,7 @@ struct TypeSpec {
   std::string modport;  ///< set for an interface port (`intf.modport` or `interface`)
   bool isInterface = false;
   int atomWidth = 0;
+  int signing = 0;  ///< 1 when written `signed`, -1 when `unsigned`, 0 when left to the type
   bool isUnion = false;
   std::vector<Dimension> packed;
   std::vector<TypeSpec> members;
@@ -83,6 +110,10 @@ struct Stmt {
   std::vector<Stmt> body;     ///< block statements; If: then, else; loops: init, step, body
   std::vector<std::vector<ExprPtr>> labels;  ///< Case: one label list per body statement
   bool hasDefault = false;  ///< Case: the last body statement is the default
+  /// Assign to a bit or part select, target[index], target[index selectOp indexEnd].
+  ExprPtr index;
+  ExprPtr indexEnd;
+  std::string selectOp;
 };
 
 struct Function {

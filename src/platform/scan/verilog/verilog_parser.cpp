@@ -64,6 +64,13 @@ class DepthGuard {
   int& m_Depth;
 };
 
+Stmt block(std::vector<Stmt> body = {}) {
+  Stmt stmt;
+  stmt.kind = Stmt::Kind::Block;
+  stmt.body = std::move(body);
+  return stmt;
+}
+
 ExprPtr one() {
   auto expr = std::make_shared<Expr>();
   expr->integer = 1;
@@ -97,10 +104,10 @@ bool parseNumber(std::string_view text, Expr& out) {
     }
     uint64_t value = 0;
     for (char c : digits) {
-      if (value > (UINT64_MAX - 9) / 10) return out.unknown = true, false;
+      if (value > (UINT64_MAX - 9) / 10) return out.tooWide = true, false;
       value = value * 10 + static_cast<uint64_t>(c - '0');
     }
-    if (value > static_cast<uint64_t>(INT64_MAX)) return out.unknown = true, false;
+    if (value > static_cast<uint64_t>(INT64_MAX)) return out.tooWide = true, false;
     out.integer = static_cast<int64_t>(value);
     return true;
   }
@@ -122,20 +129,28 @@ bool parseNumber(std::string_view text, Expr& out) {
   int radix = base == 'b' ? 2 : base == 'o' ? 8 : base == 'd' ? 10 : base == 'h' ? 16 : 0;
   if (radix == 0 || at + 1 >= digits.size()) return out.unknown = true, false;
   uint64_t value = 0;
+  bool overflow = false;
   for (size_t i = at + 1; i < digits.size(); ++i) {
     int d = digitValue(digits[i]);
     if (d < 0 || d >= radix) return out.unknown = true, false;
+    if (value > (UINT64_MAX - static_cast<uint64_t>(d)) / static_cast<uint64_t>(radix))
+      overflow = true;
     value = value * static_cast<uint64_t>(radix) + static_cast<uint64_t>(d);
   }
+  out.isSigned = isSigned;
   if (!size.empty()) {
     long width = std::strtol(size.c_str(), nullptr, 10);
     if (width <= 0) return out.unknown = true, false;
+    // Bits above 64 only matter when they are set: 80'h5 is 5, 80'h1_0000_0000_0000_0000 is
+    // not a number this reader can hold.
+    if (overflow && width > 64) return out.tooWide = true, false;
     out.width = width > 64 ? 64 : static_cast<int>(width);
     if (out.width < 64) {
       value &= (uint64_t{1} << out.width) - 1;
       if (isSigned && (value >> (out.width - 1)) & 1) value |= ~((uint64_t{1} << out.width) - 1);
     }
   }
+  if (overflow && size.empty()) return out.tooWide = true, false;
   out.integer = static_cast<int64_t>(value);
   return true;
 }
@@ -269,8 +284,12 @@ ExprPtr Parser::unary() {
 }
 
 ExprPtr Parser::postfix(ExprPtr base) {
-  for (;;) {
+  for (int selects = 0;; ++selects) {
     const Token& next = m_Tokens.peek();
+    if (selects > kMaxDepth) {  // each select nests the tree one level deeper
+      fail("expression nested too deeply");
+      return nullptr;
+    }
     if (next.isSymbol("[")) {
       Token at = m_Tokens.take();
       auto select = std::const_pointer_cast<Expr>(make(Expr::Kind::Select, at));
@@ -383,6 +402,10 @@ ExprPtr Parser::primary() {
         if (!inner || !expectSymbol(")")) return nullptr;
         return inner;
       }
+      if (token.text == "'{") {
+        m_Tokens.take();
+        return pattern(token);
+      }
       if (token.text == "{") {
         m_Tokens.take();
         auto expr = std::const_pointer_cast<Expr>(make(Expr::Kind::Concat, token));
@@ -417,6 +440,50 @@ ExprPtr Parser::primary() {
            ? std::string("expected an expression but found the end of the file")
            : "expected an expression but found '" + std::string(token.text.substr(0, 40)) + "'");
   return nullptr;
+}
+
+ExprPtr Parser::pattern(const Token& at) {
+  auto expr = std::const_pointer_cast<Expr>(make(Expr::Kind::Pattern, at));
+  if (m_Tokens.acceptSymbol("}")) return expr;
+  do {
+    if (m_Tokens.acceptWord(Word::Default)) {
+      if (!expectSymbol(":")) return nullptr;
+      ExprPtr value = expression();
+      if (!value) return nullptr;
+      expr->op = ":";
+      expr->args.push_back(nullptr);
+      expr->args.push_back(value);
+      continue;
+    }
+    ExprPtr first = expression();
+    if (!first) return nullptr;
+    if (expr->args.empty() && m_Tokens.acceptSymbol("{")) {  // '{N{items}}
+      expr->op = "{";
+      expr->args.push_back(first);
+      do {
+        ExprPtr item = expression();
+        if (!item) return nullptr;
+        expr->args.push_back(item);
+      } while (m_Tokens.acceptSymbol(","));
+      if (!expectSymbol("}")) return nullptr;
+      break;
+    }
+    if (m_Tokens.acceptSymbol(":")) {
+      ExprPtr value = expression();
+      if (!value) return nullptr;
+      expr->op = ":";
+      expr->args.push_back(first);
+      expr->args.push_back(value);
+      continue;
+    }
+    if (expr->op == ":") {
+      fail("expected 'key: value' in an assignment pattern");
+      return nullptr;
+    }
+    expr->args.push_back(first);
+  } while (m_Tokens.acceptSymbol(","));
+  if (!expectSymbol("}")) return nullptr;
+  return expr;
 }
 
 void Parser::dimensions(std::vector<Dimension>& dims) {
@@ -510,6 +577,11 @@ void Parser::enumBody(TypeSpec& type) {
 }
 
 bool Parser::dataType(TypeSpec& type) {
+  DepthGuard guard(m_Depth);  // struct members and enum bases nest types in types
+  if (guard.tooDeep()) {
+    fail("data type nested too deeply");
+    return false;
+  }
   bool read = false;
   for (;;) {
     const Token& token = m_Tokens.peek();
@@ -540,6 +612,7 @@ bool Parser::dataType(TypeSpec& type) {
         break;
       case Word::Signed:
       case Word::Unsigned:
+        type.signing = word == Word::Signed ? 1 : -1;
         break;
       case Word::Struct:
       case Word::Union:
@@ -618,6 +691,16 @@ bool Parser::assignment(Stmt& stmt) {
   }
   if (m_Tokens.peek().kind != TokenKind::Identifier) return false;
   stmt.target.assign(m_Tokens.take().text);
+  if (m_Tokens.acceptSymbol("[")) {  // x[i] = ..., x[hi:lo] = ..., x[i +: w] = ...
+    if (!(stmt.index = expression())) return false;
+    const Token& sep = m_Tokens.peek();
+    if (sep.isSymbol(":") || sep.isSymbol("+:") || sep.isSymbol("-:")) {
+      stmt.selectOp.assign(m_Tokens.take().text);
+      if (!(stmt.indexEnd = expression())) return false;
+    }
+    if (!expectSymbol("]")) return false;
+    if (!m_Tokens.peek().isSymbol("=") && !m_Tokens.peek().isSymbol("<=")) return false;
+  }
   const Token& op = m_Tokens.peek();
   if (op.isSymbol("++") || op.isSymbol("--")) {
     stmt.op = m_Tokens.take().text[0] == '+' ? "+=" : "-=";
@@ -664,15 +747,15 @@ bool Parser::statement(Function& function, std::vector<Stmt>& out) {
       std::vector<Stmt> yes, no;
       if (!statement(function, yes)) return false;
       if (m_Tokens.acceptWord(Word::Else) && !statement(function, no)) return false;
-      stmt.body.push_back(Stmt{Stmt::Kind::Block, "", "", nullptr, std::move(yes), {}, false});
-      stmt.body.push_back(Stmt{Stmt::Kind::Block, "", "", nullptr, std::move(no), {}, false});
+      stmt.body.push_back(block(std::move(yes)));
+      stmt.body.push_back(block(std::move(no)));
       break;
     }
     case Word::For: {
       m_Tokens.take();
       stmt.kind = Stmt::Kind::For;
       if (!expectSymbol("(")) return false;
-      Stmt init{Stmt::Kind::Block, "", "", nullptr, {}, {}, false};
+      Stmt init = block();
       if (!declaration(init.body)) {
         do {
           Stmt one;
@@ -681,14 +764,14 @@ bool Parser::statement(Function& function, std::vector<Stmt>& out) {
         } while (m_Tokens.acceptSymbol(","));
       }
       if (!expectSymbol(";") || !(stmt.value = expression()) || !expectSymbol(";")) return false;
-      Stmt step{Stmt::Kind::Block, "", "", nullptr, {}, {}, false};
+      Stmt step = block();
       do {
         Stmt one;
         if (!assignment(one)) return false;
         step.body.push_back(std::move(one));
       } while (m_Tokens.acceptSymbol(","));
       if (!expectSymbol(")")) return false;
-      Stmt body{Stmt::Kind::Block, "", "", nullptr, {}, {}, false};
+      Stmt body = block();
       if (!statement(function, body.body)) return false;
       stmt.body = {std::move(init), std::move(step), std::move(body)};
       break;
@@ -698,7 +781,7 @@ bool Parser::statement(Function& function, std::vector<Stmt>& out) {
       m_Tokens.take();
       stmt.kind = word == Word::While ? Stmt::Kind::While : Stmt::Kind::Repeat;
       if (!expectSymbol("(") || !(stmt.value = expression()) || !expectSymbol(")")) return false;
-      Stmt body{Stmt::Kind::Block, "", "", nullptr, {}, {}, false};
+      Stmt body = block();
       if (!statement(function, body.body)) return false;
       stmt.body.push_back(std::move(body));
       break;
@@ -726,15 +809,14 @@ bool Parser::statement(Function& function, std::vector<Stmt>& out) {
         m_Tokens.acceptSymbol(":");
         std::vector<Stmt> body;
         if (!statement(function, body)) return false;
-        Stmt block{Stmt::Kind::Block, "", "", nullptr, std::move(body), {}, false};
         if (isDefault) {
           stmt.hasDefault = true;
           stmt.labels.emplace_back();
-          stmt.body.push_back(std::move(block));
+          stmt.body.push_back(block(std::move(body)));
           continue;
         }
         stmt.labels.push_back(std::move(labels));
-        stmt.body.push_back(std::move(block));
+        stmt.body.push_back(block(std::move(body)));
       }
       // The default branch is kept last so the interpreter finds it after every label.
       for (size_t i = 0; i + 1 < stmt.body.size(); ++i) {
@@ -813,8 +895,9 @@ std::shared_ptr<Function> Parser::function() {
       m_Tokens.take();
       if (!declaration(function->body)) {
         do {
-          Stmt stmt{Stmt::Kind::Declare, std::string(m_Tokens.take().text), "", nullptr, {}, {},
-                    false};
+          Stmt stmt;
+          stmt.kind = Stmt::Kind::Declare;
+          stmt.target.assign(m_Tokens.take().text);
           if (m_Tokens.acceptSymbol("=")) stmt.value = expression();
           function->body.push_back(std::move(stmt));
         } while (!m_Failed && m_Tokens.acceptSymbol(","));

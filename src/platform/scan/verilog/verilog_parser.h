@@ -65,6 +65,7 @@ class Parser {
   ExprPtr postfix(ExprPtr base);
   ExprPtr primary();
   ExprPtr systemCall(const Token& name);
+  ExprPtr pattern(const Token& at);
   ExprPtr make(Expr::Kind kind, const Token& at);
   void structBody(TypeSpec& type);
   void enumBody(TypeSpec& type);

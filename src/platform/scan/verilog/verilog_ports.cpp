@@ -206,7 +206,8 @@ class PortBuilder {
     if (!problem.empty()) port.setRangeUnknown(problem);
     if (range.present) {
       if (!fitsBound(range.left) || !fitsBound(range.right)) {
-        warn(source, offset, "the range of port '" + name + "' does not fit 32-bit bounds");
+        warn(source, offset,
+             "port '" + name + "': its bounds do not fit in 32 bits; no range reported");
         port.setRangeUnknown("port '" + name + "': " + rangeText(range) +
                              " does not fit 32-bit bounds");
       } else {

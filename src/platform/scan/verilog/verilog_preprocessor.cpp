@@ -56,7 +56,9 @@ std::string_view trim(std::string_view s) {
 }  // namespace
 
 Preprocessor::Preprocessor(Diagnostics* diagnostics, MacroTable& macros, SourceStore& sources)
-    : m_Diagnostics(diagnostics), m_Macros(macros), m_Sources(sources) {}
+    : m_Diagnostics(diagnostics ? diagnostics : &m_Quiet),
+      m_Macros(macros),
+      m_Sources(sources) {}
 
 Preprocessor::~Preprocessor() = default;
 
@@ -78,7 +80,7 @@ void Preprocessor::setCoarse(bool coarse) {
 }
 
 void Preprocessor::error(const Token& at, std::string_view text) {
-  if (m_Diagnostics && at.source) m_Diagnostics->error(*at.source, at.offset, text);
+  if (at.source) m_Diagnostics->error(*at.source, at.offset, text);
 }
 
 bool Preprocessor::next(Token& token) {
@@ -105,7 +107,7 @@ void Preprocessor::popFrame() {
   if (frame.file) {
     while (m_Conditionals.size() > frame.conditionalBase) {
       const Conditional& open = m_Conditionals.back();
-      if (m_Diagnostics && open.source)
+      if (open.source)
         m_Diagnostics->error(*open.source, open.offset,
                              "unterminated `" + std::string(open.directive) +
                                  ": no `endif before the end of the file");
@@ -348,9 +350,11 @@ void Preprocessor::include(const Token& token) {
   std::string name(start, static_cast<size_t>(p - start));
   lexer().setPosition(p < end && *p == close ? p + 1 : p);
   restOfLine();
-  const SourceBuffer* file = m_Sources.findInclude(name, lexer().file());
+  std::string reason;
+  const SourceBuffer* file = m_Sources.findInclude(name, lexer().file(), reason);
   if (!file) {
-    error(token, "cannot find include file \"" + name + "\"");
+    error(token, reason.empty() ? "cannot find include file \"" + name + "\""
+                                : "cannot read include file \"" + name + "\": " + reason);
     return;
   }
   size_t depth = 0;

@@ -7,12 +7,9 @@
 #include <string>
 #include <vector>
 
+#include "platform/scan/common/diagnostics.h"
 #include "platform/scan/verilog/verilog_lexer.h"
 #include "platform/scan/verilog/verilog_macros.h"
-
-namespace scan {
-class Diagnostics;
-}
 
 namespace scan::verilog {
 
@@ -20,9 +17,12 @@ class SourceStore;
 
 class Preprocessor {
  public:
-  /// `diagnostics` may be null to read quietly (a second reading of text already checked).
+  /// `diagnostics` may be null to read quietly (a second reading of text already checked);
+  /// the errors met are then only counted (see quietErrors).
   Preprocessor(Diagnostics* diagnostics, MacroTable& macros, SourceStore& sources);
   ~Preprocessor();
+  Preprocessor(const Preprocessor&) = delete;
+  Preprocessor& operator=(const Preprocessor&) = delete;
 
   /// Starts reading `file` at `offset`, as if `openConditionals` taken `ifdef branches were
   /// open there. Anything still being read is dropped.
@@ -34,6 +34,9 @@ class Preprocessor {
   /// Switches every lexer, present and future, to coarse mode or back (see Lexer).
   void setCoarse(bool coarse);
   bool coarse() const { return m_Coarse; }
+
+  /// Lexical and directive errors met so far by a quiet preprocessor (0 for one that prints).
+  size_t quietErrors() const { return m_Quiet.errorCount(); }
 
   /// Conditional branches open at the current position.
   size_t openConditionals() const { return m_Conditionals.size(); }
@@ -82,7 +85,8 @@ class Preprocessor {
   std::string_view restOfLine();
   std::string readBody();
 
-  Diagnostics* m_Diagnostics;
+  Diagnostics m_Quiet{nullptr};
+  Diagnostics* m_Diagnostics;  ///< never null: m_Quiet when reading quietly
   MacroTable& m_Macros;
   SourceStore& m_Sources;
   std::vector<Frame> m_Frames;

@@ -156,9 +156,12 @@ bool VerilogReader::readUnit(UnitDescription& unit) {
     hints.generics.push_back(parameter.name);
   hints.missingPackages = missingPackages(model);
   LineCounter lines;
+  // Ranges that cannot be evaluated are warnings; an error here is a header in error, such
+  // as a non-ANSI port without a declaration.
+  size_t errorsBefore = m_Diagnostics.errorCount();
   unit.ports = buildPorts(model, evaluator, *m_Index, m_Diagnostics, lines, hints);
   unit.context = context(model, reader);
-  return overridden;
+  return overridden && model.headerErrors == 0 && m_Diagnostics.errorCount() == errorsBefore;
 }
 
 // Overrides replace the parameter's default before anything is evaluated, so every

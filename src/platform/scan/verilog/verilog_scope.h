@@ -19,6 +19,7 @@ struct Parameter {
   std::shared_ptr<TypeSpec> type;     ///< the declared type, when one is written
   bool isType = false;                ///< a `parameter type`
   std::shared_ptr<TypeSpec> typeValue;
+  std::vector<Dimension> unpacked;    ///< a parameter array's dimensions
   // Evaluation state: the value once known, and a mark that catches circular definitions.
   std::optional<Value> cached;
   bool busy = false;

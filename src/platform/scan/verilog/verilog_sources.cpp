@@ -43,17 +43,28 @@ const SourceBuffer* SourceStore::adopt(std::unique_ptr<SourceBuffer> buffer) {
   return m_Buffers.back().get();
 }
 
-const SourceBuffer* SourceStore::findInclude(std::string_view name, const SourceBuffer* includer) {
+const SourceBuffer* SourceStore::findInclude(std::string_view name, const SourceBuffer* includer,
+                                             std::string& error) {
+  error.clear();
   if (name.empty() || name.find('\0') != std::string_view::npos) return nullptr;
-  std::string error;
-  if (name.front() == '/') return openFile(std::string(name), error);
   std::vector<std::string> candidates;
-  if (includer) candidates.push_back(directoryOf(includer->path()));
-  candidates.insert(candidates.end(), m_SearchPath.begin(), m_SearchPath.end());
-  for (const std::string& dir : candidates) {
-    std::string path = dir == "." ? std::string(name) : dir + "/" + std::string(name);
-    if (const SourceBuffer* found = openFile(path, error)) return found;
+  if (name.front() == '/') {
+    candidates.emplace_back(name);
+  } else {
+    std::vector<std::string> dirs;
+    if (includer) dirs.push_back(directoryOf(includer->path()));
+    dirs.insert(dirs.end(), m_SearchPath.begin(), m_SearchPath.end());
+    for (const std::string& dir : dirs)
+      candidates.push_back(dir == "." ? std::string(name) : dir + "/" + std::string(name));
   }
+  for (const std::string& path : candidates) {
+    if (const SourceBuffer* found = openFile(path, error)) return found;
+    // The first file that exists is the one meant: say why it cannot be read rather than
+    // going on to a namesake further down the path.
+    std::error_code failure;
+    if (std::filesystem::exists(std::filesystem::status(path, failure))) return nullptr;
+  }
+  error.clear();
   return nullptr;
 }
 

@@ -26,8 +26,10 @@ class SourceStore {
   const SourceBuffer* openFile(const std::string& path, std::string& error);
   /// Takes over a buffer made elsewhere (in-memory text).
   const SourceBuffer* adopt(std::unique_ptr<SourceBuffer> buffer);
-  /// Finds `name` for an `include in `includer`; null when no directory holds it.
-  const SourceBuffer* findInclude(std::string_view name, const SourceBuffer* includer);
+  /// Finds `name` for an `include in `includer`. Null when no directory holds it (`error`
+  /// empty) or when the first file found cannot be read (`error` says why).
+  const SourceBuffer* findInclude(std::string_view name, const SourceBuffer* includer,
+                                  std::string& error);
 
   /// The directory part of a path ("." when it has none).
   static std::string directoryOf(const std::string& path);

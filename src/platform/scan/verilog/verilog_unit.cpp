@@ -33,9 +33,13 @@ class UnitReader::Session {
 
   void report(const Parser& parser) {
     const Token& at = parser.errorAt();
-    if (parser.failed() && at.source)
-      m_Reader.m_Diagnostics.error(*at.source, at.offset, parser.errorText());
+    if (!parser.failed()) return;
+    ++m_Reported;
+    if (at.source) m_Reader.m_Diagnostics.error(*at.source, at.offset, parser.errorText());
   }
+
+  /// Errors reported so far, plus the lexical ones met again while rereading quietly.
+  size_t errors() const { return m_Reported + m_Pre.quietErrors(); }
 
  private:
   void moveTo(const Place& place) {
@@ -51,6 +55,7 @@ class UnitReader::Session {
   UnitReader& m_Reader;
   MacroTable m_Table;
   size_t m_Position = 0;
+  size_t m_Reported = 0;
   Preprocessor m_Pre;
 };
 
@@ -178,9 +183,8 @@ void readParameters(Parser& parser, Scope& scope, bool local = false,
     }
     Token nameToken = tokens.take();
     std::string name(nameToken.text);
-    std::vector<Dimension> unpacked;
-    parser.dimensions(unpacked);
     Parameter parameter;
+    parser.dimensions(parameter.unpacked);
     parameter.type = type;
     parameter.isType = isType;
     std::string defaultText;
@@ -288,6 +292,11 @@ void readAnsiPorts(Parser& parser, UnitModel& model) {
     parser.dimensions(unpacked);
     port.unpacked = !unpacked.empty();
     if (tokens.acceptSymbol("=") && !parser.expression()) return;
+    // A header cut short keeps no half-read name such as `outpu`.
+    if (!tokens.peek().isSymbol(",") && !tokens.peek().isSymbol(")")) {
+      parser.expectSymbol(")");
+      return;
+    }
     if (port.type.isInterface) {
       port.direction = ScanPort::InterfacePort;
     } else if (direction) {
@@ -370,6 +379,10 @@ void readNonAnsiList(Parser& parser, UnitModel& model) {
       if (!concatenation) ref.name = ref.members[0].signal;
     }
     ref.text = writtenBetween(at, tokens.peek());
+    if (!tokens.peek().isSymbol(",") && !tokens.peek().isSymbol(")")) {
+      parser.expectSymbol(")");
+      return;
+    }
     model.headerList.push_back(std::move(ref));
     if (!tokens.acceptSymbol(",")) return;
   }
@@ -408,27 +421,28 @@ void readHeader(Parser& parser, UnitModel& model) {
 // Body statements of a unit: scope items, and for non-ANSI headers the port declarations
 // and the net or variable declarations of the listed names. A unit without a `#(...)` list
 // is parameterised by its body's parameters; the imports of a non-ANSI body are part of the
-// context its port declarations need.
-void readBodyItem(Parser& parser, UnitModel& model,
+// context its port declarations need. True when the item was a port declaration of a non-ANSI
+// unit.
+bool readBodyItem(Parser& parser, UnitModel& model,
                   const std::unordered_set<std::string>& listed) {
   TokenStream& tokens = parser.tokens();
   Word word = tokens.peekWord();
   if (word == Word::Parameter && !model.parameterList) {
     readParameters(parser, model.scope, false, &model.parameters);
     if (!parser.failed()) parser.expectSymbol(";");
-    return;
+    return false;
   }
   if (word == Word::Import && !model.ansi) {
     tokens.take();
     readImports(parser, model.scope, &model.imports);
-    return;
+    return false;
   }
-  if (readScopeItem(parser, model.scope)) return;
+  if (readScopeItem(parser, model.scope)) return false;
   int direction = directionOf(word);
   if (direction) tokens.take();
   if (model.ansi && direction) {
     parser.skipStatement();
-    return;
+    return false;
   }
   TypeSpec type;
   Token typeStart = tokens.peek();
@@ -437,11 +451,11 @@ void readBodyItem(Parser& parser, UnitModel& model,
   if (hasType && typeText.empty()) typeText = type.written;
   if (!direction && !hasType) {
     parser.skipStatement();
-    return;
+    return false;
   }
   if (tokens.peek().isSymbol("#") || tokens.peek().isSymbol("(")) {  // delay or strength
     parser.skipStatement();
-    return;
+    return direction != 0;
   }
   do {
     const Token& name = tokens.peek();
@@ -467,7 +481,11 @@ void readBodyItem(Parser& parser, UnitModel& model,
     }
     if (tokens.peek().isSymbol("=")) break;
   } while (!parser.failed() && tokens.acceptSymbol(","));
+  if (direction && !parser.failed() && !tokens.peek().isSymbol(";") &&
+      !tokens.peek().isSymbol("="))
+    parser.expectSymbol(";");
   parser.skipStatement();
+  return direction != 0;
 }
 
 }  // namespace
@@ -483,12 +501,18 @@ void UnitReader::readUnit(const UnitRecord& unit, UnitModel& model) {
     headerRead = true;
     readHeader(parser, model);
     session.report(parser);
+    model.headerErrors = session.errors();
   });
   std::unordered_set<std::string> listed;
   for (const PortReference& ref : model.headerList)
     for (const PortReference::Member& member : ref.members) listed.insert(member.signal);
   for (const Place& place : unit.declarations)
-    session.readAt(place, [&](Parser& parser) { readBodyItem(parser, model, listed); });
+    session.readAt(place, [&](Parser& parser) {
+      size_t before = session.errors();
+      if (!readBodyItem(parser, model, listed)) return;
+      session.report(parser);
+      model.headerErrors += session.errors() - before;
+    });
 }
 
 void UnitReader::readScope(const std::vector<Place>& places, Scope& scope) {

@@ -76,6 +76,8 @@ struct UnitModel {
   std::vector<PortReference> headerList;        ///< non-ANSI header, in order
   std::unordered_map<std::string, PortDeclaration> declared;  ///< non-ANSI direction declarations
   std::unordered_map<std::string, NetDeclaration> netTypes;   ///< net/variable declarations
+  /// Errors met in the header (and, for a non-ANSI header, the port declarations).
+  size_t headerErrors = 0;
 };
 
 /// Reads units, packages and the compilation-unit scope from their recorded places.

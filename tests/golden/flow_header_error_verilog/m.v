@@ -1,0 +1,2 @@
+module m(input wire a,
+  outpu

@@ -1,0 +1,3 @@
+entity top is
+  port (a : in bit; "c : in bit);
+end entity;

@@ -1,0 +1,5 @@
+module top (
+  input  logic clk,
+  output logic [3:0] q
+);
+endmodule
