@@ -21,10 +21,10 @@ export WINEPREFIX="${WINEPREFIX:-$win_build/wine}"
 # The first Wine process starts the background services; they keep whatever output they were
 # given, so they get none, or they would hold the test runners' pipes open. The server stays up
 # between runs instead of starting a new session for each.
-if [ ! -d "$WINEPREFIX" ]; then
-  wineboot -i >/dev/null 2>&1 </dev/null
-fi
+# The server is started first: one that wineboot started would not stay.
+mkdir -p "$WINEPREFIX"
 wineserver -p60 >/dev/null 2>&1 </dev/null || true
+wineboot -i >/dev/null 2>&1 </dev/null
 wine cmd /c exit >/dev/null 2>&1 </dev/null
 
 failures=0
@@ -35,7 +35,10 @@ fail() {
 
 echo "== Windows test binaries"
 # The install check drives a Linux install; the Windows layout is made by make dist-windows.
-(cd "$win_build" && ctest --output-on-failure -E '^install_') || fail "Windows test binaries"
+# A case that names a Linux device (/dev/zero) means nothing on Windows; under Wine the name
+# even reaches the Linux device.
+(cd "$win_build" && GTEST_FILTER='-*IncludeDevice*' ctest --output-on-failure -E '^install_') ||
+  fail "Windows test binaries"
 
 work="$WINEPREFIX/drive_c/pinforge-tests"
 rm -rf "$work"
