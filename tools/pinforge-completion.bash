@@ -1,41 +1,38 @@
 # bash completion for pinforge: switches, -lang values, and template names for -template
-# (the names pinforge itself finds: PINFORGE_TEMPLATE_PATH folders, then the template library
-# installed next to the program), besides plain file names.
+# (the names pinforge itself finds, in its own search order), besides plain file names.
 # Installed as <prefix>/share/bash-completion/completions/pinforge.
 
 # The folder this file was installed in: <prefix>/share/bash-completion/completions.
 _pinforge_completion_dir=$(cd "$(dirname "${BASH_SOURCE[0]}")" 2>/dev/null && pwd)
 
-# Prints the folders searched for templates, one per line, in pinforge's own order.
-_pinforge_template_dirs() {
-  local program=$1 dir
-  local IFS=:
-  for dir in $PINFORGE_TEMPLATE_PATH; do
-    [ -n "$dir" ] && printf '%s\n' "$dir"
-  done
-  # The library installed next to the program being completed ...
+# Prints the template names the program being completed finds, one per line. The program's own
+# `--help` lists them in its search order (PINFORGE_TEMPLATE_PATH, the library installed beside
+# it, and the source tree's templates/ when it runs from its build folder), so no second copy of
+# that order is kept here. When the program cannot be run, the PINFORGE_TEMPLATE_PATH folders
+# and the library installed with this file are read instead.
+_pinforge_template_names() {
+  local program=$1
   if [[ $program != */* ]]; then
     program=$(type -P -- "$program" 2>/dev/null)
   fi
-  if [ -n "$program" ]; then
-    program=$(readlink -f -- "$program" 2>/dev/null || printf '%s' "$program")
-    printf '%s\n' "${program%/*}/../share/pinforge/templates"
+  if [ -n "$program" ] && [ -x "$program" ]; then
+    local help
+    if help=$("$program" --help 2>/dev/null); then
+      printf '%s\n' "$help" | sed -n '/^Templates:$/,$ { /^  [^ (]/ s/^  //p; }'
+      return 0
+    fi
   fi
-  # ... and the one installed with this completion file.
-  if [ -n "$_pinforge_completion_dir" ]; then
-    printf '%s\n' "$_pinforge_completion_dir/../../pinforge/templates"
-  fi
-}
-
-# Prints the template names (without .tmpl or .tcl) of every template folder, once each.
-_pinforge_template_names() {
   local dir file name
   local -A seen=()
-  while IFS= read -r dir; do
-    [ -d "$dir" ] || continue
+  local folders=$PINFORGE_TEMPLATE_PATH
+  [ -n "$_pinforge_completion_dir" ] && folders+=:$_pinforge_completion_dir/../../pinforge/templates
+  local IFS=:
+  for dir in $folders; do
+    [ -n "$dir" ] && [ -d "$dir" ] || continue
     for file in "$dir"/*; do
       [ -f "$file" ] || continue
       name=${file##*/}
+      [[ $name == .* ]] && continue
       name=${name%.tmpl}
       name=${name%.tcl}
       if [ -z "${seen[$name]+set}" ]; then
@@ -43,7 +40,7 @@ _pinforge_template_names() {
         printf '%s\n' "$name"
       fi
     done
-  done < <(_pinforge_template_dirs "$1")
+  done
 }
 
 _pinforge() {

@@ -2,7 +2,10 @@
 // negations: keeping or dropping a stretch of template depending on whether the design has a
 // port of a kind (or a generic) whose name matches a pattern, on the name of the current port of
 // an iteration, or on what the current generic or port declares; blocks nest on a small stack.
+#include <iterator>
+#include <optional>
 #include <string>
+#include <string_view>
 
 #include "engine/forge.h"
 #include "engine/keyword_table.h"
@@ -186,6 +189,58 @@ bool Forge::doIfPort(std::string_view token, bool isIfPort, const PortRecord* po
   }
   const bool matches = anyAlternativeMatches(port->m_Name, *pattern, !m_CaseSensitiveIf);
   return addCondition(matches == isIfPort ? 2 : 1, index);
+}
+
+namespace {
+
+/// The kind names of @IFKIND, in PortTypeKind's order.
+constexpr std::string_view kKindNames[] = {"bit",  "vector",    "integer", "record",
+                                           "array", "enum", "interface", "other"};
+
+std::optional<PortTypeKind> kindNamed(std::string_view name) {
+  for (size_t i = 0; i < std::size(kKindNames); ++i) {
+    const std::string_view known = kKindNames[i];
+    if (name.size() != known.size()) continue;
+    bool same = true;
+    for (size_t c = 0; c < name.size() && same; ++c)
+      same = (name[c] | 0x20) == known[c];
+    if (same) return static_cast<PortTypeKind>(i);
+  }
+  return std::nullopt;
+}
+
+}  // namespace
+
+bool Forge::doIfKind(std::string_view token, bool isIfKind, const PortRecord* port) {
+  trace("doIfKind() called: token=%.*s|Condition=%d\n", static_cast<int>(token.size()),
+        token.data(), isIfKind ? 1 : 0);
+  const int index = isIfKind ? kKwIfKind : kKwIfNKind;
+  if (m_Conditions[m_ConditionalDepth] == 1) return addCondition(1, index);
+  if (port == nullptr) {
+    reportError("@IFKIND and @IFNKIND may only occur inside an @ITERATE@ over ports.");
+    return true;
+  }
+  std::string_view rest = token;
+  nextField(rest, " \t");
+  const std::optional<std::string_view> kinds = nextField(rest, " \t\r\n@");
+  bool matches = false;
+  bool valid = kinds.has_value() && rest.find_first_not_of(" \t\r\n@") == std::string_view::npos;
+  for (std::string_view list = kinds.value_or(""); valid;) {
+    const size_t bar = list.find('|');
+    const std::optional<PortTypeKind> kind = kindNamed(list.substr(0, bar));
+    valid = kind.has_value();
+    matches = matches || (valid && *kind == port->m_Kind);
+    if (bar == std::string_view::npos) break;
+    list.remove_prefix(bar + 1);
+  }
+  if (!valid) {
+    reportError(
+        "Invalid syntax for @IFKIND or @IFNKIND directive, must be of the form:\n"
+        "@IFKIND KIND|KIND@ with KIND one of bit, vector, integer, record, array, enum, "
+        "interface, other");
+    return true;
+  }
+  return addCondition(matches == isIfKind ? 2 : 1, index);
 }
 
 bool Forge::doIfDeclared(int index, const PortRecord* port) {

@@ -48,6 +48,8 @@ bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
       case kKwIfNHas: return doIf(token, false);
       case kKwIfPort: return doIfPort(token, true, port);
       case kKwIfNPort: return doIfPort(token, false, port);
+      case kKwIfKind: return doIfKind(token, true, port);
+      case kKwIfNKind: return doIfKind(token, false, port);
       case kKwIfDefault:
       case kKwIfNDefault:
       case kKwIfNTyped:
@@ -78,6 +80,8 @@ bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
     case kKwGenericValue: return writeGenericField(index);
     case kKwIfPort: return doIfPort(token, true, port);
     case kKwIfNPort: return doIfPort(token, false, port);
+    case kKwIfKind: return doIfKind(token, true, port);
+    case kKwIfNKind: return doIfKind(token, false, port);
     case kKwIfDefault:
     case kKwIfNDefault:
     case kKwIfNTyped:

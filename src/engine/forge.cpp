@@ -66,6 +66,19 @@ void Forge::reportRangeError(const PortRecord& port) {
   m_Message = std::move(message);
 }
 
+void Forge::reportValueError(const GenericRecord& generic) {
+  if (m_Status != kStatusOk) return;
+  m_Status = kStatusTemplateError;
+  std::string message = "Error - Template file line ";
+  message += std::to_string(m_Reader.line());
+  message += " needs the value of generic ";
+  message += generic.m_Name;
+  message += ", which has neither a default nor a -g value; give one with -g ";
+  message += generic.m_Name;
+  message += "=VALUE\n";
+  m_Message = std::move(message);
+}
+
 void Forge::trace(const char* format, ...) const {
   if (m_Debug == nullptr) return;
   va_list args;

@@ -49,6 +49,9 @@ class Forge {
   /// Records, as the first error, that the template needs the range of `port`, which the
   /// design could not evaluate; the message carries the port's problem text uncut.
   void reportRangeError(const PortRecord& port);
+  /// A template wrote the value of a generic that has none: writing nothing would leave a
+  /// generic map or constant that does not compile, reported as success.
+  void reportValueError(const GenericRecord& generic);
   /// True once an error has been recorded.
   bool failed() const { return m_Status != kStatusOk; }
   /// The template's name as the user gave it; warnings name the template by it.
@@ -101,6 +104,10 @@ class Forge {
   /// current generic has default text, or whether the current generic or `port` (null outside
   /// a port iteration) has declared type text.
   bool doIfDeclared(int index, const PortRecord* port);
+  /// @IFKIND kinds@ / @IFNKIND kinds@: tests the declared kind of the current port of an
+  /// iteration against a '|'-separated list of kind names (bit, vector, integer, record,
+  /// array, enum, interface, other), ignoring case.
+  bool doIfKind(std::string_view token, bool isIfKind, const PortRecord* port);
   bool doEndIf();
   /// Opens a block kept (value 2) or dropped (value 1), opened by keyword `index` on the
   /// current line.

@@ -45,7 +45,12 @@ bool Forge::writeGenericField(int index) {
   switch (index) {
     case kKwGenericType: return writeText(m_CurrentGeneric->m_Type, false);
     case kKwGenericDefault: return writeText(m_CurrentGeneric->m_Default, false);
-    default: return writeText(m_CurrentGeneric->m_Value, false);
+    default:
+      if (m_CurrentGeneric->m_Value.empty()) {
+        reportValueError(*m_CurrentGeneric);
+        return true;
+      }
+      return writeText(m_CurrentGeneric->m_Value, false);
   }
 }
 

@@ -1,11 +1,11 @@
-// The template language's vocabulary: the 65 variable and directive words in one sorted table,
+// The template language's vocabulary: the 67 variable and directive words in one sorted table,
 // the prefix lookup that maps a token to its word, and the port-list kinds (which ports each of
 // the seventeen port-list variables selects).
 #pragma once
 
 #include <string_view>
 
-/// Indices of the keyword table. Variables come first (0-27), then directives (28-64). The
+/// Indices of the keyword table. Variables come first (0-27), then directives (28-66). The
 /// order is the table's sort order and is relied on by callers that store an index.
 enum Keyword : int {
   kKwBBusPort = 0,
@@ -47,40 +47,42 @@ enum Keyword : int {
   kKwGenericValue = 36,
   kKwIfDefault = 37,
   kKwIfHas = 38,
-  kKwIfNDefault = 39,
-  kKwIfNHas = 40,
-  kKwIfNPort = 41,
-  kKwIfNTyped = 42,
-  kKwIfPort = 43,
-  kKwIfTyped = 44,
-  kKwInvCase = 45,
-  kKwIterate = 46,
-  kKwIterator = 47,
-  kKwLowCase = 48,
-  kKwMap = 49,
-  kKwMapSignal = 50,
-  kKwNoExpandBus = 51,
-  kKwNoMap = 52,
-  kKwNoShowRange = 53,
-  kKwNoSuppresNewLine = 54,
-  kKwPercent = 55,
-  kKwPortMode = 56,
-  kKwPortType = 57,
-  kKwSameCase = 58,
-  kKwSet = 59,
-  kKwShowRange = 60,
-  kKwSuppresNewLine = 61,
-  kKwTab = 62,
-  kKwUpCase = 63,
-  kKwVhdlTypeDec = 64,
+  kKwIfKind = 39,
+  kKwIfNDefault = 40,
+  kKwIfNHas = 41,
+  kKwIfNKind = 42,
+  kKwIfNPort = 43,
+  kKwIfNTyped = 44,
+  kKwIfPort = 45,
+  kKwIfTyped = 46,
+  kKwInvCase = 47,
+  kKwIterate = 48,
+  kKwIterator = 49,
+  kKwLowCase = 50,
+  kKwMap = 51,
+  kKwMapSignal = 52,
+  kKwNoExpandBus = 53,
+  kKwNoMap = 54,
+  kKwNoShowRange = 55,
+  kKwNoSuppresNewLine = 56,
+  kKwPercent = 57,
+  kKwPortMode = 58,
+  kKwPortType = 59,
+  kKwSameCase = 60,
+  kKwSet = 61,
+  kKwShowRange = 62,
+  kKwSuppresNewLine = 63,
+  kKwTab = 64,
+  kKwUpCase = 65,
+  kKwVhdlTypeDec = 66,
 };
 
 /// Number of words in the table.
-inline constexpr int kKeywordCount = 65;
+inline constexpr int kKeywordCount = 67;
 /// Number of variable words ("%...%"); they come before every directive.
 inline constexpr int kVariableCount = 28;
 /// lookupKeyword's result for a token that begins with neither "%" nor "@" (plain text).
-inline constexpr int kKwPlainText = 65;
+inline constexpr int kKwPlainText = 67;
 /// lookupKeyword's result for a keyword token that matches no word.
 inline constexpr int kKwNoMatch = -1;
 
@@ -89,7 +91,7 @@ inline constexpr int kKwNoMatch = -1;
 /// kKwNoMatch when no word matches.
 int lookupKeyword(std::string_view token);
 
-/// The table word of `index` (lower case, as stored); empty for an index outside 0-64.
+/// The table word of `index` (lower case, as stored); empty for an index outside 0-66.
 std::string_view keywordWord(int index);
 
 /// Which ports a port-list kind selects by width.

@@ -79,7 +79,7 @@ const Design kVhdl{
      {"n", -1, -1, 'N', "", K::Other}},
     {{"WIDTH", "natural", "8", "16"},
      {"MODE", "string", "\"fast\"", "\"fast\""},
-     {"INIT", "std_logic_vector(WIDTH-1 downto 0)", "(others => '0')", ""}},
+     {"INIT", "std_logic_vector(WIDTH-1 downto 0)", "(others => '0')", "(others => '0')"}},
     "library ieee;\nuse ieee.std_logic_1164.all;\n"};
 
 const Design kVerilog{
@@ -136,6 +136,8 @@ TEST_P(DesignWordsTest, WritesWholeOutputAndResult) {
 
 std::string rowName(const ::testing::TestParamInfo<Row>& info) { return info.param.name; }
 
+const Design kOnePort{DesignLanguage::Vhdl, {{"Clk_In", -1, -1, 'I', "", K::Other}}, {}, ""};
+
 const std::string kGenericOnly = " may only occur inside an @ITERATE@%GENERIC% body.";
 const std::string kPortsOnly = " may only occur inside an @ITERATE@ over ports.";
 
@@ -152,14 +154,14 @@ INSTANTIATE_TEST_SUITE_P(
             "@SET SIGDELIM=;\n@@ITERATE@%GENERIC%@ITERATOR@ : @GENERIC_TYPE@ := "
             "@GENERIC_DEFAULT@ -- @GENERIC_VALUE@@ENDITERATE@",
             "WIDTH : natural := 8 -- 16;\nMODE : string := \"fast\" -- \"fast\";\n"
-            "INIT : std_logic_vector(WIDTH-1 downto 0) := (others => '0') -- ",
+            "INIT : std_logic_vector(WIDTH-1 downto 0) := (others => '0') -- (others => '0')",
             ""},
         Row{"VerilogParameterList", &kVerilog,
             "#(@ITERATE@%generic%.@ITERATOR@(@GENERIC_VALUE@)@ENDITERATE@)", "#(.W(8), .T(4))",
             ""},
         Row{"NamesTakeCaseValuesDoNot", &kVhdl,
             "@UPCASE@@ITERATE@%GENERIC%@LOWCASE@@ITERATOR@=@GENERIC_VALUE@@ENDITERATE@",
-            "width=16, mode=\"fast\", init=", ""},
+            "width=16, mode=\"fast\", init=(others => '0')", ""},
         Row{"NoGenericNoPass", &kEmpty, "x@ITERATE@%GENERIC%y@ENDITERATE@z", "xz", ""},
         Row{"IfHas", &kVhdl,
             "@IFHAS GENERIC=WIDTH@1@ENDIF@@IFHAS GENERIC=width@2@ENDIF@"
@@ -216,6 +218,16 @@ INSTANTIATE_TEST_SUITE_P(
             "d_7_:logic [W-1:0], d_6_:logic [W-1:0], d_5_:logic [W-1:0], d_4_:logic [W-1:0], "
             "d_3_:logic [W-1:0], d_2_:logic [W-1:0], d_1_:logic [W-1:0], d_0_:logic [W-1:0]",
             ""},
+        Row{"IfKind", &kVhdl,
+            "@SET SIGDELIM=@@ITERATE@%SIGNAL%@IFKIND integer|Record@i@ENDIF@"
+            "@IFNKIND bit|VECTOR|integer|record@n@ENDIF@@IFKIND enum@e@ENDIF@@ENDITERATE@",
+            "inein", ""},
+        Row{"IfKindOutside", &kVhdl, "@IFKIND bit@@ENDIF@", "",
+            errorAt(1, "@IFKIND and @IFNKIND" + kPortsOnly)},
+        Row{"IfKindUnknownName", &kOnePort, "@ITERATE@%PORT%@IFKIND bits@@ENDIF@@ENDITERATE@", "",
+            errorAt(1, "Invalid syntax for @IFKIND or @IFNKIND directive, must be of the form:\n"
+                       "@IFKIND KIND|KIND@ with KIND one of bit, vector, integer, record, array, "
+                       "enum, interface, other")},
         Row{"TypeOutside", &kVhdl, "x\n@PORT_TYPE@", "x\n", errorAt(2, "@PORT_TYPE@" + kPortsOnly)},
         Row{"ModeOutside", &kVhdl, "@PORT_MODE@", "", errorAt(1, "@PORT_MODE@" + kPortsOnly)},
         Row{"TypeDecKeepsDeclaredTypeOfNonBitPorts", &kVhdl,
@@ -237,6 +249,8 @@ const Design kDeclared{DesignLanguage::Verilog,
                         {"DEPTH", "positive", "", "16"},
                         {"P", "", "4", "4"}},
                        ""};
+
+const Design kEmptyValue{DesignLanguage::Verilog, {}, {{"W", "", "", ""}}, ""};
 
 // `word` as the innermost of `depth` nested blocks inside a generic iteration.
 std::string nestedInGenericBody(const std::string& word, int depth) {
@@ -262,6 +276,10 @@ INSTANTIATE_TEST_SUITE_P(
         Row{"NoDefault", &kDeclared,
             "@ITERATE@%GENERIC%@IFNDEFAULT@-g @ITERATOR@=@GENERIC_VALUE@@ENDIF@@ENDITERATE@",
             ", -g DEPTH=16, ", ""},
+        Row{"ValueNobodyGave", &kEmptyValue, "x\n@ITERATE@%GENERIC%@ITERATOR@ => @GENERIC_VALUE@@ENDITERATE@",
+            "x\nW => ",
+            "Error - Template file line 2 needs the value of generic W, which has neither a "
+            "default nor a -g value; give one with -g W=VALUE\n"},
         Row{"VerilogParameterTypes", &kDeclared,
             "@ITERATE@%GENERIC%parameter @IFTYPED@@GENERIC_TYPE@ @ENDIF@@ITERATOR@@ENDITERATE@",
             "parameter natural WIDTH, parameter positive DEPTH, parameter P", ""},
@@ -291,7 +309,6 @@ INSTANTIATE_TEST_SUITE_P(
             errorAt(1, "Keyword: @IFDEFAULT x@ is not a valid Variable or Directive name.")}),
     rowName);
 
-const Design kOnePort{DesignLanguage::Vhdl, {{"Clk_In", -1, -1, 'I', "", K::Other}}, {}, ""};
 const std::string kIfPortForm = errorAt(
     1, "Invalid syntax for @IFPORT or @IFNPORT directive, must be of the form:\n@IFPORT PATTERN@");
 const std::string kIfPortAlternative = errorAt(

@@ -44,11 +44,12 @@ done
 [ ${#templates[@]} -gt 0 ] || fail "no templates in $source/templates"
 
 # --- The installed program works from another folder, its Tcl path included -------------
+# Templates are given by name, so the installed program must find its own library.
 design=$source/examples/uart
-for template in vhdl_instance.tmpl port_table.tcl; do
-  (cd "$scratch/elsewhere" && "$prefix/bin/pinforge" -lib work "$design/uart_pkg.vhd" \
-    "$design/uart_tx.vhd" -module uart_tx -prj install_check \
-    -template "$prefix/share/pinforge/templates/$template" -o "out_$template.txt") \
+for template in vhdl_instance port_table; do
+  (cd "$scratch/elsewhere" && env -u PINFORGE_TEMPLATE_PATH "$prefix/bin/pinforge" -lib work \
+    "$design/uart_pkg.vhd" "$design/uart_tx.vhd" -module uart_tx -prj install_check \
+    -template "$template" -o "out_$template.txt") \
     >"$scratch/run.log" 2>&1
   status=$?
   if [ $status -ne 0 ] || ! grep -q uart_tx "$scratch/elsewhere/out_$template.txt"; then
@@ -102,6 +103,14 @@ for template in "${templates[@]}" my_table.tmpl my_script.tcl; do
   name=${template%.tmpl}
   name=${name%.tcl}
   printf '%s\n' "$offered" | grep -qxF -- "$name" || fail "completion does not offer template $name"
+done
+# A program that cannot be run: the names come from the folders the completion file knows.
+offered=$(complete_words no-such-pinforge -template '')
+for template in "${templates[@]}" my_table.tmpl; do
+  name=${template%.tmpl}
+  name=${name%.tcl}
+  printf '%s\n' "$offered" | grep -qxF -- "$name" \
+    || fail "completion without a runnable program does not offer template $name"
 done
 offered=$(complete_words pinforge -lib work x.vhd -template my_)
 [ "$(printf '%s\n' "$offered" | sort | tr '\n' ' ')" = "my_script my_table " ] \

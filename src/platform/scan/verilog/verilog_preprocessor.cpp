@@ -16,8 +16,10 @@ namespace {
 // exponential expansions) into one error instead of a hang or unbounded memory.
 constexpr size_t kMaxFrames = 256;
 constexpr size_t kMaxIncludeDepth = 64;
-constexpr size_t kMaxExpansions = 200000;
-constexpr size_t kMaxExpansionBytes = 32u << 20;
+// Per use of a macro outside any macro text. Real macros (UVM's included) stay far below these;
+// a recursive definition reaches them in microseconds instead of flooding the index pass.
+constexpr size_t kMaxExpansions = 20000;
+constexpr size_t kMaxExpansionBytes = 1u << 20;
 
 // Directives with no effect on ports: the rest of their line is ignored.
 constexpr std::array<std::string_view, 31> kLineDirectives = {
@@ -525,6 +527,7 @@ void Preprocessor::expand(const Token& token) {
     return;
   }
   if (!macro->functionLike && !macro->needsRewrite) {
+    m_ExpansionBytes += macro->body.size();
     const char* begin = macro->body.data();
     Lexer lexer(begin, begin + macro->body.size(), token.source, token.offset, m_Diagnostics);
     lexer.setCoarse(m_Coarse);
