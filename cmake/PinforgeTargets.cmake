@@ -7,8 +7,13 @@ set(PINFORGE_TEST_ENV
 
 function(pinforge_library name dir)
   file(GLOB sources CONFIGURE_DEPENDS ${CMAKE_SOURCE_DIR}/${dir}/*.cpp)
-  list(FILTER sources EXCLUDE REGEX "-win32\\.cpp$")
-  list(FILTER sources EXCLUDE REGEX "/src/main\\.cpp$")
+  # Each host-specific file has a twin for the other system; only this host's twin is built.
+  if(WIN32)
+    list(FILTER sources EXCLUDE REGEX "-posix\\.cpp$")
+  else()
+    list(FILTER sources EXCLUDE REGEX "-win32\\.cpp$")
+  endif()
+  list(FILTER sources EXCLUDE REGEX "/src/main(-win32)?\\.cpp$")
   if(sources)
     add_library(${name} STATIC ${sources})
     target_include_directories(${name} PUBLIC ${CMAKE_SOURCE_DIR}/src)
@@ -22,6 +27,16 @@ endfunction()
 
 function(pinforge_test name dir)
   file(GLOB sources CONFIGURE_DEPENDS ${CMAKE_SOURCE_DIR}/${dir}/*.cpp)
+  # A host may leave out test files that use what it lacks: those with a line matching
+  # PINFORGE_TEST_SKIP_IF (cmake/Windows.cmake says what and why).
+  if(PINFORGE_TEST_SKIP_IF)
+    foreach(source IN LISTS sources)
+      file(STRINGS ${source} uses REGEX "${PINFORGE_TEST_SKIP_IF}")
+      if(uses)
+        list(REMOVE_ITEM sources ${source})
+      endif()
+    endforeach()
+  endif()
   if(NOT sources)
     return()
   endif()

@@ -53,7 +53,7 @@ bool prepareScratchFolder() {
   scratchFolder() = pattern;
   std::atexit(removeScratchFolder);
   // The include folder is named twice, as -I and as PINFORGE_INCLUDE, so both searches run.
-  return setenv("PINFORGE_INCLUDE", (scratchFolder() / "inc").c_str(), 1) == 0;
+  return setenv("PINFORGE_INCLUDE", (scratchFolder() / "inc").string().c_str(), 1) == 0;
 }
 
 /// File names keep to a harmless alphabet so an input can never write outside the folder.
@@ -87,7 +87,7 @@ std::vector<SourcePart> splitParts(std::string_view input) {
 }
 
 bool writeFile(const fs::path& path, const std::string& text) {
-  std::FILE* file = std::fopen(path.c_str(), "wb");
+  std::FILE* file = std::fopen(path.string().c_str(), "wb");
   if (file == nullptr) return false;
   bool ok = std::fwrite(text.data(), 1, text.size(), file) == text.size();
   return std::fclose(file) == 0 && ok;

@@ -1,11 +1,9 @@
 // Builds the run's argument vector from the command line or from a response file.
 #include "response_file.h"
 
-#include <fcntl.h>
-#include <sys/stat.h>
-#include <unistd.h>
-
 #include <memory>
+
+#include "platform/hostkit.h"
 
 namespace {
 
@@ -13,25 +11,17 @@ struct FileCloser {
   void operator()(std::FILE* file) const { std::fclose(file); }
 };
 
-/// Opens a response file for reading, or writes why it cannot be one. The open does not block
-/// (a FIFO without a writer would stall it), and the file is looked at before a byte is read,
-/// so a FIFO or a device such as /dev/zero is refused instead of read forever.
+/// Opens a response file for reading, or writes why it cannot be one. A FIFO or a device such
+/// as /dev/zero is refused instead of read forever.
 std::unique_ptr<std::FILE, FileCloser> openResponseFile(std::FILE* messageStream,
                                                         const char* name) {
-  const int descriptor = ::open(name, O_RDONLY | O_NONBLOCK | O_CLOEXEC);
-  struct stat status {};
-  if (descriptor >= 0 && ::fstat(descriptor, &status) == 0 && S_ISREG(status.st_mode)) {
-    // O_NONBLOCK means nothing for a regular file, so the stream reads it as usual.
-    std::unique_ptr<std::FILE, FileCloser> file(::fdopen(descriptor, "r"));
-    if (file) return file;
-  }
-  if (descriptor >= 0) ::close(descriptor);
-  // Some systems open a directory for reading; it is no more a response file there than where
-  // the open fails.
-  if (descriptor < 0 || S_ISDIR(status.st_mode) || S_ISREG(status.st_mode))
-    std::fprintf(messageStream, "FATAL ERROR: Unable to open response file %s...\n", name);
-  else
+  bool notRegular = false;
+  std::unique_ptr<std::FILE, FileCloser> file(Host::File::openRegular(name, notRegular));
+  if (file) return file;
+  if (notRegular)
     std::fprintf(messageStream, "FATAL ERROR: Response file %s is not a regular file.\n", name);
+  else
+    std::fprintf(messageStream, "FATAL ERROR: Unable to open response file %s...\n", name);
   return nullptr;
 }
 

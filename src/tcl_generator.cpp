@@ -131,10 +131,10 @@ bool copyStream(std::FILE* from, std::FILE* to) {
 /// The script's path in a form no program can read as an option: a relative $TMPDIR such as
 /// "-x" would otherwise make "-x/pinforge-....tcl".
 std::string unambiguousPath(const std::string& name) {
-  if (name.starts_with('/')) return name;
+  if (std::filesystem::path(name).is_absolute()) return name;
   std::error_code error;
   const std::filesystem::path absolute = std::filesystem::absolute(name, error);
-  if (!error && absolute.string().starts_with('/')) return absolute.string();
+  if (!error && absolute.is_absolute()) return absolute.string();
   return "./" + name;
 }
 

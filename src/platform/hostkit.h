@@ -102,6 +102,10 @@ class File {
   /// to be created by its folder's identity and its last component. Empty when neither can
   /// be found. `regular` is set when the path names an existing regular file.
   static std::string identity(const char* path, bool& regular);
+  /// Opens `path` for reading only when it is a regular file, never blocking on a FIFO and
+  /// never reading a device. Null otherwise; `notRegular` is then set when the path could be
+  /// opened but names neither a regular file nor a folder (a FIFO, a device).
+  static std::FILE* openRegular(const char* path, bool& notRegular);
 };
 
 /// A file the run writes, with every write, flush and close checked and the first failure

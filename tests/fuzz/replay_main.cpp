@@ -41,11 +41,11 @@ int main(int argc, char** argv) {
     for (const fs::path& path : inputs) {
       std::ifstream file(path, std::ios::binary);
       if (!file) {
-        std::fprintf(stderr, "replay: cannot read %s\n", path.c_str());
+        std::fprintf(stderr, "replay: cannot read %s\n", path.string().c_str());
         return 1;
       }
       std::string bytes((std::istreambuf_iterator<char>(file)), std::istreambuf_iterator<char>());
-      std::fprintf(stderr, "replay: %s\n", path.c_str());
+      std::fprintf(stderr, "replay: %s\n", path.string().c_str());
       LLVMFuzzerTestOneInput(reinterpret_cast<const uint8_t*>(bytes.data()), bytes.size());
       ++replayed;
     }

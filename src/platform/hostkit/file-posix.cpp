@@ -137,6 +137,26 @@ std::string File::identity(const char* path, bool& regular) {
          std::string(lastComponent(path));
 }
 
+std::FILE* File::openRegular(const char* path, bool& notRegular) {
+  notRegular = false;
+  if (path == nullptr) return nullptr;
+  // The open does not block (a FIFO without a writer would stall it), and the file is looked
+  // at before a byte is read.
+  const int descriptor = ::open(path, O_RDONLY | O_NONBLOCK | O_CLOEXEC);
+  if (descriptor < 0) return nullptr;
+  struct stat status {};
+  if (::fstat(descriptor, &status) == 0 && S_ISREG(status.st_mode)) {
+    // O_NONBLOCK means nothing for a regular file, so the stream reads it as usual.
+    std::FILE* stream = ::fdopen(descriptor, "r");
+    if (stream != nullptr) return stream;
+  }
+  ::close(descriptor);
+  // Some systems open a directory for reading; it is no more a regular file there than where
+  // the open fails.
+  notRegular = !S_ISDIR(status.st_mode) && !S_ISREG(status.st_mode);
+  return nullptr;
+}
+
 /// The descriptor behind an output stream and the first failure met on it.
 struct OutputFile::Sink {
   int descriptor = -1;
