@@ -4,11 +4,11 @@
 // bounds; the extractor must agree on all of it.
 #include <gtest/gtest.h>
 
-#include <cctype>
 #include <cstdlib>
 #include <filesystem>
 #include <iostream>
 #include <map>
+#include <regex>
 #include <set>
 #include <string>
 #include <vector>
@@ -68,101 +68,35 @@ int modeCode(const std::string& mode) {
   return 0;
 }
 
-std::string withoutComments(const std::string& text) {
-  std::string code;
-  size_t at = 0;
-  for (size_t dashes; (dashes = text.find("--", at)) != std::string::npos;) {
-    code.append(text, at, dashes - at);
-    at = text.find('\n', dashes);
-    if (at == std::string::npos) return code;
-  }
-  code.append(text, at);
-  return code;
+// Comment-free, lower-case text: enough to spot unit headers and library clauses. Strings and
+// character literals are not told apart, as the fixtures do not need it.
+std::string codeOf(const std::string& text) {
+  static const std::regex comment("--[^\n]*");
+  return lowerCase(std::regex_replace(text, comment, ""));
 }
 
-bool isWordChar(char c) { return std::isalnum(static_cast<unsigned char>(c)) || c == '_'; }
-
-// A word of VHDL text: an identifier (lower case), an extended identifier or one other
-// character, and what directly precedes it.
-struct Word {
-  std::string text;
-  bool afterDot = false;    ///< a selected name's suffix, such as `work.entity`
-  bool afterBlank = false;  ///< white space separates it from what comes before
-  bool isName() const {
-    return isIdentifier() || (text.size() > 2 && text[0] == '\\' && text.back() == '\\');
-  }
-  bool isIdentifier() const { return !text.empty() && isWordChar(text[0]); }
-};
-
-// The words of comment-free text. Enough to spot unit headers and library clauses; strings
-// and character literals are not told apart, as the fixtures do not need it.
-std::vector<Word> wordsOf(const std::string& code) {
-  std::vector<Word> words;
-  size_t at = 0;
-  while (at < code.size()) {
-    const size_t start = at;
-    while (at < code.size() && std::isspace(static_cast<unsigned char>(code[at]))) ++at;
-    if (at == code.size()) break;
-    Word word;
-    word.afterBlank = at > start;
-    word.afterDot = at > 0 && code[at - 1] == '.';
-    size_t end = at + 1;
-    if (isWordChar(code[at])) {
-      while (end < code.size() && isWordChar(code[end])) ++end;
-    } else if (code[at] == '\\') {
-      const size_t close = code.find('\\', at + 1);
-      if (close != std::string::npos && close > at + 1) end = close + 1;
-    }
-    word.text = code.substr(at, end - at);
-    if (word.isIdentifier()) word.text = lowerCase(word.text);
-    words.push_back(std::move(word));
-    at = end;
-  }
-  return words;
-}
-
-// Whether words[at] is `keyword` as a word of its own, not a selected name's suffix.
-bool isKeyword(const std::vector<Word>& words, size_t at, std::string_view keyword) {
-  return at < words.size() && words[at].text == keyword && !words[at].afterDot;
-}
-
-// Whether words[at] is a name (identifier, or extended identifier when allowed) set off by
-// white space from the word before it.
-bool isSpacedName(const std::vector<Word>& words, size_t at, bool extended = false) {
-  return at < words.size() && words[at].afterBlank &&
-         (extended ? words[at].isName() : words[at].isIdentifier());
-}
-
-bool isSpaced(const std::vector<Word>& words, size_t at, std::string_view text) {
-  return at < words.size() && words[at].afterBlank && words[at].text == text;
-}
+// A keyword that starts a word of its own, not a selected name's suffix such as `work.entity`.
+const std::string kWordStart = R"((?:^|[^\w.\\]))";
+const std::string kName = R"((\w+|\\[^\\]+\\))";
 
 // Declares a package of its own (not a package body or instantiation): such files are
 // analysed ahead of every fixture so fixtures can use packages from other files.
 bool declaresPackage(const std::string& text) {
-  const std::vector<Word> words = wordsOf(withoutComments(text));
-  for (size_t i = 0; i < words.size(); ++i)
-    if (isKeyword(words, i, "package") && isSpacedName(words, i + 1) &&
-        isSpaced(words, i + 2, "is") &&
-        (i + 3 == words.size() || (words[i + 3].afterBlank && words[i + 3].text != "new")))
-      return true;
-  return false;
+  static const std::regex package(kWordStart + R"(package\s+\w+\s+is(\s*$|\s+(?!new\b)))");
+  return std::regex_search(codeOf(text), package);
 }
 
 // Library names from library clauses other than the predefined ones.
 std::set<std::string> namedLibraries(const std::string& text) {
+  static const std::regex clause(kWordStart + R"(library\s+(\w+(\s*,\s*\w+)*)\s*;)");
+  static const std::regex word(R"(\w+)");
   std::set<std::string> libraries;
-  const std::vector<Word> words = wordsOf(withoutComments(text));
-  for (size_t i = 0; i < words.size(); ++i) {
-    if (!isKeyword(words, i, "library") || i + 1 == words.size() || !words[i + 1].afterBlank)
-      continue;
-    std::vector<std::string> names;
-    size_t at = i + 1;
-    for (; at < words.size() && (words[at].isIdentifier() || words[at].text == ","); ++at)
-      if (words[at].isIdentifier()) names.push_back(words[at].text);
-    if (at == i + 1 || at == words.size() || words[at].text != ";") continue;
-    for (const std::string& library : names)
-      if (library != "ieee" && library != "std" && library != "work") libraries.insert(library);
+  const std::string code = codeOf(text);
+  for (std::sregex_iterator it(code.begin(), code.end(), clause), end; it != end; ++it) {
+    const std::string names = (*it)[1];
+    for (std::sregex_iterator name(names.begin(), names.end(), word); name != end; ++name)
+      if (name->str() != "ieee" && name->str() != "std" && name->str() != "work")
+        libraries.insert(name->str());
   }
   return libraries;
 }
@@ -279,22 +213,15 @@ std::vector<int> probeErrorLines(const std::string& output) {
 // The design units a file declares, as keys that clash exactly when GHDL would see one unit
 // defined twice.
 std::set<std::string> unitKeys(const std::string& text) {
+  static const std::regex header(kWordStart +
+                                 R"((architecture\s+\w+\s+of|package\s+body|entity|package|)"
+                                 R"(configuration|context)\s+)" +
+                                 kName + R"(\s+(is|of)\b)");
+  static const std::regex blanks(R"(\s+)");
   std::set<std::string> keys;
-  const std::vector<Word> words = wordsOf(withoutComments(text));
-  auto isOrOf = [&](size_t at) { return isSpaced(words, at, "is") || isSpaced(words, at, "of"); };
-  for (size_t i = 0; i < words.size(); ++i) {
-    if (isKeyword(words, i, "architecture") && isSpacedName(words, i + 1) &&
-        isSpaced(words, i + 2, "of") && isSpacedName(words, i + 3) && isSpaced(words, i + 4, "is"))
-      keys.insert("architecture " + words[i + 1].text + " of " + words[i + 3].text);
-    if (isKeyword(words, i, "package") && isSpaced(words, i + 1, "body") &&
-        isSpacedName(words, i + 2, true) && isOrOf(i + 3)) {
-      keys.insert("package body " + lowerCase(words[i + 2].text));
-      continue;
-    }
-    for (const char* kind : {"entity", "package", "configuration", "context"})
-      if (isKeyword(words, i, kind) && isSpacedName(words, i + 1, true) && isOrOf(i + 2))
-        keys.insert(std::string(kind) + " " + lowerCase(words[i + 1].text));
-  }
+  const std::string code = codeOf(text);
+  for (std::sregex_iterator it(code.begin(), code.end(), header), end; it != end; ++it)
+    keys.insert(std::regex_replace((*it)[1].str(), blanks, " ") + " " + (*it)[2].str());
   return keys;
 }
 
