@@ -1,5 +1,5 @@
 // List containers: the built-in cursor (first/next/hasCurrent/atLast), appends during a walk,
-// links, the order in which elements are deleted, and class names.
+// links and the order in which elements are deleted.
 #include "data/list.h"
 
 #include <gtest/gtest.h>
@@ -98,33 +98,6 @@ TEST(List, ElementsAreDeletedFromTheTail) {
   list.m_Head->m_Next = nullptr;
   second->deleteChain();
   EXPECT_EQ(deleted, (std::vector<int>{3, 2}));
-}
-
-TEST(List, ClassNamesAndFactories) {
-  List plain;
-  Object_list objects;
-  EXPECT_STREQ(plain.className(), "List");
-  EXPECT_EQ(plain.newList(), nullptr);
-  List* made = objects.newList();
-  ASSERT_NE(made, nullptr);
-  EXPECT_STREQ(made->className(), "Object_list");
-  EXPECT_TRUE(made->isEmpty());
-  delete made;
-
-  // Elements are owned by a list, so they are examined inside one.
-  objects.append(new List_element);
-  objects.appendObject(&g_Objects[5]);
-  List_element* bare = objects.m_Head;
-  auto* carrier = static_cast<Object_element*>(bare->m_Next);
-  EXPECT_STREQ(bare->className(), "List_element");
-  EXPECT_STREQ(carrier->className(), "Object_element");
-  EXPECT_EQ(bare->clone(), nullptr);
-  auto* copy = static_cast<Object_element*>(carrier->clone());
-  ASSERT_NE(copy, nullptr);
-  EXPECT_EQ(copy->m_Object, &g_Objects[5]);
-  EXPECT_EQ(copy->m_Next, nullptr);
-  EXPECT_EQ(copy->m_Prev, nullptr);
-  plain.append(copy);
 }
 
 }  // namespace

@@ -10,6 +10,7 @@
 #include <vector>
 
 #include "engine/forge.h"
+#include "support/scratch_dir.h"
 
 namespace handlers_test {
 
@@ -40,15 +41,7 @@ inline std::FILE* fileWith(std::string_view text) {
   return file;
 }
 
-inline std::string readAll(std::FILE* file) {
-  std::fflush(file);
-  std::rewind(file);
-  std::string text;
-  char buffer[4096];
-  size_t got = 0;
-  while ((got = std::fread(buffer, 1, sizeof buffer, file)) > 0) text.append(buffer, got);
-  return text;
-}
+using pinforge_test::readBack;
 
 inline void fillPorts(StbDataList& data, const std::vector<PortSpec>& ports) {
   for (const PortSpec& p : ports) data.appendOwned(new PortRecord(p.name, p.left, p.right, p.dir));
@@ -72,9 +65,9 @@ inline Run runOn(std::string_view templateText, StbDataList& data, bool traced =
     run.status = forge.getResult(run.message);
     run.warnings = forge.warnings();
   }
-  run.output = readAll(out);
+  run.output = readBack(out);
   if (debug != nullptr) {
-    run.trace = readAll(debug);
+    run.trace = readBack(debug);
     std::fclose(debug);
   }
   std::fclose(out);

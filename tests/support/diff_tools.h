@@ -2,7 +2,10 @@
 // with its two output streams interleaved, and the fixture files a suite runs over.
 #pragma once
 
+#include <gtest/gtest.h>
+
 #include <algorithm>
+#include <cstdlib>
 #include <filesystem>
 #include <string>
 #include <string_view>
@@ -21,6 +24,22 @@ using pinforge_test::writeFile;
 
 /// The full path of `name` found on PATH, or empty when it is not installed.
 inline std::string findTool(const std::string& name) { return pinforge_test::findOnPath(name); }
+
+/// Whether the suite runs in CI, where every reference tool is installed on purpose.
+inline bool inCi() {
+  const char* ci = std::getenv("CI");
+  return ci != nullptr && std::string_view(ci) == "true";
+}
+
+// A missing reference tool skips the test on a laptop but fails it under CI=true, so that a
+// broken install step cannot turn the suite green. Use in the body of a TEST.
+#define DIFFTEST_REQUIRE_TOOL(path, name)                                      \
+  do {                                                                          \
+    if ((path).empty()) {                                                       \
+      if (difftest::inCi()) FAIL() << (name) << " is not installed (CI=true)"; \
+      GTEST_SKIP() << (name) << " is not installed";                            \
+    }                                                                           \
+  } while (false)
 
 struct ToolRun {
   int status = -1;     ///< exit code; -1 when the tool could not start or was killed

@@ -1,16 +1,18 @@
 // A private temporary directory for one test, removed with everything in it afterwards, and
-// whole-file reads and writes for what a test puts in or finds there.
+// whole-file reads and writes for what a test puts in or finds there or a stream received.
 #pragma once
 
 #include <stdlib.h>
 #include <sys/stat.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <filesystem>
 #include <memory>
 #include <string>
 #include <string_view>
 #include <system_error>
+#include <vector>
 
 namespace pinforge_test {
 
@@ -34,6 +36,27 @@ inline bool readFile(const std::string& path, std::string& content) {
 inline std::string readFile(const std::string& path) {
   std::string content;
   return readFile(path, content) ? content : "<missing>";
+}
+
+/// Everything written to `file` so far, read back from its start.
+inline std::string readBack(std::FILE* file) {
+  std::fflush(file);
+  std::rewind(file);
+  std::string text;
+  char buffer[8192];
+  for (size_t got; (got = std::fread(buffer, 1, sizeof buffer, file)) > 0;) text.append(buffer, got);
+  return text;
+}
+
+/// The first line of every reader message in `text`; later lines of one start with two blanks.
+inline std::vector<std::string> messageHeads(const std::string& text) {
+  std::vector<std::string> heads;
+  for (size_t at = 0; at < text.size();) {
+    const size_t end = std::min(text.find('\n', at), text.size());
+    if (text.compare(at, 2, "  ") != 0) heads.push_back(text.substr(at, end - at));
+    at = end + 1;
+  }
+  return heads;
 }
 
 inline bool writeFile(const std::string& path, std::string_view content, bool executable = false) {

@@ -1,7 +1,9 @@
-// String helper: comparison modes, replacement, ASCII-only case conversion and formatting,
-// including texts that hold NUL bytes.
+// Hostkit's small helpers: the string's comparison modes, replacement, ASCII-only case
+// conversion and formatting (texts that hold NUL bytes included), the parts of a file name
+// written with either separator, and which stream the message manager's texts reach.
 #include <gtest/gtest.h>
 
+#include <cstdlib>
 #include <string>
 #include <string_view>
 
@@ -82,6 +84,56 @@ TEST(StringBase, CaseConversionFormatAndAssignment) {
   EXPECT_EQ(text.view(), "ab\0cd"s);
   text.Empty();
   EXPECT_STREQ(text.c_str(), "");
+}
+
+TEST(FileName, Parts) {
+  const struct {
+    const char* path;
+    const char* extension;
+    const char* tail;
+    const char* directory;
+  } cases[] = {
+      {"templates/gen.TCL", ".TCL", "gen.TCL", "templates"},
+      {"C:\\work\\ent.vhd", ".vhd", "ent.vhd", "C:\\work"},
+      {"mixed/dir\\name.tar.gz", ".gz", "name.tar.gz", "mixed/dir"},
+      {"dir.d/noext", "", "noext", "dir.d"},
+      {"trailing.", ".", "trailing.", ""},
+      {".profile", "", ".profile", ""},
+      {"dir/..", "", "..", "dir"},
+      {"dir/.hidden.tcl", ".tcl", ".hidden.tcl", "dir"},
+      {"dir/", "", "", "dir"},
+      {"dir//x.y", ".y", "x.y", "dir"},
+      {"/top", "", "top", "/"},
+      {"", "", "", ""},
+  };
+  for (const auto& c : cases) {
+    SCOPED_TRACE(c.path);
+    const Host::FileName name(c.path);
+    EXPECT_EQ(name.GetExtension().str(), c.extension);
+    EXPECT_EQ(name.GetTail().str(), c.tail);
+    EXPECT_EQ(name.GetDirectory().str(), c.directory);
+  }
+}
+
+TEST(MessageManager, ErrorsGoToStandardErrorDebugTextOnlyWhenAskedFor) {
+  auto manager = Host_MsgManData::createObject("Mod", "src", 1, "rev");
+  ASSERT_NE(manager, nullptr);
+  testing::internal::CaptureStdout();
+  testing::internal::CaptureStderr();
+  manager->issueError("ERROR: something %s failed\n");
+  EXPECT_EQ(testing::internal::GetCapturedStderr(), "ERROR: something %s failed\n");
+  EXPECT_EQ(testing::internal::GetCapturedStdout(), "");
+
+  ::unsetenv("PINFORGE_DEBUG_STUB");
+  testing::internal::CaptureStderr();
+  Host_MsgManData::debugStub("quiet\n");
+  EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
+
+  ::setenv("PINFORGE_DEBUG_STUB", "1", 1);
+  testing::internal::CaptureStderr();
+  Host_MsgManData::debugStub("Command line is: runscr x\n");
+  EXPECT_EQ(testing::internal::GetCapturedStderr(), "Command line is: runscr x\n");
+  ::unsetenv("PINFORGE_DEBUG_STUB");
 }
 
 }  // namespace

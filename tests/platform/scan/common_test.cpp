@@ -13,6 +13,7 @@
 #include "platform/scan/common/diagnostics.h"
 #include "platform/scan/common/source_buffer.h"
 #include "platform/scan/common/value.h"
+#include "support/scratch_dir.h"
 
 namespace {
 
@@ -113,18 +114,14 @@ TEST(Diagnostics, LongLinesAreClippedAroundTheCaret) {
 }
 
 TEST(Diagnostics, CountsEverythingButPrintsUpToTheCap) {
-  std::FILE* sink = std::tmpfile();
+  pinforge_test::FilePtr sink(std::tmpfile());
   ASSERT_NE(sink, nullptr);
-  scan::Diagnostics diagnostics(sink, 2);
+  scan::Diagnostics diagnostics(sink.get(), 2);
   for (int i = 0; i < 5; ++i) diagnostics.fileError("f", "e");
   diagnostics.warning(*scan::SourceBuffer::fromText("f", "x"), 0, "w");
   EXPECT_EQ(diagnostics.errorCount(), 5u);
   EXPECT_EQ(diagnostics.warningCount(), 1u);
-  std::rewind(sink);
-  std::string printed;
-  for (int c = std::fgetc(sink); c != EOF; c = std::fgetc(sink)) printed.push_back(static_cast<char>(c));
-  std::fclose(sink);
-  EXPECT_EQ(printed,
+  EXPECT_EQ(pinforge_test::readBack(sink.get()),
             "f: error: e\nf: error: e\n"
             "pinforge: too many messages from the design files; the rest are not shown\n");
 }

@@ -12,6 +12,7 @@
 #include "platform/scan/common/diagnostics.h"
 #include "platform/scan/verilog/verilog_reader.h"
 #include "platform/scan/verilog/verilog_text.h"
+#include "support/scratch_dir.h"
 
 namespace {
 
@@ -72,9 +73,9 @@ struct Input {
 
 Read read(const Input& input) {
   Read result;
-  std::FILE* sink = std::tmpfile();
+  pinforge_test::FilePtr sink(std::tmpfile());
   {
-    scan::Diagnostics diagnostics(sink, 1000);
+    scan::Diagnostics diagnostics(sink.get(), 1000);
     scan::verilog::VerilogReader reader(diagnostics, input.settings);
     std::vector<scan::DesignFileEntry> files;
     for (const std::string& name : input.fixtures) files.push_back({"work", fixture(name)});
@@ -91,14 +92,7 @@ Read read(const Input& input) {
                              std::to_string(info.line));
     }
   }
-  std::rewind(sink);
-  char buffer[4096];
-  while (std::fgets(buffer, sizeof buffer, sink)) {
-    std::string line(buffer);
-    if (!line.empty() && line.back() == '\n') line.pop_back();
-    if (line.rfind("  ", 0) != 0) result.messages.push_back(line);
-  }
-  std::fclose(sink);
+  result.messages = pinforge_test::messageHeads(pinforge_test::readBack(sink.get()));
   return result;
 }
 

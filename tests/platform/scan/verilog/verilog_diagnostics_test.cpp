@@ -12,8 +12,13 @@
 
 #include "platform/scan/common/diagnostics.h"
 #include "platform/scan/verilog/verilog_reader.h"
+#include "support/scratch_dir.h"
 
 namespace {
+
+using pinforge_test::FilePtr;
+using pinforge_test::messageHeads;
+using pinforge_test::readBack;
 
 struct ReadResult {
   std::vector<std::string> messages;  ///< first line of every message
@@ -21,23 +26,11 @@ struct ReadResult {
   bool found = false;
 };
 
-std::vector<std::string> headLines(std::FILE* sink) {
-  std::vector<std::string> lines;
-  std::rewind(sink);
-  char buffer[4096];
-  while (std::fgets(buffer, sizeof buffer, sink)) {
-    std::string line(buffer);
-    if (!line.empty() && line.back() == '\n') line.pop_back();
-    if (line.rfind("  ", 0) != 0) lines.push_back(line);
-  }
-  return lines;
-}
-
 ReadResult readText(const std::string& text, const char* unit = "m") {
   ReadResult result;
-  std::FILE* sink = std::tmpfile();
+  FilePtr sink(std::tmpfile());
   {
-    scan::Diagnostics diagnostics(sink, 1000);
+    scan::Diagnostics diagnostics(sink.get(), 1000);
     scan::verilog::VerilogReader reader(diagnostics);
     reader.indexText("t.v", text, "work");
     result.found = reader.selectUnit("work", unit);
@@ -45,8 +38,7 @@ ReadResult readText(const std::string& text, const char* unit = "m") {
     if (result.found) reader.readUnit(description);
     result.ports = std::move(description.ports);
   }
-  result.messages = headLines(sink);
-  std::fclose(sink);
+  result.messages = messageHeads(readBack(sink.get()));
   return result;
 }
 
@@ -199,18 +191,17 @@ TEST(VerilogIncludeTest, IncludeCycleIsAnError) {
   std::ofstream(dir + "/a.vh") << "`include \"b.vh\"\n";
   std::ofstream(dir + "/b.vh") << "`include \"a.vh\"\n";
   std::ofstream(dir + "/top.v") << "`include \"a.vh\"\nmodule m(input a); endmodule\n";
-  std::FILE* sink = std::tmpfile();
+  FilePtr sink(std::tmpfile());
   size_t ports = 0;
   {
-    scan::Diagnostics diagnostics(sink, 1000);
+    scan::Diagnostics diagnostics(sink.get(), 1000);
     scan::verilog::VerilogReader reader(diagnostics);
     reader.indexFiles({{"work", dir + "/top.v"}});
     scan::UnitDescription description;
     if (reader.selectUnit("work", "m") && (reader.readUnit(description), true))
       ports = description.ports.size();
   }
-  std::vector<std::string> messages = headLines(sink);
-  std::fclose(sink);
+  std::vector<std::string> messages = messageHeads(readBack(sink.get()));
   ASSERT_EQ(messages.size(), 1u);
   EXPECT_EQ(messages[0], dir + "/b.vh:1:1: error: include cycle: \"a.vh\" is already being read");
   EXPECT_EQ(ports, 1u);
@@ -219,15 +210,14 @@ TEST(VerilogIncludeTest, IncludeCycleIsAnError) {
 }
 
 TEST(VerilogIncludeTest, UnreadableDesignFileIsReported) {
-  std::FILE* sink = std::tmpfile();
+  FilePtr sink(std::tmpfile());
   {
-    scan::Diagnostics diagnostics(sink, 1000);
+    scan::Diagnostics diagnostics(sink.get(), 1000);
     scan::verilog::VerilogReader reader(diagnostics);
     reader.indexFiles({{"work", "/nonexistent/x.v"}});
     EXPECT_FALSE(reader.selectUnit("work", "x"));
   }
-  std::vector<std::string> messages = headLines(sink);
-  std::fclose(sink);
+  std::vector<std::string> messages = messageHeads(readBack(sink.get()));
   ASSERT_EQ(messages.size(), 1u);
   EXPECT_EQ(messages[0],
             "/nonexistent/x.v: error: cannot read the file: No such file or directory");

@@ -13,6 +13,7 @@
 #include "platform/scan/verilog/verilog_parser.h"
 #include "platform/scan/verilog/verilog_preprocessor.h"
 #include "platform/scan/verilog/verilog_sources.h"
+#include "support/scratch_dir.h"
 
 namespace scan::verilog {
 namespace {
@@ -114,10 +115,10 @@ INSTANTIATE_TEST_SUITE_P(
 
 // Preprocesses `text` and returns the token texts joined by blanks.
 std::string preprocess(const std::string& text, std::string* messages = nullptr) {
-  std::FILE* sink = std::tmpfile();
+  pinforge_test::FilePtr sink(std::tmpfile());
   std::string joined;
   {
-    Diagnostics diagnostics(sink);
+    Diagnostics diagnostics(sink.get());
     MacroTable macros;
     SourceStore sources("", {});
     std::unique_ptr<SourceBuffer> source = SourceBuffer::fromText("t.v", text);
@@ -129,13 +130,9 @@ std::string preprocess(const std::string& text, std::string* messages = nullptr)
       joined.append(token.text);
     }
   }
-  if (messages) {
-    std::rewind(sink);
-    char buffer[512];
-    while (std::fgets(buffer, sizeof buffer, sink))
-      if (buffer[0] != ' ') *messages += buffer;
-  }
-  std::fclose(sink);
+  if (messages)
+    for (const std::string& head : pinforge_test::messageHeads(pinforge_test::readBack(sink.get())))
+      *messages += head + "\n";
   return joined;
 }
 

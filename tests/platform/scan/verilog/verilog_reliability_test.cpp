@@ -13,6 +13,7 @@
 
 #include "platform/scan/common/diagnostics.h"
 #include "platform/scan/verilog/verilog_reader.h"
+#include "support/scratch_dir.h"
 
 namespace {
 
@@ -24,9 +25,9 @@ struct Outcome {
 
 Outcome read(const std::string& text) {
   Outcome outcome;
-  std::FILE* sink = std::tmpfile();
+  pinforge_test::FilePtr sink(std::tmpfile());
   {
-    scan::Diagnostics diagnostics(sink, 1000);
+    scan::Diagnostics diagnostics(sink.get(), 1000);
     scan::verilog::VerilogReader reader(diagnostics);
     reader.indexText("t.v", text, "work");
     if (reader.selectUnit("work", "m")) {
@@ -43,14 +44,7 @@ Outcome read(const std::string& text) {
       }
     }
   }
-  std::rewind(sink);
-  char line[4096];
-  while (std::fgets(line, sizeof line, sink)) {
-    std::string text(line);
-    if (!text.empty() && text.back() == '\n') text.pop_back();
-    if (text.rfind("  ", 0) != 0) outcome.messages.push_back(text);
-  }
-  std::fclose(sink);
+  outcome.messages = pinforge_test::messageHeads(pinforge_test::readBack(sink.get()));
   return outcome;
 }
 

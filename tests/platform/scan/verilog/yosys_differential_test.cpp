@@ -3,6 +3,8 @@
 // port names, directions, lines and bounds found there must equal what the extractor reports.
 #include <gtest/gtest.h>
 
+#include <nlohmann/json.hpp>
+
 #include <cctype>
 #include <cstdlib>
 #include <filesystem>
@@ -14,11 +16,12 @@
 
 #include "platform/scan.h"
 #include "support/diff_tools.h"
-#include "support/mini_json.h"
 
 namespace {
 
 using namespace difftest;
+// Yosys lists ports in declaration order; only an ordered object keeps it.
+using Json = nlohmann::ordered_json;
 
 // Types whose width is implied by the type itself; a port of such a type may be reported
 // without a range as long as Yosys gives it exactly that width from bit 0.
@@ -139,23 +142,21 @@ class YosysDifferential : public ::testing::TestWithParam<std::string> {
     return runTool({s_Yosys, "-q", "-s", path}, m_Workdir);
   }
 
-  bool readJson(const std::string& path, JsonValue& json) {
+  bool readJson(const std::string& path, Json& json) {
     std::string text;
-    return readFile(path, text) && JsonReader(text).parse(json);
+    if (!readFile(path, text)) return false;
+    json = Json::parse(text, nullptr, false);
+    return json.is_object();
   }
 
   // The modules Yosys reads from `file` itself, in the order it lists them.
-  std::vector<std::string> modulesOf(const JsonValue& design, const std::string& file) {
+  std::vector<std::string> modulesOf(const Json& design, const std::string& file) {
     std::vector<std::string> names;
-    const JsonValue* modules = design.member("modules");
-    if (modules == nullptr) return names;
-    for (const auto& [name, module] : modules->members) {
-      const JsonValue* attributes = module.member("attributes");
-      const JsonValue* src = attributes != nullptr ? attributes->member("src") : nullptr;
-      if (src != nullptr && src->text.rfind(file + ":", 0) == 0 &&
-          attributes->member("is_interface") == nullptr)
+    const Json modules = design.value("modules", Json::object());
+    for (const auto& [name, module] : modules.items())
+      if (module.value(Json::json_pointer("/attributes/src"), "").rfind(file + ":", 0) == 0 &&
+          !module.contains(Json::json_pointer("/attributes/is_interface")))
         names.push_back(name);
-    }
     return names;
   }
 
@@ -163,7 +164,7 @@ class YosysDifferential : public ::testing::TestWithParam<std::string> {
   // leaving out (with a note) the ones Yosys cannot elaborate. Fills `elaborated` with each
   // module's JSON description.
   void elaborate(const std::vector<std::string>& files, const std::vector<std::string>& modules,
-                 std::map<std::string, JsonValue>& elaborated) {
+                 std::map<std::string, Json>& elaborated) {
     std::string all = "design -save pinforge_read\n";
     for (size_t i = 0; i < modules.size(); ++i)
       all += "design -load pinforge_read\nhierarchy -top " + modules[i] + "\nwrite_json " +
@@ -181,22 +182,18 @@ class YosysDifferential : public ::testing::TestWithParam<std::string> {
           continue;
         }
       }
-      JsonValue design;
-      const JsonValue* module = nullptr;
-      if (readJson(json, design) && design.member("modules") != nullptr)
-        module = design.member("modules")->member(modules[i]);
-      if (module == nullptr) {
+      Json design;
+      const Json::json_pointer module = Json::json_pointer("/modules") / modules[i];
+      if (!readJson(json, design) || !design.contains(module)) {
         ADD_FAILURE() << "no JSON description of module " << modules[i] << " in " << json;
         continue;
       }
-      elaborated[modules[i]] = *module;
+      elaborated[modules[i]] = design[module];
     }
   }
 
-  void comparePorts(const std::string& where, const JsonValue& module, const ScanPortList& ours) {
-    const JsonValue* ports = module.member("ports");
-    const JsonValue* nets = module.member("netnames");
-    if (ports == nullptr) {
+  void comparePorts(const std::string& where, const Json& module, const ScanPortList& ours) {
+    if (!module.contains("ports")) {
       ADD_FAILURE() << where << ": Yosys lists no ports";
       return;
     }
@@ -209,17 +206,17 @@ class YosysDifferential : public ::testing::TestWithParam<std::string> {
       userTypes = userTypes || kBuiltinTypes.count(port->typeName()) == 0;
     }
     std::string theirOrder;
-    for (const auto& [name, port] : ports->members) {
+    const Json& ports = module["ports"];
+    for (const auto& [name, port] : ports.items()) {
       theirOrder += name + " ";
       const auto found = oursByName.find(name);
       if (found == oursByName.end()) {
         ADD_FAILURE() << where << ": port " << name << ": missing in ours";
         continue;
       }
-      const JsonValue* net = nets != nullptr ? nets->member(name) : nullptr;
-      const JsonValue* attributes = net != nullptr ? net->member("attributes") : nullptr;
-      const JsonValue* src = attributes != nullptr ? attributes->member("src") : nullptr;
-      comparePort(where + ": port " + name, port, src != nullptr ? src->text : "", *found->second);
+      const std::string src = module.value(
+          Json::json_pointer("/netnames") / name / "attributes" / "src", std::string());
+      comparePort(where + ": port " + name, port, src, *found->second);
       oursByName.erase(found);
     }
     for (const auto& [name, port] : oursByName)
@@ -227,25 +224,23 @@ class YosysDifferential : public ::testing::TestWithParam<std::string> {
                     << "), Yosys has no such port";
     // Yosys numbers ports of struct and enum types after all others, so with user types
     // its order says nothing.
-    if (oursByName.empty() && ours.size() == ports->members.size() && oursOrder != theirOrder &&
+    if (oursByName.empty() && ours.size() == ports.size() && oursOrder != theirOrder &&
         !userTypes)
       ADD_FAILURE() << where << ": port order: ours " << oursOrder << "; Yosys " << theirOrder;
   }
 
-  void comparePort(const std::string& where, const JsonValue& theirs, const std::string& src,
+  void comparePort(const std::string& where, const Json& theirs, const std::string& src,
                    const ScanPort& ours) {
-    const JsonValue* direction = theirs.member("direction");
-    const std::string theirDirection = direction != nullptr ? direction->text : "?";
+    const std::string theirDirection = theirs.value("direction", "?");
     if (ours.direction() != directionCode(theirDirection))
       ADD_FAILURE() << where << ": direction: ours " << ours.direction() << ", Yosys "
                     << theirDirection << " (" << directionCode(theirDirection) << ")";
     if (!src.empty() && !lineInSource(src, ours.sourceLine()))
       ADD_FAILURE() << where << ": line: ours " << ours.sourceLine() << ", Yosys " << src;
 
-    const JsonValue* bits = theirs.member("bits");
-    const long long width = bits != nullptr ? static_cast<long long>(bits->items.size()) : 0;
-    const long long offset = theirs.integer("offset", 0);
-    const bool upto = theirs.integer("upto", 0) != 0;
+    const long long width = static_cast<long long>(theirs.value("bits", Json::array()).size());
+    const long long offset = theirs.value("offset", 0LL);
+    const bool upto = theirs.value("upto", 0) != 0;
     const long long left = upto ? offset : offset + width - 1;
     const long long right = upto ? offset + width - 1 : offset;
     const std::string theirRange = "[" + std::to_string(left) + ":" + std::to_string(right) + "]";
@@ -275,7 +270,7 @@ std::unique_ptr<ScratchDir> YosysDifferential::s_Root;
 std::vector<std::string> YosysDifferential::s_SharedFiles;
 
 TEST_P(YosysDifferential, PortsMatchYosys) {
-  if (s_Yosys.empty()) GTEST_SKIP() << "yosys is not installed";
+  DIFFTEST_REQUIRE_TOOL(s_Yosys, "yosys");
   ASSERT_TRUE(s_Root && !s_Root->path().empty()) << "no scratch directory";
   const std::string& file = GetParam();
   if (file.find_first_of(" \t\n;") != std::string::npos)
@@ -301,12 +296,12 @@ TEST_P(YosysDifferential, PortsMatchYosys) {
   }
   if (read.status != 0)
     GTEST_SKIP() << "Yosys rejects " << file << ": " << firstErrorLine(read.output);
-  JsonValue design;
+  Json design;
   ASSERT_TRUE(readJson(m_Workdir + "/read.json", design)) << "unreadable Yosys JSON";
   const std::vector<std::string> modules = modulesOf(design, file);
   if (modules.empty()) GTEST_SKIP() << file << " declares no module Yosys keeps";
 
-  std::map<std::string, JsonValue> elaborated;
+  std::map<std::string, Json> elaborated;
   elaborate(files, modules, elaborated);
 
   ScanExtractor extractor;
@@ -332,33 +327,6 @@ TEST_P(YosysDifferential, PortsMatchYosys) {
 }
 
 // The harness itself: a wrong reading of Yosys' answers would hide real mismatches.
-TEST(MiniJson, KeepsMemberOrderAndDecodesStrings) {
-  JsonValue json;
-  ASSERT_TRUE(JsonReader(R"( {"z": {"offset": -3, "upto": 1}, "a": [1, "x\"y\u0041\n", true, null],
-                             "m": {}} )")
-                  .parse(json));
-  ASSERT_EQ(json.members.size(), 3u);
-  EXPECT_EQ(json.members[0].name, "z");
-  EXPECT_EQ(json.members[1].name, "a");
-  EXPECT_EQ(json.member("z")->integer("offset", 0), -3);
-  EXPECT_EQ(json.member("z")->integer("missing", 7), 7);
-  const JsonValue* array = json.member("a");
-  ASSERT_TRUE(array != nullptr && array->items.size() == 4u);
-  EXPECT_EQ(array->items[1].text, "x\"yA\n");
-  EXPECT_TRUE(array->items[2].kind == JsonValue::Bool && array->items[2].boolean);
-  EXPECT_EQ(array->items[3].kind, JsonValue::Null);
-  EXPECT_TRUE(json.member("m")->members.empty());
-  EXPECT_EQ(json.member("nope"), nullptr);
-}
-
-TEST(MiniJson, RejectsMalformedDocuments) {
-  for (const char* text : {"", "{\"a\":}", "[1, 2", "{\"a\": 1} x", "\"open", "tru", "{a: 1}",
-                           "[1,]", "-"}) {
-    JsonValue json;
-    EXPECT_FALSE(JsonReader(text).parse(json)) << text;
-  }
-}
-
 TEST(YosysSourceSpans, AcceptLinesInsideAnySpan) {
   struct Case {
     const char* src;

@@ -3,6 +3,8 @@
 // and elaborated by Yosys with chparam setting the same values; every port's bounds must agree.
 #include <gtest/gtest.h>
 
+#include <nlohmann/json.hpp>
+
 #include <filesystem>
 #include <map>
 #include <ostream>
@@ -11,7 +13,6 @@
 
 #include "platform/scan.h"
 #include "support/diff_tools.h"
-#include "support/mini_json.h"
 
 namespace {
 
@@ -106,11 +107,11 @@ std::string oursRange(const ScanPort& port) {
 }
 
 /// The same form for a port of Yosys' JSON, which cannot tell a scalar from [0:0].
-std::string theirRange(const JsonValue& port) {
-  const JsonValue* bits = port.member("bits");
-  const long long width = bits != nullptr ? static_cast<long long>(bits->items.size()) : 0;
-  const long long offset = port.integer("offset", 0);
-  const bool upto = port.integer("upto", 0) != 0;
+std::string theirRange(const nlohmann::json& port) {
+  const long long width =
+      static_cast<long long>(port.value("bits", nlohmann::json::array()).size());
+  const long long offset = port.value("offset", 0LL);
+  const bool upto = port.value("upto", 0) != 0;
   if (width == 1 && offset == 0) return "scalar";
   const long long left = upto ? offset : offset + width - 1;
   const long long right = upto ? offset + width - 1 : offset;
@@ -149,7 +150,7 @@ class YosysOverride : public testing::TestWithParam<OverrideCase> {};
 
 TEST_P(YosysOverride, PortRangesMatchYosysChparam) {
   const std::string yosys = findTool("yosys");
-  if (yosys.empty()) GTEST_SKIP() << "yosys is not installed";
+  DIFFTEST_REQUIRE_TOOL(yosys, "yosys");
   const OverrideCase& c = GetParam();
   ScratchDir dir;
   ASSERT_FALSE(dir.path().empty());
@@ -170,13 +171,13 @@ TEST_P(YosysOverride, PortRangesMatchYosysChparam) {
   const ToolRun run = runTool({yosys, "-q", "-s", dir.file("run.ys")}, dir.path());
   ASSERT_EQ(run.status, 0) << firstErrorLine(run.output);
   ASSERT_EQ(run.output.find("did not match"), std::string::npos) << run.output;
-  JsonValue json;
   std::string text;
-  ASSERT_TRUE(readFile(dir.file("out.json"), text) && JsonReader(text).parse(json));
-  const JsonValue* modules = json.member("modules");
-  const JsonValue* module = modules != nullptr ? modules->member(c.module) : nullptr;
-  const JsonValue* ports = module != nullptr ? module->member("ports") : nullptr;
-  ASSERT_NE(ports, nullptr) << "no ports of " << c.module << " in Yosys' JSON";
+  ASSERT_TRUE(readFile(dir.file("out.json"), text));
+  const nlohmann::json json = nlohmann::json::parse(text, nullptr, false);
+  const nlohmann::json::json_pointer ports =
+      nlohmann::json::json_pointer("/modules") / c.module / "ports";
+  ASSERT_TRUE(json.is_object() && json.contains(ports))
+      << "no ports of " << c.module << " in Yosys' JSON";
 
   ScanSettings settings;
   for (const Override& o : c.overrides) settings.genericOverrides.emplace_back(o.name, o.ours);
@@ -187,7 +188,7 @@ TEST_P(YosysOverride, PortRangesMatchYosysChparam) {
   EXPECT_EQ(unknownNames, std::vector<std::string>{}) << "overrides that name no parameter";
 
   std::map<std::string, std::string> theirs;
-  for (const auto& [name, port] : ports->members) theirs[name] = theirRange(port);
+  for (const auto& [name, port] : json[ports].items()) theirs[name] = theirRange(port);
   EXPECT_EQ(ours, theirs);
 
   // A case whose overrides change no width would hold nothing against Yosys.

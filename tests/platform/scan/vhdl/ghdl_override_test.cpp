@@ -63,7 +63,7 @@ std::vector<std::string> ourBounds(const Case& c) {
 
 TEST(GhdlOverrides, BoundsFollowGenericsSetOnTheCommandLine) {
   const std::string ghdl = difftest::findTool("ghdl");
-  if (ghdl.empty()) GTEST_SKIP() << "ghdl is not installed";
+  DIFFTEST_REQUIRE_TOOL(ghdl, "ghdl");
   difftest::ScratchDir dir;
   ASSERT_FALSE(dir.path().empty());
   ASSERT_TRUE(dir.write("probe_open.vhd", probeArchitecture("describe_open", kCases[0].ports)));

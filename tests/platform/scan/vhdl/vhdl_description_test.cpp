@@ -11,6 +11,7 @@
 #include "platform/scan/common/diagnostics.h"
 #include "platform/scan/common/source_buffer.h"
 #include "platform/scan/vhdl/vhdl_reader.h"
+#include "support/scratch_dir.h"
 #include "vhdl_test_support.h"
 
 namespace {
@@ -28,10 +29,10 @@ struct Described {
 // Reads `texts` (file i is "f<i>.vhd" in library work) and describes `unit`.
 Described describe(const std::vector<std::string>& texts, const char* unit,
                    const Overrides& overrides = {}) {
-  std::FILE* log = std::tmpfile();
+  pinforge_test::FilePtr log(std::tmpfile());
   Described out;
   {
-    scan::Diagnostics diagnostics(log);
+    scan::Diagnostics diagnostics(log.get());
     ScanSettings settings;
     settings.genericOverrides = overrides;
     scan::vhdl::VhdlReader reader(diagnostics, settings);
@@ -42,12 +43,7 @@ Described describe(const std::vector<std::string>& texts, const char* unit,
     if (out.found) reader.readUnit(out.unit);
     out.units = reader.listUnits();
   }
-  if (log != nullptr) {
-    std::rewind(log);
-    char buffer[4096];
-    for (size_t n; (n = std::fread(buffer, 1, sizeof buffer, log)) > 0;) out.messages.append(buffer, n);
-    std::fclose(log);
-  }
+  out.messages = pinforge_test::readBack(log.get());
   return out;
 }
 
