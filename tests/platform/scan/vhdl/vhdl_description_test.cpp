@@ -3,49 +3,17 @@
 // and the listing of every unit read.
 #include <gtest/gtest.h>
 
-#include <cstdio>
 #include <string>
-#include <utility>
 #include <vector>
 
-#include "platform/scan/common/diagnostics.h"
-#include "platform/scan/common/source_buffer.h"
-#include "platform/scan/vhdl/vhdl_reader.h"
-#include "support/scratch_dir.h"
 #include "vhdl_test_support.h"
 
 namespace {
 
-using Overrides = std::vector<std::pair<std::string, std::string>>;
+using vhdl_test::describe;
+using vhdl_test::Described;
+using vhdl_test::Overrides;
 using Kind = ScanPort::Kind;
-
-struct Described {
-  bool found = false;
-  scan::UnitDescription unit;
-  std::vector<ScanUnitInfo> units;
-  std::string messages;
-};
-
-// Reads `texts` (file i is "f<i>.vhd" in library work) and describes `unit`.
-Described describe(const std::vector<std::string>& texts, const char* unit,
-                   const Overrides& overrides = {}) {
-  pinforge_test::FilePtr log(std::tmpfile());
-  Described out;
-  {
-    scan::Diagnostics diagnostics(log.get());
-    ScanSettings settings;
-    settings.genericOverrides = overrides;
-    scan::vhdl::VhdlReader reader(diagnostics, settings);
-    for (size_t i = 0; i < texts.size(); ++i)
-      reader.indexSource(
-          scan::SourceBuffer::fromText("f" + std::to_string(i) + ".vhd", texts[i]), "work");
-    out.found = reader.selectUnit("work", unit);
-    if (out.found) reader.readUnit(out.unit);
-    out.units = reader.listUnits();
-  }
-  out.messages = pinforge_test::readBack(log.get());
-  return out;
-}
 
 // The fixture files, read as a run reads them.
 Described describeFixtures(const std::vector<std::string>& files, const char* unit,
@@ -243,7 +211,6 @@ TEST(VhdlDescription, UnevaluableRangesAreUnknownWithTheFix) {
        "unknown: port 'd': cannot evaluate WIDTH-1 downto 0: generic 'WIDTH' has no value; "
        "give one with -g WIDTH=VALUE"},
       {"unconstrained_and_scalar_ports_are_not_unknown", {kEntity}, {}, "u", "-"},
-      {"scalar", {kEntity}, {}, "b", "-"},
       {"bad_override_never_falls_back_to_the_default", {kEntity}, {{"WIDTH", "nope"}}, "d",
        "unknown: port 'd': cannot evaluate WIDTH-1 downto 0: -g WIDTH=nope cannot be "
        "evaluated: 'nope' is not declared"},
@@ -399,20 +366,6 @@ TEST(VhdlDescription, ListsEveryUnitInFileOrder) {
                        "work package body Pkg f0.vhd:3", "work package Inst f0.vhd:4",
                        "work entity Top f0.vhd:5", "work architecture RTL f0.vhd:6",
                        "work configuration Cfg f0.vhd:7", "work entity top f1.vhd:1"}));
-}
-
-TEST(VhdlDescription, TruncatedHeadersDescribeWhatWasRead) {
-  // Each prefix of a header: no crash, and nothing is described past the text.
-  const std::string text =
-      "library ieee; use ieee.std_logic_1164.all;\n"
-      "entity e is generic (W : natural := 4; type t);\n"
-      "port (a : in std_logic_vector(W-1 downto 0) := (others => '0'); b : out t);\nend;";
-  for (size_t n = 0; n <= text.size(); ++n) {
-    Described d = describe({text.substr(0, n)}, "e");
-    if (!d.found) continue;
-    EXPECT_LE(d.unit.generics.size(), 2u) << n;
-    EXPECT_LE(d.unit.ports.size(), 2u) << n;
-  }
 }
 
 TEST(VhdlDescription, ReachesTheExtractorWithItsSettings) {

@@ -6,33 +6,13 @@
 #include <random>
 #include <string>
 
-#include "platform/scan/common/diagnostics.h"
-#include "platform/scan/common/source_buffer.h"
-#include "platform/scan/vhdl/vhdl_reader.h"
+#include "vhdl_test_support.h"
 
 namespace {
 
-struct Outcome {
-  bool found = false;
-  bool headerSound = false;  ///< what readUnit returned
-  std::vector<ScanPort> ports;
-  size_t errors = 0;
-  size_t warnings = 0;
-};
+using Outcome = vhdl_test::Described;
 
-Outcome read(const std::string& text, const std::string& unit) {
-  scan::Diagnostics diagnostics(nullptr);
-  scan::vhdl::VhdlReader reader(diagnostics);
-  reader.indexSource(scan::SourceBuffer::fromText("t.vhd", text), "work");
-  Outcome o;
-  o.found = reader.selectUnit("work", unit);
-  scan::UnitDescription description;
-  if (o.found) o.headerSound = reader.readUnit(description);
-  o.ports = std::move(description.ports);
-  o.errors = diagnostics.errorCount();
-  o.warnings = diagnostics.warningCount();
-  return o;
-}
+Outcome read(const std::string& text, const char* unit) { return vhdl_test::describe({text}, unit); }
 
 std::string repeat(const std::string& s, size_t n) {
   std::string out;
@@ -114,31 +94,18 @@ const HostileCase kCases[] = {
     {"unterminated_block_comment_after_the_unit",
      [] { return "entity e is port (a : in bit); end;\n/* entity f is end;"; },
      "e", true, true, 1, 1, 0},
-    {"unterminated_block_comment_swallows_ports",
-     [] { return "entity e is port (a : in bit; /* b : out bit); end;"; },
-     "e", true, false, 1, 1, 0},
     {"unterminated_string_in_another_unit",
      [] { return "entity e is generic (S : string := \"abc\n); port (a : in bit); end;\nentity f is port (b : out bit); end;"; },
      "f", true, true, 1, 1, 0},
-    {"unterminated_string_in_the_generic_clause",
-     [] { return "entity e is generic (S : string := \"abc\n); port (a : in bit); end;"; },
-     "e", true, false, 0, 1, 0},
     {"nul_byte_between_ports",
      [] { return withNul("entity e is port (a : in bit;", " b : out bit); end;"); },
      "e", true, false, 1, 1, 0},
-    {"nul_byte_in_a_string_default",
-     [] { return withNul("entity e is generic (S : string := \"a", "b\"); port (a : in bit); end;"); },
-     "e", true, false, 0, 1, 0},
     {"nul_byte_in_another_unit",
      [] { return withNul("entity f is port (a : in bit;", " b : out bit); end;\nentity e is port (c : in bit); end;"); },
      "e", true, true, 1, 1, 0},
     {"header_cut_short_in_a_range", [] { return std::string("entity e is port (a : in bit_vector(7 downto"); }, "e",
      true, false, 0, 1, 0},
     {"header_cut_short_in_a_name", [] { return std::string("entity e is port (a : in bit; wi"); }, "e",
-     true, false, 1, 1, 0},
-    {"header_cut_short_in_a_mode", [] { return std::string("entity e is port (a : in bit; outpu : ou"); }, "e",
-     true, false, 1, 1, 0},
-    {"syntax_error_in_the_port_clause", [] { return std::string("entity e is port (a : in bit;; b : out bit); end;"); }, "e",
      true, false, 1, 1, 0},
     {"alias_cycles",
      [] {
@@ -165,10 +132,10 @@ TEST_P(Hostile, FinishesWithDiagnostics) {
   Outcome o = read(c.text(), c.unit);
   EXPECT_EQ(o.found, c.found);
   EXPECT_EQ(o.headerSound, c.headerSound);
-  EXPECT_EQ(o.ports.size(), c.ports);
+  EXPECT_EQ(o.unit.ports.size(), c.ports);
   EXPECT_EQ(o.errors, c.errors);
   size_t ranged = 0;
-  for (const ScanPort& p : o.ports) ranged += p.hasRange() ? 1 : 0;
+  for (const ScanPort& p : o.unit.ports) ranged += p.hasRange() ? 1 : 0;
   EXPECT_EQ(ranged, c.rangedPorts);
 }
 
@@ -184,10 +151,10 @@ TEST(VhdlRobustness, FlatSumsOfAnyLengthEvaluate) {
                          "; end package;\nuse work.p.all;\n"
                          "entity e is port (a : in bit_vector(" + sum + " downto N - N)); end;",
                      "e");
-    ASSERT_EQ(o.ports.size(), 1u) << terms;
+    ASSERT_EQ(o.unit.ports.size(), 1u) << terms;
     int32_t left = 0;
     int32_t right = 0;
-    o.ports[0].getBounds(left, right);
+    o.unit.ports[0].getBounds(left, right);
     EXPECT_EQ(left, static_cast<int32_t>(terms)) << terms;
     EXPECT_EQ(o.warnings + o.errors, 0u) << terms;
   }
@@ -209,8 +176,8 @@ const char* kSample =
 TEST(VhdlRobustness, EveryPrefixOfAFileIsRead) {
   std::string full = kSample;
   Outcome whole = read(full, "s");
-  ASSERT_EQ(whole.ports.size(), 5u);
-  EXPECT_TRUE(whole.ports[4].hasRange());
+  ASSERT_EQ(whole.unit.ports.size(), 5u);
+  EXPECT_TRUE(whole.unit.ports[4].hasRange());
   EXPECT_EQ(whole.errors, 0u);
   for (size_t n = 0; n < full.size(); ++n) read(full.substr(0, n), "s");
 }
@@ -223,7 +190,7 @@ TEST(VhdlRobustness, BinaryJunkIsSurvived) {
     // Splice real text in so the parser gets past the index now and then.
     junk.insert(junk.size() / 2, kSample);
     Outcome o = read(junk, "s");
-    EXPECT_LE(o.ports.size(), 5u);
+    EXPECT_LE(o.unit.ports.size(), 5u);
   }
 }
 

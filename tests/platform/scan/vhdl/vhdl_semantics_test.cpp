@@ -5,10 +5,8 @@
 #include <string>
 #include <vector>
 
-#include "platform/scan/common/diagnostics.h"
-#include "platform/scan/common/source_buffer.h"
 #include "platform/scan/vhdl/vhdl_lexer.h"
-#include "platform/scan/vhdl/vhdl_reader.h"
+#include "vhdl_test_support.h"
 
 namespace {
 
@@ -19,16 +17,16 @@ struct File {
 
 // "name(left dir right)" or "name" per port, joined by blanks; "?" when the unit is missing.
 std::string portsOf(const std::vector<File>& files, const char* unit) {
-  scan::Diagnostics diagnostics(nullptr);
-  scan::vhdl::VhdlReader reader(diagnostics);
-  for (size_t i = 0; i < files.size(); ++i)
-    reader.indexSource(scan::SourceBuffer::fromText("f" + std::to_string(i) + ".vhd", files[i].text),
-                       files[i].library);
-  if (!reader.selectUnit("work", unit)) return "?";
+  std::vector<std::string> texts;
+  std::vector<std::string> libraries;
+  for (const File& file : files) {
+    texts.push_back(file.text);
+    libraries.push_back(file.library);
+  }
+  vhdl_test::Described d = vhdl_test::describe(texts, unit, {}, libraries);
+  if (!d.found) return "?";
   std::string out;
-  scan::UnitDescription description;
-  reader.readUnit(description);
-  for (const ScanPort& p : description.ports) {
+  for (const ScanPort& p : d.unit.ports) {
     if (!out.empty()) out += ' ';
     out += p.name();
     if (!p.hasRange()) continue;

@@ -1,14 +1,20 @@
-// Runs the extractor over fixture files and flattens the reported ports for comparison.
+// Runs the extractor over fixture files and flattens the reported ports for comparison, or
+// the VHDL reader over in-memory texts for the description of one unit.
 #pragma once
 
 #include <gtest/gtest.h>
 
+#include <cstdio>
 #include <cstdlib>
 #include <string>
 #include <utility>
 #include <vector>
 
 #include "platform/scan.h"
+#include "platform/scan/common/diagnostics.h"
+#include "platform/scan/common/source_buffer.h"
+#include "platform/scan/vhdl/vhdl_reader.h"
+#include "support/scratch_dir.h"
 
 namespace vhdl_test {
 
@@ -87,6 +93,44 @@ inline Port scalar(const char* name, const char* type, int direction, int line) 
 inline Port ranged(const char* name, const char* type, int direction, int line, int32_t left,
                    const char* dir, int32_t right) {
   return Port{name, type, direction, line, true, left, right, std::string(dir) == "to"};
+}
+
+using Overrides = std::vector<std::pair<std::string, std::string>>;
+
+struct Described {
+  bool found = false;
+  bool headerSound = false;  ///< what readUnit returned
+  scan::UnitDescription unit;
+  std::vector<ScanUnitInfo> units;
+  std::string messages;
+  size_t errors = 0;
+  size_t warnings = 0;
+};
+
+/// Reads `texts` (file i is "f<i>.vhd" in library `libraries[i]`, work when not given) and
+/// describes `unit` of work with `overrides` applied.
+inline Described describe(const std::vector<std::string>& texts, const char* unit,
+                          const Overrides& overrides = {},
+                          const std::vector<std::string>& libraries = {}) {
+  pinforge_test::FilePtr log(std::tmpfile());
+  Described out;
+  {
+    scan::Diagnostics diagnostics(log.get());
+    ScanSettings settings;
+    settings.genericOverrides = overrides;
+    scan::vhdl::VhdlReader reader(diagnostics, settings);
+    for (size_t i = 0; i < texts.size(); ++i)
+      reader.indexSource(
+          scan::SourceBuffer::fromText("f" + std::to_string(i) + ".vhd", texts[i]),
+          i < libraries.size() ? libraries[i] : std::string("work"));
+    out.found = reader.selectUnit("work", unit);
+    if (out.found) out.headerSound = reader.readUnit(out.unit);
+    out.units = reader.listUnits();
+    out.errors = diagnostics.errorCount();
+    out.warnings = diagnostics.warningCount();
+  }
+  out.messages = pinforge_test::readBack(log.get());
+  return out;
 }
 
 }  // namespace vhdl_test
