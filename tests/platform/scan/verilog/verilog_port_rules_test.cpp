@@ -100,8 +100,6 @@ INSTANTIATE_TEST_SUITE_P(
                  {"module m #(parameter logic [3:0] P = 4'hA, int Q = P + 1, type T = bit [Q:0])\n"
                   " (input T a, input [P:0] b); endmodule"},
                  {"a T 1 [11:0]", "b  1 [10:0]"}},
-        RuleCase{"BoundsBeyond32BitsGiveNoRange",
-                 {"module m(input [64'h1_0000_0000:0] a); endmodule"}, {"a  1 -"}},
         RuleCase{"UnitInElseBranch", {"`ifdef NEVER\n`else\nmodule m(input a);\nendmodule\n`endif"},
                  {"a  1 -"}},
         RuleCase{"DefineInBodyReachesLaterFiles",

@@ -148,6 +148,12 @@ INSTANTIATE_TEST_SUITE_P(
              "module m(input a); endmodule\n",
              {"a"}, true,
              {"t.v:2:21: error: macro `A expands too deeply (recursive definition?)"}},
+        Case{"MissingEndmoduleResyncs", "module a(input x);\nmodule m(input [3:0] y);\nendmodule\n",
+             {"y[3:0]"}, true, {"t.v:1:1: error: missing endmodule for module 'a'"}},
+        Case{"DuplicateModuleKeepsFirst",
+             "module m(input a); endmodule\nmodule m(input b, c); endmodule\n", {"a"}, true,
+             {"t.v:2:8: warning: module 'm' is already declared at t.v:1; the first "
+              "declaration is used"}},
         Case{"ErrorInTheBodyOnly", "module m(input a);\nassign x = (;\nendmodule\n", {"a"}, true,
              {}}),
     label);
