@@ -212,7 +212,6 @@ std::string evaluate(const std::string& expression) {
     std::string name(tokens.take().text);
     auto type = std::make_shared<TypeSpec>();
     if (name == "[") {
-      std::vector<Dimension> dims;
       Dimension dim;
       dim.left = parser.expression();
       tokens.take();
