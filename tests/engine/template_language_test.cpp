@@ -118,7 +118,6 @@ INSTANTIATE_TEST_SUITE_P(
         Row{"WidthEmpty", kNone, "@SET outlinewidth=@", "", kWidth},
         Row{"WidthNotNumber", kNone, "@SET outlinewidth=abc@", "", kWidth},
         Row{"SwitchNotOnOff", kNone, "@SET casesensitiveif=1@", "", onOff(1, "CASESENSITIVEIF")},
-        Row{"SwitchAbsent", kNone, "@SET expandbus=@", "", onOff(1, "EXPANDBUS")},
         Row{"SwitchTrailingBlank", kNone, "@SET suppresnewline=on @", "",
             onOff(1, "SUPPRESNEWLINE")},
         Row{"RangeNotPosition", kNone, "@SET showrange=AsSuffix@", "", onOff(1, "SHOWRANGE")},
@@ -198,7 +197,6 @@ INSTANTIATE_TEST_SUITE_P(
         Row{"EmptyName", kDesign, "@IFHAS IPORT=@", "", kIfForm},
         Row{"NoArgument", kDesign, "x@IFNHAS @", "x", kIfForm},
         Row{"HeaderVariableKind", kDesign, "@IFHAS MODULE=x@", "", kIfType},
-        Row{"DirectiveKind", kDesign, "@IFHAS MAP=clk@", "", kIfType},
         Row{"TwoBlanks", kDesign, "@IFHAS  IPORT=clk@", "", kIfType},
         Row{"BlankBeforeEquals", kDesign, "@IFHAS IPORT =clk@", "", kIfType}),
     rowName);
@@ -349,7 +347,6 @@ std::string kept(const std::string& block) {
 TEST(OpenBlock, WarnsAboutOutermost) {
   const OpenBlockRow rows[] = {
       {"a@IFHAS IPORT=zz@b", "a", dropped("@IFHAS at line 1")},
-      {"a\n@ifnhas IPORT=clk@\n@IFHAS PORT=*@b", "a\n", dropped("@IFNHAS at line 2")},
       {"\n\n@IFHAS PORT=*@x", "\n\nx", kept("@IFHAS at line 3")},
       {"@IFHAS PORT=*@@IFHAS PORT=*@x@ENDIF@", "x", kept("@IFHAS at line 1")},
       {"@IFHAS PORT=*@a\n@IFHAS PORT=zz@b", "a\n", dropped("@IFHAS at line 1")},
