@@ -68,8 +68,7 @@ TEST(FlowRun, TraceFileOnlyWhenDebuggingAFoundUnit) {
     std::vector<std::string> args = argsFor(c.module, c.templateName);
     if (c.debug) args.push_back("--a");
     // runscr is taken from beside the program first, so the program runs from bin/ too.
-    std::error_code error;
-    ASSERT_TRUE(std::filesystem::copy_file(binaryPath(), dir.file("bin/pinforge"), error));
+    ASSERT_TRUE(placeProgram(dir.file("bin/pinforge")));
     args.insert(args.begin(), dir.file("bin/pinforge"));
     const RunResult run = runProgram(args, dir.file("work"));
     ASSERT_TRUE(run.started);
@@ -132,10 +131,7 @@ TEST(FlowRun, FileSizeLimitFailsTheRun) {
       EXPECT_LE(partial.size(), 1024u);
       EXPECT_TRUE(expected.starts_with(partial));
     }
-    size_t files = 0;
-    for ([[maybe_unused]] const auto& entry : std::filesystem::directory_iterator(dir.path()))
-      ++files;
-    EXPECT_EQ(files, deleteOnError ? 2u : 3u) << "a temporary file was left behind";
+    EXPECT_EQ(dir.names().size(), deleteOnError ? 2u : 3u) << "a temporary file was left behind";
   }
 }
 
@@ -179,20 +175,12 @@ TEST(FlowRun, DeleteOnErrorOnTheTclPathRemovesWhatTheScriptWrote) {
     std::vector<std::string> args = argsFor("top", "t.tcl");
     if (deleteOnError) args.push_back("-deleteonerror");
     // runscr is taken from beside the program first, so the program runs from bin/ too.
-    std::error_code error;
-    ASSERT_TRUE(std::filesystem::copy_file(binaryPath(), dir.file("bin/pinforge"), error));
+    ASSERT_TRUE(placeProgram(dir.file("bin/pinforge")));
     args.insert(args.begin(), dir.file("bin/pinforge"));
     const RunResult run = runProgram(args, dir.file("work"));
     EXPECT_EQ(run.status, 1) << run.out << run.err;
     EXPECT_EQ(dir.read("work/out.txt"), deleteOnError ? "<missing>" : "partial\n");
   }
-}
-
-std::set<std::string> listing(const ScratchDir& dir) {
-  std::set<std::string> names;
-  for (const auto& entry : std::filesystem::directory_iterator(dir.path()))
-    names.insert(entry.path().filename().string());
-  return names;
 }
 
 TEST(FlowRun, InterruptedRunLeavesThePreviousOutput) {
@@ -204,7 +192,7 @@ TEST(FlowRun, InterruptedRunLeavesThePreviousOutput) {
     ASSERT_TRUE(dir.write("design.vhd", kDesign) && dir.write("out.txt", "previous"));
     // A template fed through a FIFO holds the run in the middle of its expansion.
     ASSERT_EQ(mkfifo(dir.file("t.txt").c_str(), 0600), 0);
-    const std::set<std::string> before = listing(dir);
+    const std::set<std::string> before = dir.names();
     std::vector<std::string> args = argsFor("top", "t.txt");
     args.insert(args.begin(), binaryPath());
     std::vector<char*> argv;
@@ -226,7 +214,7 @@ TEST(FlowRun, InterruptedRunLeavesThePreviousOutput) {
     for (auto deadline = std::chrono::steady_clock::now() + 20s;
          !temporarySeen && std::chrono::steady_clock::now() < deadline;) {
       if (writer < 0) writer = open(dir.file("t.txt").c_str(), O_WRONLY | O_NONBLOCK);
-      if (writer >= 0 && listing(dir).size() > before.size()) temporarySeen = true;
+      if (writer >= 0 && dir.names().size() > before.size()) temporarySeen = true;
       std::this_thread::sleep_for(10ms);
     }
     if (writer >= 0) {
@@ -241,7 +229,7 @@ TEST(FlowRun, InterruptedRunLeavesThePreviousOutput) {
     EXPECT_TRUE((WIFSIGNALED(status) && WTERMSIG(status) == number) ||
                 (WIFEXITED(status) && WEXITSTATUS(status) == 128 + number))
         << status;
-    EXPECT_EQ(listing(dir), before);
+    EXPECT_EQ(dir.names(), before);
     EXPECT_EQ(dir.read("out.txt"), "previous");
   }
 }

@@ -165,11 +165,6 @@ TEST(Trace, HandlerLines) {
        "doEndIf() called: m_ConditionalDepth=1\n"
        "doMapSignal() called: token=@MAPSIGNAL zz TO s@\n"
        "doSet() called: token=@SET sigdelim=;@\n"},
-      {"@EXPANDBUS@@ITERATE@%IPORT%<>@ENDITERATE@",
-       "eatIterate() Iterator=%IPORT%\n"
-       "eatIterate() eating szToken=<>\n"
-       "doIterate() Iterating for signal=d\n"
-       "doIterate() Iterating for signal=d\n"},
       {"@ITERATE@%module%", "eatIterate() Iterator=%module%\n"},
       {"@IFHAS PORT=zz@@IfTyped@@ENDIF@@ENDIF@",
        "doIf() called: token=@IFHAS PORT=zz@|Condition=1\n"

@@ -43,10 +43,6 @@ inline std::FILE* fileWith(std::string_view text) {
 
 using pinforge_test::readBack;
 
-inline void fillPorts(StbDataList& data, const std::vector<PortSpec>& ports) {
-  for (const PortSpec& p : ports) data.appendOwned(new PortRecord(p.name, p.left, p.right, p.dir));
-}
-
 /// Design data with the header values every run here uses (module "top", ext "vhd").
 inline StbDataList* newDesignData() {
   return new StbDataList("prj", "top", "out.vhd", "vhd", "pinforge", "", "title", "date");
@@ -79,7 +75,7 @@ inline Run runOn(std::string_view templateText, StbDataList& data, bool traced =
 inline Run runTemplate(std::string_view templateText, const std::vector<PortSpec>& ports,
                        bool traced = false) {
   const std::unique_ptr<StbDataList> data(newDesignData());
-  fillPorts(*data, ports);
+  for (const PortSpec& p : ports) data->appendOwned(new PortRecord(p.name, p.left, p.right, p.dir));
   return runOn(templateText, *data, traced);
 }
 

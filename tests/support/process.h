@@ -112,6 +112,12 @@ inline std::string binaryPath() {
   return path != nullptr ? path : "";
 }
 
+/// A copy of the program under test at `path`, so that a script shell is looked up beside it.
+inline bool placeProgram(const std::string& path) {
+  std::error_code error;
+  return std::filesystem::copy_file(binaryPath(), path, error) && !error;
+}
+
 /// Runs the pinforge binary under test with `args` in `workDir`.
 inline RunResult runPinforge(const std::vector<std::string>& args, const std::string& workDir,
                              const EnvChanges& env = {}) {

@@ -9,6 +9,7 @@
 #include <cstdio>
 #include <filesystem>
 #include <memory>
+#include <set>
 #include <string>
 #include <string_view>
 #include <system_error>
@@ -96,6 +97,14 @@ class ScratchDir {
   }
   /// The whole file, or "<missing>" when it cannot be read.
   std::string read(const std::string& name) const { return readFile(file(name)); }
+  /// The names in the directory, so a test sees every file a step left behind.
+  std::set<std::string> names() const {
+    std::set<std::string> found;
+    std::error_code error;
+    for (const auto& entry : std::filesystem::directory_iterator(m_Path, error))
+      found.insert(entry.path().filename().string());
+    return found;
+  }
 
  private:
   std::string m_Path;

@@ -8,7 +8,6 @@
 
 #include <csignal>
 #include <cstdlib>
-#include <filesystem>
 #include <set>
 #include <string>
 #include <vector>
@@ -76,14 +75,6 @@ TEST_F(FileTest, TemporaryFilesAreNewUniqueAndCarryTheSuffix) {
 
 using Placement = Host::OutputFile::Placement;
 
-/// The names in the scratch folder, so a test sees every file a step left behind.
-std::set<std::string> listing(const pinforge_test::ScratchDir& dir) {
-  std::set<std::string> names;
-  for (const auto& entry : std::filesystem::directory_iterator(dir.path()))
-    names.insert(entry.path().filename().string());
-  return names;
-}
-
 mode_t modeOf(const std::string& path) {
   struct stat status {};
   return ::stat(path.c_str(), &status) == 0 ? status.st_mode & 0777 : 0;
@@ -137,7 +128,7 @@ TEST_F(FileTest, ReplacedOutputAppearsOnlyWhenCommitted) {
       ASSERT_TRUE(m_Dir.write("out.txt", c.before));
       ASSERT_EQ(::chmod(target.c_str(), c.previousMode), 0);
     }
-    const std::set<std::string> before = listing(m_Dir);
+    const std::set<std::string> before = m_Dir.names();
     {
       Host::OutputFile file;
       std::string error;
@@ -155,7 +146,7 @@ TEST_F(FileTest, ReplacedOutputAppearsOnlyWhenCommitted) {
     EXPECT_EQ(modeOf(target), c.mode);
     std::set<std::string> expected = before;
     if (c.commit) expected.insert("out.txt");
-    EXPECT_EQ(listing(m_Dir), expected);
+    EXPECT_EQ(m_Dir.names(), expected);
   }
   ::umask(previousMask);
 }
@@ -245,7 +236,7 @@ TEST_F(FileTest, RemoveWrittenTakesOnlyTheFileThisRunWrote) {
 
 TEST_F(FileTest, AnInterruptRemovesTheUncommittedOutput) {
   ASSERT_TRUE(m_Dir.write("out.txt", "previous"));
-  const std::set<std::string> before = listing(m_Dir);
+  const std::set<std::string> before = m_Dir.names();
   for (int number : {SIGINT, SIGTERM, SIGHUP}) {
     SCOPED_TRACE(number);
     const pid_t child = ::fork();
@@ -266,7 +257,7 @@ TEST_F(FileTest, AnInterruptRemovesTheUncommittedOutput) {
     EXPECT_TRUE((WIFSIGNALED(status) && WTERMSIG(status) == number) ||
                 (WIFEXITED(status) && WEXITSTATUS(status) == 128 + number))
         << status;
-    EXPECT_EQ(listing(m_Dir), before);
+    EXPECT_EQ(m_Dir.names(), before);
     EXPECT_EQ(m_Dir.read("out.txt"), "previous");
   }
 }
