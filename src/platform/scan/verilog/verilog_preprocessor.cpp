@@ -216,7 +216,9 @@ void Preprocessor::conditional(const Token& token) {
     open.taken = open.active;
     open.source = token.source;
     open.offset = token.offset;
-    open.directive = name;
+    // Literals, not the token's text: a conditional opened inside macro text outlives that
+    // text, and its name is still needed to report it unterminated at the end of the file.
+    open.directive = name == "ifdef" ? std::string_view("ifdef") : std::string_view("ifndef");
     m_Conditionals.push_back(open);
   } else if (m_Conditionals.size() <= base) {
     if (name == "elsif") readName();
