@@ -8,14 +8,14 @@ add_compile_definitions(WIN32_LEAN_AND_MEAN NOMINMAX _WIN32_WINNT=0x0601)
 add_link_options(-static)
 target_link_options(pinforge PRIVATE -static)
 
-# The Windows entry point hands the UTF-16 command line on as UTF-8 and makes output binary;
-# the manifest makes the narrow names of the C library and the system UTF-8 as well, where
+# The manifest makes the narrow names of the C library and the system UTF-8 as well, where
 # Windows supports it (version 1903 on).
 set_property(TARGET pinforge PROPERTY SOURCES
-  ${CMAKE_SOURCE_DIR}/src/main-win32.cpp ${CMAKE_SOURCE_DIR}/src/platform/fopen-win32.cpp
+  ${CMAKE_SOURCE_DIR}/src/main.cpp ${CMAKE_SOURCE_DIR}/lib/hostkit/fopen-win32.cpp
   ${CMAKE_SOURCE_DIR}/tools/windows/pinforge.rc)
-target_link_libraries(pinforge PRIVATE shell32)
-# Every fopen of the program takes UTF-8 names (src/platform/fopen-win32.cpp).
+# The start-up code reads the UTF-16 command line (CommandLineToArgvW).
+target_link_libraries(pinforge_hostkit PUBLIC shell32)
+# Every fopen of the program takes UTF-8 names (lib/hostkit/fopen-win32.cpp).
 target_link_options(pinforge PRIVATE -Wl,--wrap=fopen)
 # A release executable carries no symbols: a third of the size.
 target_link_options(pinforge PRIVATE $<$<CONFIG:Release>:-s>)
@@ -52,10 +52,6 @@ add_compile_options(-include ${CMAKE_SOURCE_DIR}/tests/windows/posix_shim.h)
 # instead (tools/test-windows.sh), and tests/windows covers the Windows twins.
 set(PINFORGE_TEST_SKIP_IF "support/(process|diff_tools)\\.h|::mkfifo|::symlink|/bin/sh")
 
-# The Verilog reader builds the extractor's ports; the Linux tests happen to pull the extractor
-# in through other test files, the Windows set of tests does not.
-target_link_libraries(pinforge_scan_verilog PUBLIC pinforge_scan)
-
 # The stand-in script shell for the Tcl path under Wine: it checks and keeps the driver script.
 add_executable(runscr_standin ${CMAKE_SOURCE_DIR}/tests/windows/standin/runscr_standin.cpp)
 set_target_properties(runscr_standin PROPERTIES OUTPUT_NAME runscr
@@ -63,4 +59,3 @@ set_target_properties(runscr_standin PROPERTIES OUTPUT_NAME runscr
 
 # Tests of the Windows twins themselves.
 pinforge_test(test_windows tests/windows pinforge_hostkit pinforge_scan_common)
-target_link_libraries(test_windows PRIVATE shell32)

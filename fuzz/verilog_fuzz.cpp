@@ -6,8 +6,8 @@
 #include <cstdint>
 #include <string>
 
-#include "platform/scan/common/diagnostics.h"
-#include "platform/scan/verilog/verilog_reader.h"
+#include "scan/common/diagnostics.h"
+#include "scan/verilog/verilog_reader.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   std::string text(reinterpret_cast<const char*>(data), size);

@@ -18,8 +18,8 @@
 #include <vector>
 
 #include "platform/scan.h"
-#include "platform/scan/common/diagnostics.h"
-#include "platform/scan/language_reader.h"
+#include "scan/common/diagnostics.h"
+#include "scan/language_reader.h"
 
 namespace {
 

@@ -6,9 +6,9 @@
 #include <string>
 #include <vector>
 
-#include "platform/scan/common/diagnostics.h"
-#include "platform/scan/common/source_buffer.h"
-#include "platform/scan/vhdl/vhdl_reader.h"
+#include "scan/common/diagnostics.h"
+#include "scan/common/source_buffer.h"
+#include "scan/vhdl/vhdl_reader.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
   scan::Diagnostics diagnostics(nullptr);

@@ -1,4 +1,14 @@
 // Process entry of pinforge: one process performs one run.
-#include "front_end.h"
+#include <string>
+#include <vector>
 
-int main(int argc, char** argv) { return runFrontEnd(argc, argv); }
+#include "front_end.h"
+#include "platform/hostkit.h"
+
+int main(int argc, char** argv) {
+  std::vector<std::string> words = Host::Process::startup(argc, argv);
+  std::vector<char*> arguments;
+  for (std::string& word : words) arguments.push_back(word.data());
+  arguments.push_back(nullptr);
+  return runFrontEnd(static_cast<int>(words.size()), arguments.data());
+}

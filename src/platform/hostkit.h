@@ -1,6 +1,6 @@
 // The support library: command-line parsing driven by the usage text, strings, file names and
-// files, time formatting, child processes and a message manager. The program reaches the host
-// system only through this header.
+// files, time formatting, child processes and a message manager, implemented in lib/hostkit/.
+// The program reaches the host system only through this header.
 #pragma once
 
 #include <cstdint>
@@ -172,6 +172,12 @@ class ChildOutput {
 
 class Process {
  public:
+  /// The program's command line in UTF-8, whatever the host's own encoding. Call it once,
+  /// first thing in main: on Windows it reads the UTF-16 command line and makes standard
+  /// input, output and error binary, so output bytes are the template's bytes with no carriage
+  /// return added; elsewhere it returns `argv` as given.
+  static std::vector<std::string> startup(int argc, char** argv);
+
   /// The path of the program `name` (a bare file name): the one in the folder of this
   /// executable when there is one, else the first in a PATH folder. Empty and relative PATH
   /// entries are skipped, so nothing is ever taken from the current folder. Empty when none

@@ -1,6 +1,6 @@
 // Port extraction: reads VHDL or Verilog/SystemVerilog design files, finds one design unit
 // by name and reports its ports (name, type, direction, source line and bit range).
-// This is the only header the rest of the program includes from src/platform/scan/.
+// The program reaches the readers (lib/scan/) only through this header.
 #pragma once
 
 #include <cstdint>

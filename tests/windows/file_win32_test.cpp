@@ -8,7 +8,7 @@
 #include <string>
 
 #include "platform/hostkit.h"
-#include "platform/wide_text-win32.h"
+#include "hostkit/wide_text-win32.h"
 #include "windows/scratch_folder.h"
 
 namespace {

@@ -12,7 +12,7 @@
 #include <vector>
 
 #include "platform/hostkit.h"
-#include "platform/wide_text-win32.h"
+#include "hostkit/wide_text-win32.h"
 #include "windows/scratch_folder.h"
 
 namespace {

@@ -9,7 +9,7 @@
 #include <string_view>
 #include <system_error>
 
-#include "platform/wide_text-win32.h"
+#include "hostkit/wide_text-win32.h"
 
 namespace pinforge_test {
 

@@ -5,7 +5,7 @@
 
 #include <string>
 
-#include "platform/scan/common/source_buffer.h"
+#include "scan/common/source_buffer.h"
 #include "windows/scratch_folder.h"
 
 namespace {

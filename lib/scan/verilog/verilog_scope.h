@@ -1,0 +1,47 @@
+// The named things a constant expression can refer to: parameters, types and functions of a
+// unit, a package or the compilation-unit scope, with the packages each scope imports.
+#pragma once
+
+#include <memory>
+#include <optional>
+#include <string>
+#include <unordered_map>
+#include <unordered_set>
+#include <vector>
+
+#include "scan/common/value.h"
+#include "scan/verilog/verilog_expr.h"
+
+namespace scan::verilog {
+
+struct Parameter {
+  ExprPtr value;                      ///< null when the declaration gives no default
+  std::shared_ptr<TypeSpec> type;     ///< the declared type, when one is written
+  bool isType = false;                ///< a `parameter type`
+  std::shared_ptr<TypeSpec> typeValue;
+  std::vector<Dimension> unpacked;    ///< a parameter array's dimensions
+  // Evaluation state: the value once known, and a mark that catches circular definitions.
+  std::optional<Value> cached;
+  bool busy = false;
+};
+
+struct Scope {
+  std::string name;
+  bool isCompilationUnit = false;
+  std::unordered_map<std::string, Parameter> parameters;
+  std::unordered_map<std::string, std::shared_ptr<TypeSpec>> typedefs;
+  std::unordered_set<std::string> unpackedTypedefs;  ///< typedefs with unpacked dimensions
+  std::unordered_map<std::string, std::shared_ptr<Function>> functions;
+  std::vector<std::string> wildcardImports;               ///< import pkg::*
+  std::unordered_map<std::string, std::string> namedImports;  ///< name -> package
+};
+
+/// Finds package scopes (parsed on first use) and the compilation-unit scope.
+class ScopeProvider {
+ public:
+  virtual ~ScopeProvider() = default;
+  virtual Scope* package(const std::string& name) = 0;
+  virtual Scope* compilationUnit() = 0;
+};
+
+}  // namespace scan::verilog
