@@ -51,9 +51,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
       typedPort("wide", -1, -1, 'I', "std_logic_vector(N-1 downto 0)", PortTypeKind::BitVector);
   unknown->setRangeUnknown(std::string(300, 'r'));
   design.appendOwned(unknown);
-  design.m_Generics = {{"WIDTH", "natural", "8", "8"},
-                       {"N", "positive", "", ""},
-                       {"P", "", "4", "4"}};
+  design.m_Generics = {
+      {"WIDTH", "natural", "8", "8"}, {"N", "positive", "", ""}, {"P", "", "4", "4"}};
   design.m_Context = "library ieee;\n";
   {
     Forge forge(sink(), templateStream, sink(), &design);

@@ -20,7 +20,8 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size) {
     if (at == std::string::npos) break;
     at += 7;
     size_t end = at;
-    while (end < text.size() && (std::isalnum(static_cast<unsigned char>(text[end])) || text[end] == '_'))
+    while (end < text.size() &&
+           (std::isalnum(static_cast<unsigned char>(text[end])) || text[end] == '_'))
       ++end;
     if (reader.selectUnit("work", std::string_view(text).substr(at, end - at))) {
       scan::UnitDescription unit;

@@ -92,8 +92,8 @@ void reportLanguageHint(RunContext& context) {
 bool checkGenericOverrides(RunContext& context) {
   for (const std::string& name : context.m_Extractor.unknownOverrides())
     context.reportMessage(
-        unknownGenericMessage(context.m_ModuleName.view(), name,
-                              context.m_Extractor.getGenerics(), context.m_Verilog != 0),
+        unknownGenericMessage(context.m_ModuleName.view(), name, context.m_Extractor.getGenerics(),
+                              context.m_Verilog != 0),
         RunContext::Severity::Error);
   return !context.hasErrors();
 }
@@ -146,9 +146,8 @@ bool prepareRun(RunContext& context) {
   context.m_Date = Host::StringBase(currentDate());
 
   context.m_DesignData.reset(new (std::nothrow) StbDataList(
-      context.m_ProjectName.c_str(), context.m_ModuleName.c_str(),
-      context.m_OutputFileName.c_str(), context.m_OutputExt.c_str(), "pinforge", "",
-      title.c_str(), context.m_Date.c_str()));
+      context.m_ProjectName.c_str(), context.m_ModuleName.c_str(), context.m_OutputFileName.c_str(),
+      context.m_OutputExt.c_str(), "pinforge", "", title.c_str(), context.m_Date.c_str()));
   if (!context.m_DesignData)
     context.reportMessage("FATAL: Unable to allocate enough memory for Forge.\n",
                           RunContext::Severity::Error);

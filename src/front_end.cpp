@@ -46,8 +46,9 @@ void selectLanguage(RunContext& context, const UT_CMDARGS& parser) {
   if (value.Compare("vhdl", 1) == 0) return;
   std::string text = "WARNING: -lang ";
   text += language;
-  text += " is not a language pinforge reads (vhdl, verilog, systemverilog, sv); the design "
-          "files are read as VHDL.";
+  text +=
+      " is not a language pinforge reads (vhdl, verilog, systemverilog, sv); the design "
+      "files are read as VHDL.";
   context.reportMessage(text, RunContext::Severity::Warning);
 }
 
@@ -392,9 +393,8 @@ int runFrontEnd(int argc, char** argv) {
     std::string why;
     messageStream = context.openErrorFile(name, why);
     if (messageStream == nullptr) {
-      const std::string line =
-          "FATAL ERROR: Unable to open log file " + std::string(name) + " in write mode: " + why +
-          "\n";
+      const std::string line = "FATAL ERROR: Unable to open log file " + std::string(name) +
+                               " in write mode: " + why + "\n";
       std::fwrite(line.data(), 1, line.size(), stdout);
       return 1;
     }

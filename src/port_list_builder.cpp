@@ -165,9 +165,8 @@ bool buildPortList(RunContext& context) {
     }
     // A range the reader could not evaluate has no bounds; the record carries its problem.
     if (port->rangeUnknown()) context.m_CurrentLeft = context.m_CurrentRight = -1;
-    auto record = std::make_unique<PortRecord>(context.m_CurrentPortName.view(),
-                                               context.m_CurrentLeft, context.m_CurrentRight,
-                                               letter);
+    auto record = std::make_unique<PortRecord>(
+        context.m_CurrentPortName.view(), context.m_CurrentLeft, context.m_CurrentRight, letter);
     record->m_DeclaredType = port->declaredType();
     record->m_Kind = kindOf(*port);
     record->m_Mode = modeOf(port->direction());

@@ -91,8 +91,8 @@ Expansion expandResponseFile(std::FILE* messageStream, int argc, char** argv,
     size_t line = 0;
     if (!splitter.read(file.get(), line)) {
       std::fprintf(messageStream,
-                   "FATAL ERROR: Response file %s, line %zu: a word is longer than %zu MB.\n",
-                   name, line, ArgumentVector::kMaxWordBytes >> 20);
+                   "FATAL ERROR: Response file %s, line %zu: a word is longer than %zu MB.\n", name,
+                   line, ArgumentVector::kMaxWordBytes >> 20);
       return Expansion::Refused;
     }
     given = splitter.total();

@@ -49,7 +49,7 @@ bool isIdentifierChar(char c) {
 /// empty when there is none or the file cannot be read.
 std::string declaredEntity(const std::string& path) {
   std::unique_ptr<std::FILE, int (*)(std::FILE*)> file(std::fopen(path.c_str(), "rb"),
-                                                      &std::fclose);
+                                                       &std::fclose);
   if (!file) return std::string();
   std::string text(64 * 1024, '\0');
   text.resize(std::fread(text.data(), 1, text.size(), file.get()));

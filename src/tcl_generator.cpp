@@ -227,9 +227,10 @@ bool RunContext::runTclGenerator() {
     // The script stays for inspection.
     Host::Interrupt::forget(scriptName);
     if (shell.empty())
-      reportMessage("ERROR: ProjectMgmt(pinforge) - The script shell runscr is neither beside "
-                    "pinforge nor in a folder on PATH",
-                    Severity::Error);
+      reportMessage(
+          "ERROR: ProjectMgmt(pinforge) - The script shell runscr is neither beside "
+          "pinforge nor in a folder on PATH",
+          Severity::Error);
     if (receiver.dropped() != 0)
       std::fprintf(stderr, "[... %zu earlier bytes of the script's output not shown ...]\n",
                    receiver.dropped());

@@ -43,8 +43,7 @@ std::vector<std::string> templateFolders() {
     std::string_view rest = path;
     while (true) {
       const size_t separator = rest.find(kPathSeparator);
-      if (separator != 0 && !rest.empty())
-        folders.emplace_back(rest.substr(0, separator));
+      if (separator != 0 && !rest.empty()) folders.emplace_back(rest.substr(0, separator));
       if (separator == std::string_view::npos) break;
       rest.remove_prefix(separator + 1);
     }

@@ -30,8 +30,7 @@ const std::string kFailed = "forge(vhdl) completed with errors.\n";
 /// source tree, since the binary under test runs from its build folder.
 std::string templateNames(std::set<std::string> names = {}) {
   std::error_code error;
-  for (const auto& entry :
-       std::filesystem::directory_iterator(sourceDir() + "/templates", error)) {
+  for (const auto& entry : std::filesystem::directory_iterator(sourceDir() + "/templates", error)) {
     std::string name = entry.path().filename().string();
     if (!entry.is_regular_file(error) || name.starts_with(".")) continue;
     for (const std::string suffix : {".tmpl", ".tcl"})
@@ -44,7 +43,8 @@ std::string templateNames(std::set<std::string> names = {}) {
 }
 const std::string kMissingTemplate =
     "FATAL ERROR: Unable to open template file missing.tpl: No such file or directory\n"
-    "pinforge: no template is named missing.tpl; the templates are: " + templateNames() + ".\n";
+    "pinforge: no template is named missing.tpl; the templates are: " +
+    templateNames() + ".\n";
 const std::string kMissingOutput =
     "FATAL ERROR: Unable to open output file no/dir/out.txt: No such file or directory\n";
 const std::string kMissingRsp = "FATAL ERROR: Unable to open response file missing.rsp...\n";
@@ -78,7 +78,8 @@ std::string dump(const std::string& module, const std::string& project, const st
                  const std::string& input) {
   return "FpErr         Not Open\nFpStb         Open\nFpTemplate    Open\n"
          "FpInput       Not Open\nFpDebug       Not Open\n"
-         "Module        " + module + "\nProject       " + project +
+         "Module        " +
+         module + "\nProject       " + project +
          "\nOutput Ext    txt\nOutput File   out.txt\nLibrary       " + library +
          "\nInput File    " + input +
          "\nTemplate File tpl.txt\nError File    __UNDEFINED__\nDate          \n";
@@ -90,15 +91,15 @@ struct Row {
   std::string out;
   std::string err;
   int status;
-  std::vector<std::pair<std::string, std::string>> files = {};  ///< name -> content or kMissing
-  std::optional<std::string> rsp = {};                          ///< written to run.rsp
+  std::vector<std::pair<std::string, std::string>> files = {};   ///< name -> content or kMissing
+  std::optional<std::string> rsp = {};                           ///< written to run.rsp
   std::vector<std::pair<std::string, std::string>> before = {};  ///< written before the run
 };
 
 /// A run of the unit "top", which the design holds, writing to `output`.
 Args topRun(const std::string& output) {
-  return {"-lib", "work", "top.vhd", "-module", "top", "-prj", "demo", "-template", "tpl.txt",
-          "-o", output};
+  return {"-lib", "work",      "top.vhd", "-module", "top", "-prj",
+          "demo", "-template", "tpl.txt", "-o",      output};
 }
 
 /// The project version the build gives the program: the VERSION of CMakeLists.txt's project().
@@ -135,32 +136,74 @@ std::vector<Row> rows() {
       {"no arguments", {}, "", kUsage, 0},
       {"unreadable response file", {"@missing.rsp", "-lib", "work"}, "", kMissingRsp + kUsage, 1},
       {"error file opens after the response file",
-       {"@missing.rsp", "-err", "run.log"}, "", kMissingRsp + kUsage, 1, {{"run.log", kMissing}}},
+       {"@missing.rsp", "-err", "run.log"},
+       "",
+       kMissingRsp + kUsage,
+       1,
+       {{"run.log", kMissing}}},
       {"unknown switch", {"-bogus"}, "", "pinforge: unknown switch -bogus\n" + kUsage, 1},
       {"help alone", {"-h"}, kUsage, "", 0},
-      {"help after a complete line", plus(kComplete, {"-help"}), kUsage, "", 0,
+      {"help after a complete line",
+       plus(kComplete, {"-help"}),
+       kUsage,
+       "",
+       0,
        {{"out.txt", kMissing}}},
-      {"unwritable error file", plus(kComplete, {"-err", "no/such/dir/run.log"}),
+      {"unwritable error file",
+       plus(kComplete, {"-err", "no/such/dir/run.log"}),
        "FATAL ERROR: Unable to open log file no/such/dir/run.log in write mode: No such file or "
        "directory\n",
-       "", 1,
+       "",
+       1,
        {{"out.txt", kMissing}}},
       // The first occurrence of a switch wins, so these come before the complete line.
-      {"missing template keeps the previous output", plus({"-template", "missing.tpl"}, kComplete),
-       kFailed, kMissingTemplate + kUsage, 1, {{"out.txt", "previous"}}, {},
+      {"missing template keeps the previous output",
+       plus({"-template", "missing.tpl"}, kComplete),
+       kFailed,
+       kMissingTemplate + kUsage,
+       1,
+       {{"out.txt", "previous"}},
+       {},
        {{"out.txt", "previous"}}},
       {"missing template, delete on error, keeps the previous output",
-       plus({"-template", "missing.tpl", "-deleteonerror"}, kComplete), kFailed,
-       kMissingTemplate + kUsage, 1, {{"out.txt", "previous"}}, {}, {{"out.txt", "previous"}}},
-      {"missing -prj keeps the previous output", without(kComplete, "-prj", 1), kFailed,
-       missing({kNoPrj}), 1, {{"out.txt", "previous"}}, {}, {{"out.txt", "previous"}}},
-      {"a failed flow leaves its partial output", kComplete, notFound, "", 1, {{"out.txt", ""}},
-       {}, {{"out.txt", "previous"}}},
-      {"a failed flow with delete on error leaves the previous output",
-       plus(kComplete, {"-deleteonerror"}), notFound, "", 1, {{"out.txt", "previous"}}, {},
+       plus({"-template", "missing.tpl", "-deleteonerror"}, kComplete),
+       kFailed,
+       kMissingTemplate + kUsage,
+       1,
+       {{"out.txt", "previous"}},
+       {},
        {{"out.txt", "previous"}}},
-      {"successful run replaces the previous output", topRun("out.txt"),
-       "forge(vhdl) completed successfully.\n", "", 0, {{"out.txt", "top\n"}}, {},
+      {"missing -prj keeps the previous output",
+       without(kComplete, "-prj", 1),
+       kFailed,
+       missing({kNoPrj}),
+       1,
+       {{"out.txt", "previous"}},
+       {},
+       {{"out.txt", "previous"}}},
+      {"a failed flow leaves its partial output",
+       kComplete,
+       notFound,
+       "",
+       1,
+       {{"out.txt", ""}},
+       {},
+       {{"out.txt", "previous"}}},
+      {"a failed flow with delete on error leaves the previous output",
+       plus(kComplete, {"-deleteonerror"}),
+       notFound,
+       "",
+       1,
+       {{"out.txt", "previous"}},
+       {},
+       {{"out.txt", "previous"}}},
+      {"successful run replaces the previous output",
+       topRun("out.txt"),
+       "forge(vhdl) completed successfully.\n",
+       "",
+       0,
+       {{"out.txt", "top\n"}},
+       {},
        {{"out.txt", "previous"}}},
       {"device output", plus(topRun("/dev/null"), {"-deleteonerror"}),
        "forge(vhdl) completed successfully.\n", "", 0},
@@ -168,67 +211,117 @@ std::vector<Row> rows() {
        "pinforge:Unable to write output file /dev/full: No space left on device\n" + kFailed, "",
        1},
       {"full error file", plus({"-err", "/dev/full", "-template", "missing.tpl"}, kComplete),
-       "pinforge:Unable to write error file /dev/full: No space left on device\n" + kFailed, "",
-       1},
-      {"missing design file beside the unit's", plus(topRun("out.txt"), {"-lib", "work", "gone.vhd"}),
+       "pinforge:Unable to write error file /dev/full: No space left on device\n" + kFailed, "", 1},
+      {"missing design file beside the unit's",
+       plus(topRun("out.txt"), {"-lib", "work", "gone.vhd"}),
        "pinforge:Unable to read design file gone.vhd; see the messages above.\n" + kFailed,
-       "gone.vhd: error: No such file or directory\n", 1, {{"out.txt", ""}}},
+       "gone.vhd: error: No such file or directory\n",
+       1,
+       {{"out.txt", ""}}},
       {"directory as a design file", plus(topRun("out.txt"), {"-lib", "work", "/"}),
        "pinforge:Unable to read design file /; see the messages above.\n" + kFailed,
        "/: error: is a directory\n", 1},
-      {"error file is a design file", plus(kComplete, {"-err", "other.vhd"}), "",
-       sameFile("error file other.vhd is the same file as the design file other.vhd"), 1,
+      {"error file is a design file",
+       plus(kComplete, {"-err", "other.vhd"}),
+       "",
+       sameFile("error file other.vhd is the same file as the design file other.vhd"),
+       1,
        {{"other.vhd", kOther}, {"out.txt", kMissing}}},
-      {"error file is the output", plus(kComplete, {"-err", "./out.txt"}), "",
-       sameFile("error file ./out.txt is the same file as the output file out.txt"), 1,
+      {"error file is the output",
+       plus(kComplete, {"-err", "./out.txt"}),
+       "",
+       sameFile("error file ./out.txt is the same file as the output file out.txt"),
+       1,
        {{"out.txt", kMissing}}},
       {"one device for output and errors", plus(topRun("/dev/null"), {"-err", "/dev/null"}),
        "forge(vhdl) completed successfully.\n", "", 0},
       {"debug lines name the direction",
-       {"-lang", "verilog", "-lib", "work", "top.v", "-module", "top", "-prj", "demo",
-        "-template", "tpl.txt", "-o", "out.txt", "--a"},
-       "a: input ;\nforge(verilog) completed successfully.\n", "", 0},
-      {"template is a directory", plus({"-template", "/"}, kComplete), kFailed,
-       "FATAL ERROR: Unable to open template file /: Is a directory\n" + kUsage, 1,
+       {"-lang", "verilog", "-lib", "work", "top.v", "-module", "top", "-prj", "demo", "-template",
+        "tpl.txt", "-o", "out.txt", "--a"},
+       "a: input ;\nforge(verilog) completed successfully.\n",
+       "",
+       0},
+      {"template is a directory",
+       plus({"-template", "/"}, kComplete),
+       kFailed,
+       "FATAL ERROR: Unable to open template file /: Is a directory\n" + kUsage,
+       1,
        {{"out.txt", kMissing}}},
       {"unopenable output", plus({"-o", "no/dir/out.txt"}, kComplete), kFailed,
        kMissingOutput + kUsage, 1},
       {"template and output both unopenable",
-       plus({"-o", "no/dir/out.txt", "-template", "missing.tpl"}, kComplete), kFailed,
-       kMissingTemplate + kMissingOutput + kUsage, 1, {{"out.txt", kMissing}}},
+       plus({"-o", "no/dir/out.txt", "-template", "missing.tpl"}, kComplete),
+       kFailed,
+       kMissingTemplate + kMissingOutput + kUsage,
+       1,
+       {{"out.txt", kMissing}}},
       {"error file takes usage and fatal lines",
-       plus({"-err", "run.log", "-template", "missing.tpl"}, kComplete), kFailed, "", 1,
+       plus({"-err", "run.log", "-template", "missing.tpl"}, kComplete),
+       kFailed,
+       "",
+       1,
        {{"run.log", kMissingTemplate + kUsage}}},
-      {"error file takes no reports", plus({"-err", "run.log"}, kComplete), notFound, "", 1,
+      {"error file takes no reports",
+       plus({"-err", "run.log"}, kComplete),
+       notFound,
+       "",
+       1,
        {{"run.log", ""}}},
       {"unit not found", kComplete, notFound, "", 1, {{"out.txt", ""}, {"forge.deb", kMissing}}},
-      {"delete on error", plus(kComplete, {"-deleteonerror"}), notFound, "", 1,
+      {"delete on error",
+       plus(kComplete, {"-deleteonerror"}),
+       notFound,
+       "",
+       1,
        {{"out.txt", kMissing}}},
-      {"delete on error without output", plus(without(kComplete, "-o", 1), {"-deleteonerror"}),
-       kFailed, missing({kNoOutput}), 1, {{"tpl.txt", "%module%\n"}, {"other.vhd", kOther}}},
+      {"delete on error without output",
+       plus(without(kComplete, "-o", 1), {"-deleteonerror"}),
+       kFailed,
+       missing({kNoOutput}),
+       1,
+       {{"tpl.txt", "%module%\n"}, {"other.vhd", kOther}}},
       {"library without files", plus({"-lib", "work"}, without(kComplete, "-lib", 2)), kFailed,
        missing({kNoLib}), 1},
       {"module named like the undefined marker",
        plus({"-module", "__UNDEFINED__"}, without(kComplete, "-module", 1)), kFailed, kUsage, 1},
       {"debug dump for a missing input", plus(without(kComplete, "-prj", 1), {"--a"}),
        dump("top", "__UNDEFINED__", "work", "other.vhd") + kFailed, missing({kNoPrj}), 1},
-      {"debug mode with complete inputs prints no dump", plus(kComplete, {"--a"}), notFound, "",
-       1},
-      {"ignored switches", plus(kComplete, {"--inc", "-nodelist", "-inc", "--nodelist"}),
-       notFound, "", 1},
-      {"first occurrence wins", plus(kComplete, {"-module", "other", "-prj", "x", "-o", "2.txt"}),
-       notFound, "", 1, {{"out.txt", ""}, {"2.txt", kMissing}}},
-      {"response file, words after it ignored", {"@run.rsp", "-module", "other", "-deleteonerror"},
-       notFound, "", 1, {{"out.txt", ""}},
+      {"debug mode with complete inputs prints no dump", plus(kComplete, {"--a"}), notFound, "", 1},
+      {"ignored switches", plus(kComplete, {"--inc", "-nodelist", "-inc", "--nodelist"}), notFound,
+       "", 1},
+      {"first occurrence wins",
+       plus(kComplete, {"-module", "other", "-prj", "x", "-o", "2.txt"}),
+       notFound,
+       "",
+       1,
+       {{"out.txt", ""}, {"2.txt", kMissing}}},
+      {"response file, words after it ignored",
+       {"@run.rsp", "-module", "other", "-deleteonerror"},
+       notFound,
+       "",
+       1,
+       {{"out.txt", ""}},
        "-lib\twork\r\nother.vhd \t\n-module top -prj demo -template tpl.txt -o out.txt"},
-      {"empty response file", {"@run.rsp"}, kFailed,
-       missing({kNoLib, kNoModule, kNoPrj, kNoTemplate, kNoOutput}), 1, {}, ""},
-      {"response file words are literal", {"@run.rsp"},
-       "pinforge:Declaration (Module @top) not found.\n" + kOtherHint + kFailed, "", 1, {},
+      {"empty response file",
+       {"@run.rsp"},
+       kFailed,
+       missing({kNoLib, kNoModule, kNoPrj, kNoTemplate, kNoOutput}),
+       1,
+       {},
+       ""},
+      {"response file words are literal",
+       {"@run.rsp"},
+       "pinforge:Declaration (Module @top) not found.\n" + kOtherHint + kFailed,
+       "",
+       1,
+       {},
        "-lib work other.vhd -module @top -prj demo -template tpl.txt -o out.txt\n"},
-      {"verilog design", {"-lang", "verilog", "-lib", "work", "other.v", "-module", "top", "-prj",
-                          "demo", "-template", "tpl.txt", "-o", "out.txt"},
-       kNotFound + kOtherHint + "forge(verilog) completed with errors.\n", "", 1},
+      {"verilog design",
+       {"-lang", "verilog", "-lib", "work", "other.v", "-module", "top", "-prj", "demo",
+        "-template", "tpl.txt", "-o", "out.txt"},
+       kNotFound + kOtherHint + "forge(verilog) completed with errors.\n",
+       "",
+       1},
   };
   const auto unknownLanguage = [](const std::string& value) {
     return "pinforge:WARNING: -lang " + value +
@@ -244,41 +337,67 @@ std::vector<Row> rows() {
       {"mixed extensions without -lang are read as VHDL",
        plus({"-lib", "work", "top.vhd", "other.v"}, topRest), vhdlDone, "", 0},
       {".v read as VHDL", plus({"-lang", "vhdl", "-lib", "work", "top.v"}, topRest),
-       notFoundHinted + "top.v looks like Verilog; read it with -lang verilog.\n" + kFailed, "",
-       1},
+       notFoundHinted + "top.v looks like Verilog; read it with -lang verilog.\n" + kFailed, "", 1},
       {"entity read as Verilog", plus({"-lang", "sv", "-lib", "work", "top.hdl"}, topRest),
        notFoundHinted +
            "top.hdl looks like VHDL (it declares entity top); read it with -lang vhdl.\n" +
            verilogFailed,
        "", 1},
-      {"unknown -lang is read as VHDL", plus(topRun("out.txt"), {"-lang", "systemc"}),
-       unknownLanguage("systemc") + vhdlDone, "", 0, {{"out.txt", "top\n"}}},
+      {"unknown -lang is read as VHDL",
+       plus(topRun("out.txt"), {"-lang", "systemc"}),
+       unknownLanguage("systemc") + vhdlDone,
+       "",
+       0,
+       {{"out.txt", "top\n"}}},
       {"-g without a value or name",
        plus(topRun("out.txt"), {"-g", "WIDTH", "-g", "DEPTH=", "-g", "=8"}),
        "pinforge:-g WIDTH: a generic is set as NAME=VALUE, for example -g WIDTH=8.\n"
        "pinforge:-g DEPTH=: a generic is set as NAME=VALUE, for example -g WIDTH=8.\n"
        "pinforge:-g =8: a generic is set as NAME=VALUE, for example -g WIDTH=8.\n" +
            kFailed,
-       "", 1, {{"out.txt", kMissing}}},
-      {"-D without a name", plus(topRun("out.txt"), {"-D", "=1"}),
+       "",
+       1,
+       {{"out.txt", kMissing}}},
+      {"-D without a name",
+       plus(topRun("out.txt"), {"-D", "=1"}),
        "pinforge:-D =1: a macro is defined as NAME or NAME=TEXT, for example -D SYNTHESIS.\n" +
            kFailed,
-       "", 1, {{"out.txt", kMissing}}},
-      {"-g for a unit without generics", plus(topRun("out.txt"), {"-g", "WIDTH=8"}),
-       "pinforge:-g WIDTH: top has no generics.\n" + kFailed, "", 1, {{"out.txt", ""}}},
+       "",
+       1,
+       {{"out.txt", kMissing}}},
+      {"-g for a unit without generics",
+       plus(topRun("out.txt"), {"-g", "WIDTH=8"}),
+       "pinforge:-g WIDTH: top has no generics.\n" + kFailed,
+       "",
+       1,
+       {{"out.txt", ""}}},
       {"-g for a module without parameters",
        plus({"-lib", "work", "top.v", "-g", "W=1", "-g", "X=2"}, topRest),
        "pinforge:-g W: top has no parameters.\npinforge:-g X: top has no parameters.\n" +
            verilogFailed,
        "", 1},
-      {"-D and -I", plus({"-lib", "work", "top.v", "-D", "SYNTH", "-D", "W=8", "-I", "inc"}, topRest),
-       verilogDone, "", 0, {{"out.txt", "top\n"}}},
-      {"--list without design files", {"--list", "-module", "top"}, "",
-       "pinforge: missing " + kNoLib + "\n" + kUsage, 1},
-      {"--list of a missing file", {"--list", "-lib", "work", "gone.vhd", "-o", "out.txt"}, "",
-       "gone.vhd: error: No such file or directory\n", 1, {{"out.txt", kMissing}}},
-      {"--version wins over everything else", {"-bogus", "--version", "--help"},
-       "pinforge " + projectVersion() + "\n", "", 0},
+      {"-D and -I",
+       plus({"-lib", "work", "top.v", "-D", "SYNTH", "-D", "W=8", "-I", "inc"}, topRest),
+       verilogDone,
+       "",
+       0,
+       {{"out.txt", "top\n"}}},
+      {"--list without design files",
+       {"--list", "-module", "top"},
+       "",
+       "pinforge: missing " + kNoLib + "\n" + kUsage,
+       1},
+      {"--list of a missing file",
+       {"--list", "-lib", "work", "gone.vhd", "-o", "out.txt"},
+       "",
+       "gone.vhd: error: No such file or directory\n",
+       1,
+       {{"out.txt", kMissing}}},
+      {"--version wins over everything else",
+       {"-bogus", "--version", "--help"},
+       "pinforge " + projectVersion() + "\n",
+       "",
+       0},
   };
   rows.insert(rows.end(), newSwitches.begin(), newSwitches.end());
   for (const auto& [name, declared] :
@@ -287,8 +406,12 @@ std::vector<Row> rows() {
                                                         {"-template", kNoTemplate},
                                                         {"-o", kNoOutput},
                                                         {"-lib", kNoLib}})
-    rows.push_back({"without " + name, without(kComplete, name, name == "-lib" ? 2 : 1), kFailed,
-                    missing({declared}), 1, {{"forge.deb", kMissing}}});
+    rows.push_back({"without " + name,
+                    without(kComplete, name, name == "-lib" ? 2 : 1),
+                    kFailed,
+                    missing({declared}),
+                    1,
+                    {{"forge.deb", kMissing}}});
   // verilog, systemverilog and sv in any case select Verilog, vhdl VHDL; anything else is
   // read as VHDL with a warning. The first -lang wins.
   for (const auto& [lang, name, warning] : std::vector<std::tuple<Args, std::string, std::string>>{
@@ -304,15 +427,20 @@ std::vector<Row> rows() {
   // Without -module the run stops before any design file is read, so the files need not exist.
   // 2 + 995 words are the most a run takes; one more is refused.
   const std::string allButLib = missing({kNoModule, kNoPrj, kNoTemplate, kNoOutput});
-  for (const auto& [files, out, err] : {std::tuple{995u, kFailed, allButLib},
-                                        std::tuple{996u, std::string(), kTooMany + kUsage}}) {
+  for (const auto& [files, out, err] :
+       {std::tuple{995u, kFailed, allButLib}, std::tuple{996u, std::string(), kTooMany + kUsage}}) {
     Args args = {"-lib", "work"};
     args.resize(2 + files, "f.vhd");
     std::string words;
     for (const std::string& arg : args) words += arg + "\n";
     rows.push_back({std::to_string(files) + " files", args, out, err, 1});
-    rows.push_back({std::to_string(files) + " files in a response file", {"@run.rsp"}, out, err,
-                    1, {}, words});
+    rows.push_back({std::to_string(files) + " files in a response file",
+                    {"@run.rsp"},
+                    out,
+                    err,
+                    1,
+                    {},
+                    words});
   }
   return rows;
 }
@@ -416,18 +544,17 @@ TEST(CommandLine, TemplatesAreFoundByName) {
     if (c.output.empty() && findOnPath("tclsh").empty()) continue;
     std::error_code error;
     std::filesystem::remove(dir.file("out.txt"), error);
-    const Args args = {"-lib", "work", "top.vhd", "-module", "top", "-prj", "demo", "-template",
-                       c.templateName, "-o", "out.txt"};
+    const Args args = {"-lib", "work",      "top.vhd",      "-module", "top",    "-prj",
+                       "demo", "-template", c.templateName, "-o",      "out.txt"};
     const RunResult run = runPinforge(args, dir.path(), {{"PINFORGE_TEMPLATE_PATH", path}});
     ASSERT_TRUE(run.started);
     EXPECT_EQ(run.status, c.status);
     EXPECT_EQ(run.err, c.err);
     std::string expected = c.output;
     if (expected.empty()) {
-      const RunResult direct = runPinforge(
-          {"-lib", "work", "top.vhd", "-module", "top", "-prj", "demo", "-template", bundled, "-o",
-           "direct.txt"},
-          dir.path());
+      const RunResult direct = runPinforge({"-lib", "work", "top.vhd", "-module", "top", "-prj",
+                                            "demo", "-template", bundled, "-o", "direct.txt"},
+                                           dir.path());
       ASSERT_EQ(direct.status, 0) << direct.out << direct.err;
       expected = dir.read("direct.txt");
       ASSERT_NE(expected.find("Port table of top"), std::string::npos) << expected;
@@ -439,7 +566,8 @@ TEST(CommandLine, TemplatesAreFoundByName) {
 TEST(CommandLine, ListingAndClosestNames) {
   if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
   ScratchDir dir;
-  ASSERT_TRUE(dir.write("a.vhd", "entity alu is\nend entity alu;\n\npackage pkg is\nend package pkg;\n"));
+  ASSERT_TRUE(
+      dir.write("a.vhd", "entity alu is\nend entity alu;\n\npackage pkg is\nend package pkg;\n"));
   ASSERT_TRUE(dir.write("b.vhd", "entity top_tb is\nend entity top_tb;\n"));
   ASSERT_TRUE(dir.write("tpl.txt", "%module%\n"));
   const RunResult listing =
@@ -450,12 +578,13 @@ TEST(CommandLine, ListingAndClosestNames) {
   EXPECT_EQ(listing.out,
             "work entity alu a.vhd:1\nwork package pkg a.vhd:4\nlib2 entity top_tb b.vhd:1\n");
 
-  const RunResult run = runPinforge({"-lib", "work", "a.vhd", "-lib", "lib2", "b.vhd", "-module",
-                                     "top", "-prj", "demo", "-template", "tpl.txt", "-o", "out.txt"},
-                                    dir.path());
-  EXPECT_EQ(run.out, kNotFound +
-                         "pinforge:3 design units were read; the closest names are: alu, top_tb.\n" +
-                         kFailed);
+  const RunResult run =
+      runPinforge({"-lib", "work", "a.vhd", "-lib", "lib2", "b.vhd", "-module", "top", "-prj",
+                   "demo", "-template", "tpl.txt", "-o", "out.txt"},
+                  dir.path());
+  EXPECT_EQ(run.out,
+            kNotFound + "pinforge:3 design units were read; the closest names are: alu, top_tb.\n" +
+                kFailed);
   EXPECT_EQ(run.err, "");
   EXPECT_EQ(run.status, 1);
 }
@@ -467,14 +596,14 @@ TEST(CommandLine, UnknownGenericListsTheUnitsGenerics) {
                         "entity top is\n  generic (WIDTH : natural := 8; DEPTH : integer);\n"
                         "  port (d : in bit_vector(WIDTH-1 downto 0));\nend entity top;\n"));
   ASSERT_TRUE(dir.write("tpl.txt", "%module%\n"));
-  const Args args = {"-lib", "work", "g.vhd", "-module", "top", "-prj", "demo", "-template",
-                     "tpl.txt", "-o", "out.txt", "-g", "depth=4"};
+  const Args args = {"-lib",      "work",    "g.vhd", "-module", "top", "-prj",   "demo",
+                     "-template", "tpl.txt", "-o",    "out.txt", "-g",  "depth=4"};
   const RunResult known = runPinforge(args, dir.path());
   EXPECT_EQ(known.out, "forge(vhdl) completed successfully.\n");
   const RunResult unknown = runPinforge(plus(args, {"-g", "WIDTHX=3"}), dir.path());
-  EXPECT_EQ(unknown.out,
-            "pinforge:-g WIDTHX: top has no generic WIDTHX; its generics are WIDTH, DEPTH.\n" +
-                kFailed);
+  EXPECT_EQ(
+      unknown.out,
+      "pinforge:-g WIDTHX: top has no generic WIDTHX; its generics are WIDTH, DEPTH.\n" + kFailed);
   EXPECT_EQ(unknown.status, 1);
 }
 

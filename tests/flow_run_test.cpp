@@ -33,8 +33,8 @@ constexpr const char* kDesign =
     "end entity top;\n";
 
 std::vector<std::string> argsFor(const std::string& module, const std::string& templateName) {
-  return {"-lib", "work", "design.vhd", "-module", module,   "-prj",
-          "demo", "-template", templateName, "-o", "out.txt"};
+  return {"-lib", "work",      "design.vhd", "-module", module,   "-prj",
+          "demo", "-template", templateName, "-o",      "out.txt"};
 }
 
 TEST(FlowRun, TraceFileOnlyWhenDebuggingAFoundUnit) {

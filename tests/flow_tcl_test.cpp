@@ -1,15 +1,15 @@
 // The Tcl path seen from outside: a copy of the program runs beside a stand-in runscr that
 // captures the driver script, so the whole script, the messages, the fate of the temporary
 // file, where runscr comes from and what happens on a signal can be checked.
-#include <gtest/gtest.h>
 #include <fcntl.h>
+#include <gtest/gtest.h>
 #include <signal.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
 #include <chrono>
-#include <cstring>
 #include <cstdlib>
+#include <cstring>
 #include <filesystem>
 #include <ostream>
 #include <string>
@@ -89,9 +89,13 @@ std::string expectedHead(const TclCase& c) {
   return "# This file drives input variables to the tcl template file\n"
          "#   given below in the \"source\" command.\n"
          "set ModuleName \"top\"\n"
-         "set ProjectName \"" + c.projectLine + "\"\n"
+         "set ProjectName \"" +
+         c.projectLine +
+         "\"\n"
          "set ProjectFile \"\"\n"
-         "set ProjectName \"" + c.projectLine + "\"\n"
+         "set ProjectName \"" +
+         c.projectLine +
+         "\"\n"
          "set OutputFileName \"out.txt\"\n"
          "set InputFileName \"design.vhd\"\n"
          "set TemplateFileName \"t.tcl\"\n"
@@ -105,15 +109,20 @@ std::string expectedHead(const TclCase& c) {
 /// The lines between the port count and the template, line by line as their names: their
 /// values come from the readers and are checked with design data of the test's own making.
 bool hasDesignDetails(const std::string& details) {
-  const char* kLines[] = {"", "# Generic Definitions", "set GenericName [ list ",
-                          "set GenericType [ list ", "set GenericDefault [ list ",
-                          "set GenericValue [ list ", "set TotalGenerics ", "",
-                          "# Declared Types and Context", "set PortType [ list "};
+  const char* kLines[] = {"",
+                          "# Generic Definitions",
+                          "set GenericName [ list ",
+                          "set GenericType [ list ",
+                          "set GenericDefault [ list ",
+                          "set GenericValue [ list ",
+                          "set TotalGenerics ",
+                          "",
+                          "# Declared Types and Context",
+                          "set PortType [ list "};
   size_t at = 0;
   for (const char* line : kLines) {
     const size_t end = details.find('\n', at);
-    if (end == std::string::npos || details.compare(at, std::strlen(line), line) != 0)
-      return false;
+    if (end == std::string::npos || details.compare(at, std::strlen(line), line) != 0) return false;
     at = end + 1;
   }
   // The context is one quoted value that may span lines.
@@ -138,10 +147,9 @@ const TclCase kCases[] = {
                   "set PortDir [ list  \"I\" \"O\" \"B\" \"O\" \"I\" ]\n"
                   "set TotalPorts 5\n",
      .out = "pinforge:WARNING: Module top(Line 8): INTEGER RANGE is only supported for schematic "
-            "symbol generation.\n" + kSuccess},
-    {.name = "TclSpecialsEscaped",
-     .project = "p\"$[x]\\q",
-     .projectLine = "p\\\"\\$\\[x\\]\\\\q"},
+            "symbol generation.\n" +
+            kSuccess},
+    {.name = "TclSpecialsEscaped", .project = "p\"$[x]\\q", .projectLine = "p\\\"\\$\\[x\\]\\\\q"},
     {.name = "TemplateCopiedWholeWithItsBytes",
      .templateText = "# " + std::string(250, 'x') + " end\na\tb\r\n\x01\xff end"},
     {.name = "ShellOutputHiddenOnSuccess", .fakeSay = "chatter"},
@@ -151,7 +159,8 @@ const TclCase kCases[] = {
      .scriptKept = true},
     {.name = "ScriptCannotBeCreated",
      .out = "pinforge:ERROR: ProjectMgmt(pinforge) - Unable to create the temporary tcl script "
-            "in @/tmp/missing: No such file or directory\n" + kFailure,
+            "in @/tmp/missing: No such file or directory\n" +
+            kFailure,
      .status = 1,
      .tmpdir = "@/tmp/missing",
      .scriptFolder = ""},
@@ -177,7 +186,8 @@ const TclCase kCases[] = {
     // Empty and relative PATH entries mean the current folder, where a stranger's runscr waits.
     {.name = "ShellNeverFromCurrentFolder",
      .out = "pinforge:ERROR: ProjectMgmt(pinforge) - The script shell runscr is neither beside "
-            "pinforge nor in a folder on PATH\n" + kInvokeError,
+            "pinforge nor in a folder on PATH\n" +
+            kInvokeError,
      .status = 1,
      .scriptKept = true,
      .scriptFolder = "",
@@ -194,8 +204,7 @@ TEST_P(TclDriver, WritesScriptAndJudgesShell) {
   if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
   ScratchDir dir;
   ASSERT_FALSE(dir.path().empty());
-  for (const char* sub : {"bin", "pathbin", "work", "tmp"})
-    ASSERT_TRUE(dir.makeDir(sub));
+  for (const char* sub : {"bin", "pathbin", "work", "tmp"}) ASSERT_TRUE(dir.makeDir(sub));
   ASSERT_TRUE(placeProgram(dir.file("bin/pinforge")));
   ASSERT_TRUE(dir.write("pathbin/runscr", "#!/bin/sh\nexit 9\n", true));
   if (!c.shellBeside.empty()) {
@@ -204,9 +213,18 @@ TEST_P(TclDriver, WritesScriptAndJudgesShell) {
   ASSERT_TRUE(dir.write("work/design.vhd", c.design));
   ASSERT_TRUE(dir.write("work/t.tcl", c.templateText));
 
-  std::vector<std::string> args = {dir.file("bin/pinforge"), "-lib", "work", "design.vhd",
-                                   "-module", "top", "-prj", c.project, "-template", "t.tcl",
-                                   "-o", "out.txt"};
+  std::vector<std::string> args = {dir.file("bin/pinforge"),
+                                   "-lib",
+                                   "work",
+                                   "design.vhd",
+                                   "-module",
+                                   "top",
+                                   "-prj",
+                                   c.project,
+                                   "-template",
+                                   "t.tcl",
+                                   "-o",
+                                   "out.txt"};
   args.insert(args.end(), c.extraArgs.begin(), c.extraArgs.end());
   const std::string capture = dir.file("captured.tcl");
   const RunResult run = runProgram(args, dir.file("work"),
@@ -255,12 +273,13 @@ TEST(TclShell, RealShellWithTempFolderLikeAnOption) {
   std::error_code error;
   ASSERT_TRUE(std::filesystem::copy_file(sourceDir() + "/tools/runscr", runscr, error));
   ASSERT_TRUE(dir.write("work/design.vhd", kTwoPorts));
-  ASSERT_TRUE(dir.write("work/t.tcl", "set f [open $OutputFileName w]\n"
-                                      "puts $f \"$ModuleName [llength $PortName]\"\nclose $f\n"));
-  const RunResult run = runProgram({dir.file("bin/pinforge"), "-lib", "work", "design.vhd",
-                                    "-module", "top", "-prj", "p", "-template", "t.tcl", "-o",
-                                    "out.txt"},
-                                   dir.file("work"), {{"TMPDIR", "-tmp"}});
+  ASSERT_TRUE(dir.write("work/t.tcl",
+                        "set f [open $OutputFileName w]\n"
+                        "puts $f \"$ModuleName [llength $PortName]\"\nclose $f\n"));
+  const RunResult run =
+      runProgram({dir.file("bin/pinforge"), "-lib", "work", "design.vhd", "-module", "top", "-prj",
+                  "p", "-template", "t.tcl", "-o", "out.txt"},
+                 dir.file("work"), {{"TMPDIR", "-tmp"}});
   EXPECT_EQ(run.out, kSuccess);
   EXPECT_EQ(run.err, "");
   EXPECT_EQ(run.status, 0);

@@ -59,7 +59,7 @@ TEST_P(GoldenTest, MatchesExpectations) {
 
   // The shared designs the case names come first, so that its own files can replace them;
   // everything but the files that describe the case takes part in the run.
-  const std::set<std::string> control = {"args",          "requires",      "designs", "expect",
+  const std::set<std::string> control = {"args",          "requires",      "designs",      "expect",
                                          "expect.stdout", "expect.stderr", "expect.status"};
   ScratchDir work;
   std::error_code error;
@@ -81,9 +81,11 @@ TEST_P(GoldenTest, MatchesExpectations) {
 
   const std::string status = caseFile("expect.status");
   EXPECT_EQ(run.status, status == kMissing ? 0 : std::atoi(status.c_str()))
-      << "stdout:\n" << run.out << "stderr:\n" << run.err;
-  for (const auto& [name, actual] : {std::pair{"expect.stdout", &run.out},
-                                     std::pair{"expect.stderr", &run.err}}) {
+      << "stdout:\n"
+      << run.out << "stderr:\n"
+      << run.err;
+  for (const auto& [name, actual] :
+       {std::pair{"expect.stdout", &run.out}, std::pair{"expect.stderr", &run.err}}) {
     const std::string expected = caseFile(name);
     EXPECT_EQ(*actual, expected == kMissing ? *actual : expected) << name;
   }

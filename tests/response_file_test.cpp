@@ -21,34 +21,55 @@ TEST(ExpandResponseFile, WordsAndFailures) {
   ASSERT_EQ(::mkfifo(dir.file("fifo").c_str(), 0600), 0);
   const struct {
     const char* what;
-    Words args;            // after the program name
-    std::string content;   // of args.rsp
-    Words words;           // after "pinforge"
+    Words args;                // after the program name
+    std::string content;       // of args.rsp
+    Words words;               // after "pinforge"
     std::string message = "";  // non-empty: the expansion fails with it
   } cases[] = {
       // Only the first argument can name a response file.
-      {"command line", {"-lib", "work", "a b.vhd", "", "@x"}, "", {"-lib", "work", "a b.vhd", "", "@x"}},
+      {"command line",
+       {"-lib", "work", "a b.vhd", "", "@x"},
+       "",
+       {"-lib", "work", "a b.vhd", "", "@x"}},
       {"runs of delimiters, later arguments ignored",
-       {rsp, "-ignored"}, "  -lib\twork \t a.vhd\n\n\n-module   top  \n",
+       {rsp, "-ignored"},
+       "  -lib\twork \t a.vhd\n\n\n-module   top  \n",
        {"-lib", "work", "a.vhd", "-module", "top"}},
       {"no final newline", {rsp}, "-o out.vhd", {"-o", "out.vhd"}},
       {"CRLF line ends", {rsp}, "-lib work\r\na.vhd\r\n", {"-lib", "work", "a.vhd"}},
       {"a carriage return inside a line stays", {rsp}, "a\rb\n", {"a\rb"}},
       {"empty file", {rsp}, "", {}},
-      {"no quoting, comments or nesting", {rsp}, "\"a b\" # c @inner.rsp\n",
+      {"no quoting, comments or nesting",
+       {rsp},
+       "\"a b\" # c @inner.rsp\n",
        {"\"a", "b\"", "#", "c", "@inner.rsp"}},
-      {"missing file", {"@" + dir.file("missing.rsp")}, "", {},
+      {"missing file",
+       {"@" + dir.file("missing.rsp")},
+       "",
+       {},
        "FATAL ERROR: Unable to open response file " + dir.file("missing.rsp") + "...\n"},
       {"empty name", {"@"}, "", {}, "FATAL ERROR: Unable to open response file ...\n"},
-      {"a directory", {"@" + dir.path()}, "", {},
+      {"a directory",
+       {"@" + dir.path()},
+       "",
+       {},
        "FATAL ERROR: Unable to open response file " + dir.path() + "...\n"},
       // Opening a FIFO without a writer would wait forever; reading a device, without end.
-      {"a FIFO", {"@" + dir.file("fifo")}, "", {},
+      {"a FIFO",
+       {"@" + dir.file("fifo")},
+       "",
+       {},
        "FATAL ERROR: Response file " + dir.file("fifo") + " is not a regular file.\n"},
-      {"an endless device", {"@/dev/zero"}, "", {},
+      {"an endless device",
+       {"@/dev/zero"},
+       "",
+       {},
        "FATAL ERROR: Response file /dev/zero is not a regular file.\n"},
       {"a word of the largest size", {rsp}, "a\n" + hugeWord, {"a", hugeWord}},
-      {"a word one byte over the largest size", {rsp}, "a\n\nb " + hugeWord + "x\n", {},
+      {"a word one byte over the largest size",
+       {rsp},
+       "a\n\nb " + hugeWord + "x\n",
+       {},
        "FATAL ERROR: Response file " + dir.file("args.rsp") +
            ", line 3: a word is longer than 16 MB.\n"},
   };
@@ -62,9 +83,9 @@ TEST(ExpandResponseFile, WordsAndFailures) {
     argv.push_back(nullptr);
     pinforge_test::FilePtr messages(std::tmpfile());
     ArgumentVector expanded;
-    EXPECT_EQ(expandResponseFile(messages.get(), static_cast<int>(args.size()), argv.data(),
-                                 expanded),
-              test.message.empty() ? Expansion::Ready : Expansion::Refused);
+    EXPECT_EQ(
+        expandResponseFile(messages.get(), static_cast<int>(args.size()), argv.data(), expanded),
+        test.message.empty() ? Expansion::Ready : Expansion::Refused);
     Words words;
     for (size_t i = 1; i < expanded.count(); ++i) words.push_back(expanded[i]);
     if (test.message.empty()) {

@@ -42,10 +42,14 @@ TEST_F(RunContextFiles, OutputExtensionIsEverythingAfterTheFirstDotOfTheWholeNam
     const char* extension;
     bool opens;
   } cases[] = {
-      {"out.vhd", "vhd", true},        {"out", "", true},
-      {"top.vhd.bak", "vhd.bak", true}, {".hidden", "hidden", true},
-      {"out.", "", true},              {"dir.x/out.v", "x/out.v", true},
-      {"build.d/out", "d/out", false}, {"missing.dir/out", "dir/out", false},
+      {"out.vhd", "vhd", true},
+      {"out", "", true},
+      {"top.vhd.bak", "vhd.bak", true},
+      {".hidden", "hidden", true},
+      {"out.", "", true},
+      {"dir.x/out.v", "x/out.v", true},
+      {"build.d/out", "d/out", false},
+      {"missing.dir/out", "dir/out", false},
   };
   for (const auto& test : cases) {
     SCOPED_TRACE(test.name);
@@ -217,8 +221,7 @@ std::unique_ptr<StbDataList> unitData(const ScratchDir& dir, const char* file, c
   context.m_Extractor.configure(context.m_ScanSettings);
   context.m_Extractor.Parse(context.m_Language);
   if (context.m_Extractor.findDesignUnit("work", "top", ScanExtractor::SearchAllLibraries) != 0 ||
-      !checkUnitHeader(context) || !prepareRun(context) ||
-      !buildPortList(context))
+      !checkUnitHeader(context) || !prepareRun(context) || !buildPortList(context))
     return nullptr;
   buildUnitData(context);
   return std::move(context.m_DesignData);
@@ -237,13 +240,13 @@ TEST(UnitData, PortsKeepTheirDeclarationAndGenericsTheirValue) {
   settings.genericOverrides = {{"depth", "2 + 2"}};
   testing::internal::CaptureStdout();
   testing::internal::CaptureStderr();
-  const std::unique_ptr<StbDataList> data = unitData(
-      dir, "top.vhd",
-      "library ieee;\nuse ieee.std_logic_1164.all;\n"
-      "entity top is\n  generic (WIDTH : natural := 8; DEPTH : integer);\n"
-      "  port (clk : in std_ulogic; d : in std_ulogic_vector(WIDTH-1 downto 0);\n"
-      "        q : buffer std_logic_vector(DEPTH-1 downto 0));\nend entity top;\n",
-      false, settings);
+  const std::unique_ptr<StbDataList> data =
+      unitData(dir, "top.vhd",
+               "library ieee;\nuse ieee.std_logic_1164.all;\n"
+               "entity top is\n  generic (WIDTH : natural := 8; DEPTH : integer);\n"
+               "  port (clk : in std_ulogic; d : in std_ulogic_vector(WIDTH-1 downto 0);\n"
+               "        q : buffer std_logic_vector(DEPTH-1 downto 0));\nend entity top;\n",
+               false, settings);
   testing::internal::GetCapturedStdout();
   testing::internal::GetCapturedStderr();
   ASSERT_NE(data, nullptr);

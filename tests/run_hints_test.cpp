@@ -13,8 +13,8 @@ namespace {
 using pinforge_test::ScratchDir;
 
 TEST(RunHints, ClosestNamesByEditDistanceIgnoringCase) {
-  const std::vector<std::string> names = {"fifo_sync", "FIFO", "top", "fifo", "uart_tx", "Top2",
-                                          "fif", "alu"};
+  const std::vector<std::string> names = {"fifo_sync", "FIFO", "top", "fifo",
+                                          "uart_tx",   "Top2", "fif", "alu"};
   const struct {
     const char* wanted;
     size_t most;
@@ -89,13 +89,21 @@ TEST(RunHints, LanguageHintFromExtensionsAndEntityDeclarations) {
     std::string hint;
   } cases[] = {
       {"VHDL files read as VHDL", {"a.vhd", "ent.txt"}, false, ""},
-      {"a .V file read as VHDL", {"a.vhd", "b.V"}, false,
+      {"a .V file read as VHDL",
+       {"a.vhd", "b.V"},
+       false,
        at + "b.V looks like Verilog; read it with -lang verilog."},
-      {"a header read as VHDL", {"x.svh", "b.v"}, false,
+      {"a header read as VHDL",
+       {"x.svh", "b.v"},
+       false,
        at + "x.svh looks like SystemVerilog; read it with -lang sv."},
-      {"a .vhdl file read as Verilog", {"m.v", "c.vhdl"}, true,
+      {"a .vhdl file read as Verilog",
+       {"m.v", "c.vhdl"},
+       true,
        at + "c.vhdl looks like VHDL; read it with -lang vhdl."},
-      {"an entity read as Verilog", {"m.v", "ent.txt"}, true,
+      {"an entity read as Verilog",
+       {"m.v", "ent.txt"},
+       true,
        at + "ent.txt looks like VHDL (it declares entity Top); read it with -lang vhdl."},
       {"words that are no entity declaration", {"words.txt", "m.v", "gone.txt"}, true, ""},
   };

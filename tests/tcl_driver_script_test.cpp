@@ -44,8 +44,8 @@ std::unique_ptr<RunContext> contextFor(const Design& design) {
   context->m_OutputFileName = "out.txt";
   context->m_InputFileName = "design.vhd";
   context->m_TemplateFileName = "t.tcl";
-  context->m_DesignData = std::make_unique<StbDataList>("demo", "top", "out", "txt", "pinforge",
-                                                        "", "", "");
+  context->m_DesignData =
+      std::make_unique<StbDataList>("demo", "top", "out", "txt", "pinforge", "", "", "");
   StbDataList& data = *context->m_DesignData;
   data.m_Language = design.language;
   data.m_Generics = design.generics;
@@ -181,13 +181,13 @@ TEST(TclDriverRoundTrip, EveryByteOfEveryValueReachesTheTemplate) {
   const RunResult run = runTcl(dir, tclDriverScriptHead(*contextFor(design)) + kHexDump);
   ASSERT_EQ(run.status, 0) << run.err;
   EXPECT_EQ(dir.read("values.txt"),
-            "GenericName " + hex("G1") + "\nGenericName " + hex(tclWords) + "\n" +
-                "GenericType " + hex(everyByte) + "\nGenericType \n" +
-                "GenericDefault " + hex(tclWords) + "\nGenericDefault \n" +
-                "GenericValue " + hex("\r\n") + "\nGenericValue " + hex(everyByte) + "\n" +
-                "PortType " + hex(everyByte) + "\nPortType " + hex(tclWords) + "\n" +
-                "TotalGenerics 2\n" + "Context " + hex(everyByte + tclWords) + "\n" +
-                "Language verilog\n" + "Range <7> <0>\nRange <> <>\n");
+            "GenericName " + hex("G1") + "\nGenericName " + hex(tclWords) + "\n" + "GenericType " +
+                hex(everyByte) + "\nGenericType \n" + "GenericDefault " + hex(tclWords) +
+                "\nGenericDefault \n" + "GenericValue " + hex("\r\n") + "\nGenericValue " +
+                hex(everyByte) + "\n" + "PortType " + hex(everyByte) + "\nPortType " +
+                hex(tclWords) + "\n" + "TotalGenerics 2\n" + "Context " +
+                hex(everyByte + tclWords) + "\n" + "Language verilog\n" +
+                "Range <7> <0>\nRange <> <>\n");
 }
 
 }  // namespace

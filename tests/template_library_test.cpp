@@ -23,54 +23,53 @@ using difftest::sourceDir;
 
 /// What consumes a template's output.
 enum class Check {
-  None,            // the golden comparison says all there is
-  GhdlTop,         // analysed after the sources and elaborated as `top`
-  GhdlInstance,    // placed in a parent with the vhdl_signals declarations
-  GhdlComponent,   // as GhdlInstance, with the vhdl_component declaration as well
-  SvTop,           // linted with Verilator (and compiled with Icarus when `icarus`) as `top`
-  SvInstance,      // placed in a parent declaring `parent`, then as SvTop
-  Python,          // imported when cocotb is installed, else byte-compiled
-  JsonNames,       // parsed; its port names must be `names`
-  CsvNames,        // parsed; the first column after the header must be `names`
-  Svg,             // well-formed XML, rendered to a PNG of the declared size
+  None,           // the golden comparison says all there is
+  GhdlTop,        // analysed after the sources and elaborated as `top`
+  GhdlInstance,   // placed in a parent with the vhdl_signals declarations
+  GhdlComponent,  // as GhdlInstance, with the vhdl_component declaration as well
+  SvTop,          // linted with Verilator (and compiled with Icarus when `icarus`) as `top`
+  SvInstance,     // placed in a parent declaring `parent`, then as SvTop
+  Python,         // imported when cocotb is installed, else byte-compiled
+  JsonNames,      // parsed; its port names must be `names`
+  CsvNames,       // parsed; the first column after the header must be `names`
+  Svg,            // well-formed XML, rendered to a PNG of the declared size
 };
 
 struct Case {
-  const char* expected;      // file name under expected/, also the output's name
-  const char* templateName;  // found by name, as a user gives it
+  const char* expected;           // file name under expected/, also the output's name
+  const char* templateName;       // found by name, as a user gives it
   std::vector<std::string> args;  // design files (in the fixture folder), -module, -g, ...
   Check check = Check::None;
-  const char* top = "";      // unit elaborated or linted
-  const char* std = "";      // GHDL --std when the output needs one
-  const char* elab = "";     // GHDL -g switch for the top's generic without default
-  const char* parent = "";   // SvInstance: declarations of the parent module
-  const char* names = "";    // JsonNames/CsvNames: the port names, one per line
+  const char* top = "";     // unit elaborated or linted
+  const char* std = "";     // GHDL --std when the output needs one
+  const char* elab = "";    // GHDL -g switch for the top's generic without default
+  const char* parent = "";  // SvInstance: declarations of the parent module
+  const char* names = "";   // JsonNames/CsvNames: the port names, one per line
   bool icarus = false;
 };
 
 void PrintTo(const Case& c, std::ostream* os) { *os << c.templateName << " -> " << c.expected; }
 
-const std::vector<std::string> kCore = {"tl_pkg.vhd", "tl_core.vhd", "-module", "tl_core",
-                                        "-g", "DATA_W=8"};
+const std::vector<std::string> kCore = {"tl_pkg.vhd", "tl_core.vhd", "-module",
+                                        "tl_core",    "-g",          "DATA_W=8"};
 const std::vector<std::string> kQuoted = {"tl_quoted.vhd", "-module", "tl_quoted"};
-const std::vector<std::string> kSvCore = {"tl_sv_pkg.sv", "tl_sv_core.sv", "-lang", "sv",
-                                          "-module", "tl_sv_core"};
-const std::vector<std::string> kSvBus = {"tl_sv_pkg.sv", "tl_sv_bus.sv", "-lang", "sv",
-                                         "-module", "tl_sv_bus"};
+const std::vector<std::string> kSvCore = {"tl_sv_pkg.sv", "tl_sv_core.sv", "-lang",
+                                          "sv",           "-module",       "tl_sv_core"};
+const std::vector<std::string> kSvBus = {"tl_sv_pkg.sv", "tl_sv_bus.sv", "-lang",
+                                         "sv",           "-module",      "tl_sv_bus"};
 const std::vector<std::string> kLegacy = {"tl_legacy.v", "-lang", "verilog", "-module",
                                           "tl_legacy"};
 
 constexpr const char* kSvCoreNets =
     "  logic clk, rst_n;\n  req_t req;\n  logic [7:0] din;\n  logic [15:0] dout;\n"
     "  logic [2:0] id;\n";
-constexpr const char* kLegacyNets =
-    "  logic clk, reset;\n  logic [3:0] d;\n  logic [7:0] q;\n";
+constexpr const char* kLegacyNets = "  logic clk, reset;\n  logic [3:0] d;\n  logic [7:0] q;\n";
 
 const std::vector<Case>& cases() {
   static const std::vector<Case> table = {
       {"tl_core_component.vhd", "vhdl_component", kCore, Check::GhdlComponent, "", "08"},
-      {"tl_core_component_instance.vhd", "vhdl_component_instance", kCore, Check::GhdlComponent,
-       "", "08"},
+      {"tl_core_component_instance.vhd", "vhdl_component_instance", kCore, Check::GhdlComponent, "",
+       "08"},
       {"tl_core_instance.vhd", "vhdl_instance", kCore, Check::GhdlInstance, "", "08"},
       {"tl_core_signals.vhd", "vhdl_signals", kCore, Check::GhdlInstance, "", "08"},
       {"tl_core_wrapper.vhd", "vhdl_wrapper", kCore, Check::GhdlTop, "tl_core_wrapper", "",
@@ -87,8 +86,8 @@ const std::vector<Case>& cases() {
       {"tl_sv_bus_wrapper.sv", "verilog_wrapper", kSvBus, Check::SvTop, "tl_sv_bus_wrapper"},
       {"tl_legacy_instance.sv", "verilog_instance", kLegacy, Check::SvInstance, "", "", "",
        kLegacyNets, "", true},
-      {"tl_legacy_wrapper.sv", "verilog_wrapper", kLegacy, Check::SvTop, "tl_legacy_wrapper",
-       "", "", "", "", true},
+      {"tl_legacy_wrapper.sv", "verilog_wrapper", kLegacy, Check::SvTop, "tl_legacy_wrapper", "",
+       "", "", "", true},
       {"tb_tl_legacy.sv", "sv_testbench", kLegacy, Check::SvTop, "tb_tl_legacy", "", "", "", "",
        true},
       {"test_tl_core.py", "cocotb_test", kCore, Check::Python},
@@ -184,7 +183,7 @@ unsigned pngDimension(const std::string& png, size_t offset) {
 }
 
 void checkGhdl(const ScratchDir& dir, const Case& c, const std::string& output,
-                std::string& missingTool) {
+               std::string& missingTool) {
   const std::string ghdl = needTool("ghdl", missingTool);
   if (ghdl.empty()) return;
   std::string unit = output;
@@ -205,9 +204,10 @@ void checkGhdl(const ScratchDir& dir, const Case& c, const std::string& output,
           c.check == Check::GhdlComponent ? "vhdl_component_instance" : "vhdl_instance";
       ASSERT_TRUE(generate(dir, instanceTemplate, c.args, "instance.txt", instance));
     }
-    parent = context + "\nentity tl_parent is\nend entity tl_parent;\n\n"
-             "architecture a of tl_parent is\n" + component + signals + "\nbegin\n" +
-             instance + "end architecture a;\n";
+    parent = context +
+             "\nentity tl_parent is\nend entity tl_parent;\n\n"
+             "architecture a of tl_parent is\n" +
+             component + signals + "\nbegin\n" + instance + "end architecture a;\n";
     ASSERT_TRUE(dir.write("tl_parent.vhd", parent));
     unit = "tl_parent.vhd";
     top = "tl_parent";
@@ -248,8 +248,8 @@ void checkSv(const ScratchDir& dir, const Case& c, const std::string& output,
   const std::string verilator = needTool("verilator", missingTool);
   if (!verilator.empty()) {
     // The testbench states its timeunit and the fixtures do not.
-    std::vector<std::string> argv = {verilator, "--lint-only", "--timing", "-Wno-TIMESCALEMOD",
-                                     "--top-module", top};
+    std::vector<std::string> argv = {verilator,           "--lint-only",  "--timing",
+                                     "-Wno-TIMESCALEMOD", "--top-module", top};
     argv.insert(argv.end(), files.begin(), files.end());
     expectRuns(argv, dir);
   }
@@ -322,16 +322,25 @@ TEST_P(TemplateLibrary, MatchesReviewedOutputAndItsConsumerAcceptsIt) {
   EXPECT_EQ(text, readFile(expectedPath)) << "reviewed output: " << expectedPath;
 
   switch (c.check) {
-    case Check::None: break;
+    case Check::None:
+      break;
     case Check::GhdlTop:
     case Check::GhdlInstance:
-    case Check::GhdlComponent: checkGhdl(dir, c, c.expected, missingTool); break;
+    case Check::GhdlComponent:
+      checkGhdl(dir, c, c.expected, missingTool);
+      break;
     case Check::SvTop:
-    case Check::SvInstance: checkSv(dir, c, c.expected, missingTool); break;
+    case Check::SvInstance:
+      checkSv(dir, c, c.expected, missingTool);
+      break;
     case Check::Python:
     case Check::JsonNames:
-    case Check::CsvNames: checkData(dir, c, c.expected, missingTool); break;
-    case Check::Svg: checkSvg(dir, c.expected, missingTool); break;
+    case Check::CsvNames:
+      checkData(dir, c, c.expected, missingTool);
+      break;
+    case Check::Svg:
+      checkSvg(dir, c.expected, missingTool);
+      break;
   }
   if (!missingTool.empty()) GTEST_SKIP() << missingTool << " is not installed";
 }
@@ -343,8 +352,7 @@ INSTANTIATE_TEST_SUITE_P(Bundled, TemplateLibrary, ::testing::ValuesIn(cases()),
 
 TEST(TemplateLibraryTable, CoversEveryBundledTemplate) {
   std::error_code error;
-  for (const auto& entry :
-       std::filesystem::directory_iterator(sourceDir() + "/templates", error)) {
+  for (const auto& entry : std::filesystem::directory_iterator(sourceDir() + "/templates", error)) {
     const std::string name = entry.path().stem().string();
     bool covered = false;
     for (const Case& c : cases()) covered = covered || name == c.templateName;

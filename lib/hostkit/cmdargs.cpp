@@ -63,8 +63,7 @@ const char* UT_CMDSWINFO::getargtxt(uint16_t index) const {
   return index < m_Arguments.size() ? m_Arguments[index].c_str() : nullptr;
 }
 
-UT_CMDARGS::UT_CMDARGS(int argc, char** argv, const char* usage, void* /*callback*/,
-                       int /*option*/)
+UT_CMDARGS::UT_CMDARGS(int argc, char** argv, const char* usage, void* /*callback*/, int /*option*/)
     : m_Usage(usage != nullptr ? usage : "") {
   declare(m_Usage);
   match(argv != nullptr ? argc : 0, argv);

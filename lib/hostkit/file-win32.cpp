@@ -13,8 +13,8 @@
 #include <string>
 #include <string_view>
 
-#include "platform/hostkit.h"
 #include "hostkit/wide_text-win32.h"
+#include "platform/hostkit.h"
 
 namespace {
 
@@ -83,9 +83,9 @@ struct FileKey {
 /// Opens `path` (a folder too) without reading or locking it and tells what it is; false
 /// when it cannot be opened. Devices such as NUL or CON are neither regular nor folders.
 bool keyOf(const std::wstring& path, FileKey& key) {
-  HANDLE handle = ::CreateFileW(path.c_str(), 0,
-                                FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE, nullptr,
-                                OPEN_EXISTING, FILE_FLAG_BACKUP_SEMANTICS, nullptr);
+  HANDLE handle =
+      ::CreateFileW(path.c_str(), 0, FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE,
+                    nullptr, OPEN_EXISTING, FILE_FLAG_BACKUP_SEMANTICS, nullptr);
   if (handle == INVALID_HANDLE_VALUE) return false;
   BY_HANDLE_FILE_INFORMATION info{};
   const bool disk = ::GetFileType(handle) == FILE_TYPE_DISK;
@@ -163,8 +163,7 @@ std::string File::temporaryDirectory() {
 }
 
 std::FILE* File::createTemporary(std::string_view suffix, std::string& name) {
-  if (suffix.find_first_of(std::string_view("/\\:\0", 4)) != std::string_view::npos)
-    return nullptr;
+  if (suffix.find_first_of(std::string_view("/\\:\0", 4)) != std::string_view::npos) return nullptr;
   const std::string directory = temporaryFolderWithSeparator();
   if (directory.empty()) return nullptr;
   // CREATE_NEW fails on an existing name, so a name another process guessed first is simply
@@ -280,8 +279,7 @@ HANDLE createBeside(const std::string& path, std::string& name) {
 
 bool sameFile(HANDLE handle, DWORD volume, uint64_t index) {
   BY_HANDLE_FILE_INFORMATION info{};
-  return ::GetFileInformationByHandle(handle, &info) != 0 &&
-         info.dwVolumeSerialNumber == volume &&
+  return ::GetFileInformationByHandle(handle, &info) != 0 && info.dwVolumeSerialNumber == volume &&
          ((uint64_t{info.nFileIndexHigh} << 32) | info.nFileIndexLow) == index;
 }
 
@@ -414,9 +412,9 @@ bool OutputFile::removeWritten() {
   if (attributes == INVALID_FILE_ATTRIBUTES ||
       (attributes & (FILE_ATTRIBUTE_DIRECTORY | FILE_ATTRIBUTE_REPARSE_POINT)) != 0)
     return false;
-  HANDLE handle = ::CreateFileW(wide.c_str(), 0,
-                                FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE, nullptr,
-                                OPEN_EXISTING, 0, nullptr);
+  HANDLE handle =
+      ::CreateFileW(wide.c_str(), 0, FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE,
+                    nullptr, OPEN_EXISTING, 0, nullptr);
   if (handle == INVALID_HANDLE_VALUE) return false;
   const bool same = sameFile(handle, static_cast<DWORD>(m_Device), m_Inode);
   ::CloseHandle(handle);

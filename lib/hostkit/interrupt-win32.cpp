@@ -6,8 +6,8 @@
 #include <string>
 #include <string_view>
 
-#include "platform/hostkit.h"
 #include "hostkit/wide_text-win32.h"
+#include "platform/hostkit.h"
 
 namespace {
 

@@ -71,8 +71,8 @@ class SpawnActions {
   }
   bool wire(int outWrite, int errWrite) {
     return m_Valid &&
-           ::posix_spawn_file_actions_addopen(&m_Actions, STDIN_FILENO, "/dev/null", O_RDONLY,
-                                              0) == 0 &&
+           ::posix_spawn_file_actions_addopen(&m_Actions, STDIN_FILENO, "/dev/null", O_RDONLY, 0) ==
+               0 &&
            ::posix_spawn_file_actions_adddup2(&m_Actions, outWrite, STDOUT_FILENO) == 0 &&
            ::posix_spawn_file_actions_adddup2(&m_Actions, errWrite, STDERR_FILENO) == 0 &&
            ::posix_spawn_file_actions_addclosefrom_np(&m_Actions, STDERR_FILENO + 1) == 0;
@@ -182,8 +182,7 @@ int spawnAndCollect(const std::vector<std::string>& words, Host::ChildOutput* re
     HeldSignals held;
     const SpawnAttributes attributes(held.previous());
     if (!attributes.valid() ||
-        ::posix_spawn(&child, argv[0], actions.get(), attributes.get(), argv.data(), environ) !=
-            0)
+        ::posix_spawn(&child, argv[0], actions.get(), attributes.get(), argv.data(), environ) != 0)
       return kNotStarted;
     Host::Interrupt::setChildGroup(child);
   }

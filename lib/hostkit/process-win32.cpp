@@ -11,8 +11,8 @@
 #include <thread>
 #include <vector>
 
-#include "platform/hostkit.h"
 #include "hostkit/wide_text-win32.h"
+#include "platform/hostkit.h"
 
 namespace {
 

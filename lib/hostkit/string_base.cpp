@@ -33,8 +33,7 @@ int compareBytes(std::string_view a, std::string_view b, bool ignoreCase) {
   return a.size() < b.size() ? -1 : 1;
 }
 
-bool matchesAt(std::string_view text, size_t position, std::string_view pattern,
-               bool ignoreCase) {
+bool matchesAt(std::string_view text, size_t position, std::string_view pattern, bool ignoreCase) {
   return compareBytes(text.substr(position, pattern.size()), pattern, ignoreCase) == 0;
 }
 
@@ -70,8 +69,7 @@ int StringBase::Replace(std::string_view from, std::string_view to, int mode) {
   int replacements = 0;
   size_t position = 0;
   while (position < m_Text.size()) {
-    if (position + from.size() <= m_Text.size() &&
-        matchesAt(m_Text, position, from, ignoreCase)) {
+    if (position + from.size() <= m_Text.size() && matchesAt(m_Text, position, from, ignoreCase)) {
       result.append(to);
       position += from.size();
       ++replacements;

@@ -194,16 +194,15 @@ bool Forge::doIfPort(std::string_view token, bool isIfPort, const PortRecord* po
 namespace {
 
 /// The kind names of @IFKIND, in PortTypeKind's order.
-constexpr std::string_view kKindNames[] = {"bit",  "vector",    "integer", "record",
-                                           "array", "enum", "interface", "other"};
+constexpr std::string_view kKindNames[] = {"bit",   "vector", "integer",   "record",
+                                           "array", "enum",   "interface", "other"};
 
 std::optional<PortTypeKind> kindNamed(std::string_view name) {
   for (size_t i = 0; i < std::size(kKindNames); ++i) {
     const std::string_view known = kKindNames[i];
     if (name.size() != known.size()) continue;
     bool same = true;
-    for (size_t c = 0; c < name.size() && same; ++c)
-      same = (name[c] | 0x20) == known[c];
+    for (size_t c = 0; c < name.size() && same; ++c) same = (name[c] | 0x20) == known[c];
     if (same) return static_cast<PortTypeKind>(i);
   }
   return std::nullopt;

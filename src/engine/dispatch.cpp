@@ -44,18 +44,27 @@ bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
     if (token.empty() || token[0] != '@') return false;
     const int index = lookupKeyword(token);
     switch (index) {
-      case kKwIfHas: return doIf(token, true);
-      case kKwIfNHas: return doIf(token, false);
-      case kKwIfPort: return doIfPort(token, true, port);
-      case kKwIfNPort: return doIfPort(token, false, port);
-      case kKwIfKind: return doIfKind(token, true, port);
-      case kKwIfNKind: return doIfKind(token, false, port);
+      case kKwIfHas:
+        return doIf(token, true);
+      case kKwIfNHas:
+        return doIf(token, false);
+      case kKwIfPort:
+        return doIfPort(token, true, port);
+      case kKwIfNPort:
+        return doIfPort(token, false, port);
+      case kKwIfKind:
+        return doIfKind(token, true, port);
+      case kKwIfNKind:
+        return doIfKind(token, false, port);
       case kKwIfDefault:
       case kKwIfNDefault:
       case kKwIfNTyped:
-      case kKwIfTyped: return doIfDeclared(index, port);
-      case kKwEndIf: return doEndIf();
-      default: return false;
+      case kKwIfTyped:
+        return doIfDeclared(index, port);
+      case kKwEndIf:
+        return doEndIf();
+      default:
+        return false;
     }
   }
 
@@ -73,19 +82,27 @@ bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
 
   const bool replaying = list != nullptr && port != nullptr;
   switch (index) {
-    case kKwContext: return writeContext();
-    case kKwGeneric: return writeGenericList();
+    case kKwContext:
+      return writeContext();
+    case kKwGeneric:
+      return writeGenericList();
     case kKwGenericDefault:
     case kKwGenericType:
-    case kKwGenericValue: return writeGenericField(index);
-    case kKwIfPort: return doIfPort(token, true, port);
-    case kKwIfNPort: return doIfPort(token, false, port);
-    case kKwIfKind: return doIfKind(token, true, port);
-    case kKwIfNKind: return doIfKind(token, false, port);
+    case kKwGenericValue:
+      return writeGenericField(index);
+    case kKwIfPort:
+      return doIfPort(token, true, port);
+    case kKwIfNPort:
+      return doIfPort(token, false, port);
+    case kKwIfKind:
+      return doIfKind(token, true, port);
+    case kKwIfNKind:
+      return doIfKind(token, false, port);
     case kKwIfDefault:
     case kKwIfNDefault:
     case kKwIfNTyped:
-    case kKwIfTyped: return doIfDeclared(index, port);
+    case kKwIfTyped:
+      return doIfDeclared(index, port);
     case kKwPortMode:
     case kKwPortType:
       if (!replaying) {
@@ -95,18 +112,29 @@ bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
         return true;
       }
       return index == kKwPortMode ? writePortMode(*port) : writePortType(*port);
-    case kKwAt: return writeText("@", false);
-    case kKwComment: return false;
-    case kKwCr: return writeText("\n", false);
-    case kKwEndIf: return doEndIf();
+    case kKwAt:
+      return writeText("@", false);
+    case kKwComment:
+      return false;
+    case kKwCr:
+      return writeText("\n", false);
+    case kKwEndIf:
+      return doEndIf();
     case kKwEndIterate:
       reportError("@ENDITERATE@ keyword encountered without a matching @ITERATE@.");
       return true;
-    case kKwExpandBus: m_ExpandBus = true; return false;
-    case kKwIfHas: return doIf(token, true);
-    case kKwIfNHas: return doIf(token, false);
-    case kKwInvCase: m_Case = INVCASE; return false;
-    case kKwIterate: return eatIterate();
+    case kKwExpandBus:
+      m_ExpandBus = true;
+      return false;
+    case kKwIfHas:
+      return doIf(token, true);
+    case kKwIfNHas:
+      return doIf(token, false);
+    case kKwInvCase:
+      m_Case = INVCASE;
+      return false;
+    case kKwIterate:
+      return eatIterate();
     case kKwIterator:
       if (m_CurrentGeneric != nullptr) {
         std::string name = m_CurrentGeneric->m_Name;
@@ -117,20 +145,44 @@ bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
         return true;
       }
       return rangeNeeded(*port) || writeText(formatPort(*port), false);
-    case kKwLowCase: m_Case = LOWCASE; return false;
-    case kKwMap: m_Map = true; return false;
-    case kKwMapSignal: return doMapSignal(token);
-    case kKwNoExpandBus: m_ExpandBus = false; return false;
-    case kKwNoMap: m_Map = false; return false;
-    case kKwNoShowRange: m_ShowRange = false; return false;
-    case kKwNoSuppresNewLine: m_SuppresNewLine = false; return false;
-    case kKwPercent: return writeText("%", false);
-    case kKwSameCase: m_Case = SAMECASE; return false;
-    case kKwSet: return doSet(token);
-    case kKwShowRange: m_ShowRange = true; return false;
-    case kKwSuppresNewLine: m_SuppresNewLine = true; return false;
-    case kKwTab: return writeText("\t", false);
-    case kKwUpCase: m_Case = UPCASE; return false;
+    case kKwLowCase:
+      m_Case = LOWCASE;
+      return false;
+    case kKwMap:
+      m_Map = true;
+      return false;
+    case kKwMapSignal:
+      return doMapSignal(token);
+    case kKwNoExpandBus:
+      m_ExpandBus = false;
+      return false;
+    case kKwNoMap:
+      m_Map = false;
+      return false;
+    case kKwNoShowRange:
+      m_ShowRange = false;
+      return false;
+    case kKwNoSuppresNewLine:
+      m_SuppresNewLine = false;
+      return false;
+    case kKwPercent:
+      return writeText("%", false);
+    case kKwSameCase:
+      m_Case = SAMECASE;
+      return false;
+    case kKwSet:
+      return doSet(token);
+    case kKwShowRange:
+      m_ShowRange = true;
+      return false;
+    case kKwSuppresNewLine:
+      m_SuppresNewLine = true;
+      return false;
+    case kKwTab:
+      return writeText("\t", false);
+    case kKwUpCase:
+      m_Case = UPCASE;
+      return false;
     case kKwVhdlTypeDec:
       if (m_CurrentGeneric != nullptr) {
         reportError("@VHDL_TYPEDEC@ may only occur inside an @ITERATE@ over ports.");
@@ -141,6 +193,7 @@ bool Forge::doToken(std::string_view token, TokList* list, PortRecord* port) {
         return true;
       }
       return doVhdlTypeDec(*port);
-    default: return false;
+    default:
+      return false;
   }
 }

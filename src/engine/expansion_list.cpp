@@ -2,7 +2,9 @@
 #include "engine/expansion_list.h"
 
 ExpansionList::ExpansionList(const PortRecord& bus)
-    : m_Bit(bus), m_Left(bus.m_Left), m_Right(bus.m_Right),
+    : m_Bit(bus),
+      m_Left(bus.m_Left),
+      m_Right(bus.m_Right),
       m_Step(bus.m_Left < bus.m_Right ? 1 : -1) {
   m_Bit.m_Right = m_Left;
 }

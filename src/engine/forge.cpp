@@ -3,8 +3,7 @@
 
 #include <cstdarg>
 
-Forge::Forge(std::FILE* output, std::FILE* templateStream, std::FILE* debug,
-             StbDataList* dataList)
+Forge::Forge(std::FILE* output, std::FILE* templateStream, std::FILE* debug, StbDataList* dataList)
     : m_Output(output),
       m_Template(templateStream),
       m_Debug(debug),

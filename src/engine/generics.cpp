@@ -43,8 +43,10 @@ bool Forge::writeGenericField(int index) {
     return true;
   }
   switch (index) {
-    case kKwGenericType: return writeText(m_CurrentGeneric->m_Type, false);
-    case kKwGenericDefault: return writeText(m_CurrentGeneric->m_Default, false);
+    case kKwGenericType:
+      return writeText(m_CurrentGeneric->m_Type, false);
+    case kKwGenericDefault:
+      return writeText(m_CurrentGeneric->m_Default, false);
     default:
       if (m_CurrentGeneric->m_Value.empty()) {
         reportValueError(*m_CurrentGeneric);

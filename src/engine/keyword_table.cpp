@@ -8,23 +8,72 @@ namespace {
 // Sorted by bytes with letters compared as lower case; words that take argument text carry no
 // closing character. No word is the beginning of another, so a prefix match is unambiguous.
 constexpr std::array<std::string_view, kKeywordCount> kWords = {
-    "%bbusport%", "%bport%", "%bscalarport%", "%busport%",
-    "%context%", "%date%", "%design%", "%ext%",
-    "%filename%", "%generic%", "%ibusport%", "%iport%",
-    "%iscalarport%", "%module%", "%node%", "%obbusport%",
-    "%obport%", "%obscalarport%", "%obusport%", "%oport%",
-    "%oscalarport%", "%port%", "%project%", "%scalarport%",
-    "%signal%", "%title%", "%tool%", "%ver%",
-    "@at@", "@comment", "@cr@", "@endif@",
-    "@enditerate@", "@expandbus@", "@generic_default@", "@generic_type@",
-    "@generic_value@", "@ifdefault@", "@ifhas", "@ifkind",
-    "@ifndefault@", "@ifnhas", "@ifnkind", "@ifnport",
-    "@ifntyped@", "@ifport",
-    "@iftyped@", "@invcase@", "@iterate@", "@iterator@",
-    "@lowcase@", "@map@", "@mapsignal", "@noexpandbus@",
-    "@nomap@", "@noshowrange@", "@nosuppresnewline@", "@percent@",
-    "@port_mode@", "@port_type@", "@samecase@", "@set",
-    "@showrange@", "@suppresnewline@", "@tab@", "@upcase@",
+    "%bbusport%",
+    "%bport%",
+    "%bscalarport%",
+    "%busport%",
+    "%context%",
+    "%date%",
+    "%design%",
+    "%ext%",
+    "%filename%",
+    "%generic%",
+    "%ibusport%",
+    "%iport%",
+    "%iscalarport%",
+    "%module%",
+    "%node%",
+    "%obbusport%",
+    "%obport%",
+    "%obscalarport%",
+    "%obusport%",
+    "%oport%",
+    "%oscalarport%",
+    "%port%",
+    "%project%",
+    "%scalarport%",
+    "%signal%",
+    "%title%",
+    "%tool%",
+    "%ver%",
+    "@at@",
+    "@comment",
+    "@cr@",
+    "@endif@",
+    "@enditerate@",
+    "@expandbus@",
+    "@generic_default@",
+    "@generic_type@",
+    "@generic_value@",
+    "@ifdefault@",
+    "@ifhas",
+    "@ifkind",
+    "@ifndefault@",
+    "@ifnhas",
+    "@ifnkind",
+    "@ifnport",
+    "@ifntyped@",
+    "@ifport",
+    "@iftyped@",
+    "@invcase@",
+    "@iterate@",
+    "@iterator@",
+    "@lowcase@",
+    "@map@",
+    "@mapsignal",
+    "@noexpandbus@",
+    "@nomap@",
+    "@noshowrange@",
+    "@nosuppresnewline@",
+    "@percent@",
+    "@port_mode@",
+    "@port_type@",
+    "@samecase@",
+    "@set",
+    "@showrange@",
+    "@suppresnewline@",
+    "@tab@",
+    "@upcase@",
     "@vhdl_typedec@",
 };
 
@@ -86,24 +135,42 @@ std::string_view keywordWord(int index) {
 
 const PortKind* portKindFor(int index) {
   switch (index) {
-    case kKwBBusPort: return &kBBus;
-    case kKwBPort: return &kB;
-    case kKwBScalarPort: return &kBScalar;
-    case kKwBusPort: return &kIobBus;
-    case kKwIBusPort: return &kIBus;
-    case kKwIPort: return &kI;
-    case kKwIScalarPort: return &kIScalar;
-    case kKwNode: return &kN;
-    case kKwOBBusPort: return &kObBus;
-    case kKwOBPort: return &kOb;
-    case kKwOBScalarPort: return &kObScalar;
-    case kKwOBusPort: return &kOBus;
-    case kKwOPort: return &kO;
-    case kKwOScalarPort: return &kOScalar;
-    case kKwPort: return &kIob;
-    case kKwScalarPort: return &kIobScalar;
-    case kKwSignal: return &kIobn;
-    default: return nullptr;
+    case kKwBBusPort:
+      return &kBBus;
+    case kKwBPort:
+      return &kB;
+    case kKwBScalarPort:
+      return &kBScalar;
+    case kKwBusPort:
+      return &kIobBus;
+    case kKwIBusPort:
+      return &kIBus;
+    case kKwIPort:
+      return &kI;
+    case kKwIScalarPort:
+      return &kIScalar;
+    case kKwNode:
+      return &kN;
+    case kKwOBBusPort:
+      return &kObBus;
+    case kKwOBPort:
+      return &kOb;
+    case kKwOBScalarPort:
+      return &kObScalar;
+    case kKwOBusPort:
+      return &kOBus;
+    case kKwOPort:
+      return &kO;
+    case kKwOScalarPort:
+      return &kOScalar;
+    case kKwPort:
+      return &kIob;
+    case kKwScalarPort:
+      return &kIobScalar;
+    case kKwSignal:
+      return &kIobn;
+    default:
+      return nullptr;
   }
 }
 

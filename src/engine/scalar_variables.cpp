@@ -16,15 +16,30 @@ bool Forge::writeScalarVariable(int index) {
   const StbDataList& data = *m_DataList;
   const std::string* value = &data.m_Ver;
   switch (index) {
-    case kKwDate: value = &data.m_Date; break;
+    case kKwDate:
+      value = &data.m_Date;
+      break;
     case kKwDesign:
-    case kKwProject: value = &data.m_Project; break;
-    case kKwExt: value = &data.m_Ext; break;
-    case kKwFileName: value = &data.m_FileName; break;
-    case kKwModule: value = &data.m_Module; break;
-    case kKwTitle: value = &data.m_Title; break;
-    case kKwTool: value = &data.m_Tool; break;
-    default: break;
+    case kKwProject:
+      value = &data.m_Project;
+      break;
+    case kKwExt:
+      value = &data.m_Ext;
+      break;
+    case kKwFileName:
+      value = &data.m_FileName;
+      break;
+    case kKwModule:
+      value = &data.m_Module;
+      break;
+    case kKwTitle:
+      value = &data.m_Title;
+      break;
+    case kKwTool:
+      value = &data.m_Tool;
+      break;
+    default:
+      break;
   }
   std::string copy = *value;
   return writeText(applyCase(copy), false);

@@ -16,7 +16,8 @@ inline std::optional<std::string_view> nextField(std::string_view& rest,
     return std::nullopt;
   }
   const size_t end = rest.find_first_of(separators, start);
-  const std::string_view field = rest.substr(start, end == std::string_view::npos ? end : end - start);
+  const std::string_view field =
+      rest.substr(start, end == std::string_view::npos ? end : end - start);
   rest = end == std::string_view::npos ? std::string_view{} : rest.substr(end + 1);
   return field;
 }

@@ -17,9 +17,10 @@ namespace Host {
 class StringBase {
  public:
   StringBase() = default;
-  StringBase(const char* text) : m_Text(text != nullptr ? text : "") {}  // NOLINT: implicit by design
-  StringBase(std::string_view text) : m_Text(text) {}                    // NOLINT
-  StringBase(std::string text) : m_Text(std::move(text)) {}              // NOLINT
+  StringBase(const char* text)
+      : m_Text(text != nullptr ? text : "") {}               // NOLINT: implicit by design
+  StringBase(std::string_view text) : m_Text(text) {}        // NOLINT
+  StringBase(std::string text) : m_Text(std::move(text)) {}  // NOLINT
 
   StringBase& operator=(std::string_view text) {
     m_Text.assign(text);

@@ -17,7 +17,11 @@ using handlers_test::errorAt;
 struct TypedPort {
   TypedPort(std::string name_, int32_t left_, int32_t right_, char dir_, std::string type_,
             PortTypeKind kind_)
-      : name(std::move(name_)), left(left_), right(right_), dir(dir_), type(std::move(type_)),
+      : name(std::move(name_)),
+        left(left_),
+        right(right_),
+        dir(dir_),
+        type(std::move(type_)),
         kind(kind_) {}
 
   std::string name;
@@ -82,16 +86,15 @@ const Design kVhdl{
      {"INIT", "std_logic_vector(WIDTH-1 downto 0)", "(others => '0')", "(others => '0')"}},
     "library ieee;\nuse ieee.std_logic_1164.all;\n"};
 
-const Design kVerilog{
-    DesignLanguage::Verilog,
-    {{"clk", -1, -1, 'I', "wire", K::Bit},
-     {"d", 7, 0, 'I', "logic [W-1:0]", K::BitVector},
-     {"q", -1, -1, 'O', "logic", K::Bit},
-     {"io", -1, -1, 'B', "wire", K::Bit},
-     {"s", -1, -1, 'B', "bus_if.slave", K::Interface},
-     withMode({"r", -1, -1, 'O', "int", K::Integer}, PortMode::Ref)},
-    {{"W", "", "8", "8"}, {"T", "int unsigned", "4", "4"}},
-    "import axi_pkg::*;\n"};
+const Design kVerilog{DesignLanguage::Verilog,
+                      {{"clk", -1, -1, 'I', "wire", K::Bit},
+                       {"d", 7, 0, 'I', "logic [W-1:0]", K::BitVector},
+                       {"q", -1, -1, 'O', "logic", K::Bit},
+                       {"io", -1, -1, 'B', "wire", K::Bit},
+                       {"s", -1, -1, 'B', "bus_if.slave", K::Interface},
+                       withMode({"r", -1, -1, 'O', "int", K::Integer}, PortMode::Ref)},
+                      {{"W", "", "8", "8"}, {"T", "int unsigned", "4", "4"}},
+                      "import axi_pkg::*;\n"};
 
 const std::string kProblem =
     "std_logic_vector(WIDTH-1 downto 0): generic WIDTH has no default; give it with -g "
@@ -108,8 +111,8 @@ const Design kUnknown{
     ""};
 
 std::string rangeError(int line, const std::string& port, const std::string& problem) {
-  return "Error - Template file line " + std::to_string(line) + " needs the range of port " +
-         port + ", which could not be evaluated:\n" + problem + "\n";
+  return "Error - Template file line " + std::to_string(line) + " needs the range of port " + port +
+         ", which could not be evaluated:\n" + problem + "\n";
 }
 
 struct Row {
@@ -156,8 +159,7 @@ INSTANTIATE_TEST_SUITE_P(
             "INIT : std_logic_vector(WIDTH-1 downto 0) := (others => '0') -- (others => '0')",
             ""},
         Row{"VerilogParameterList", &kVerilog,
-            "#(@ITERATE@%generic%.@ITERATOR@(@GENERIC_VALUE@)@ENDITERATE@)", "#(.W(8), .T(4))",
-            ""},
+            "#(@ITERATE@%generic%.@ITERATOR@(@GENERIC_VALUE@)@ENDITERATE@)", "#(.W(8), .T(4))", ""},
         Row{"NamesTakeCaseValuesDoNot", &kVhdl,
             "@UPCASE@@ITERATE@%GENERIC%@LOWCASE@@ITERATOR@=@GENERIC_VALUE@@ENDITERATE@",
             "width=16, mode=\"fast\", init=(others => '0')", ""},
@@ -178,8 +180,9 @@ INSTANTIATE_TEST_SUITE_P(
         Row{"PortWordInGenericBody", &kVhdl, "@ITERATE@%GENERIC%@PORT_TYPE@@ENDITERATE@", "",
             errorAt(1, "@PORT_TYPE@" + kPortsOnly)},
         Row{"PortListInGenericBody", &kVhdl, "@ITERATE@%GENERIC%%port%@ENDITERATE@", "",
-            errorAt(1, "Variables: %IPORT% %OBPORT% %OPORT% %BPORT% %PORT% %NODE% %SIGNAL% are "
-                       "not valid within @ITERATE@")},
+            errorAt(1,
+                    "Variables: %IPORT% %OBPORT% %OPORT% %BPORT% %PORT% %NODE% %SIGNAL% are "
+                    "not valid within @ITERATE@")},
         Row{"NestedInPortBody", &kVhdl, "@ITERATE@%PORT%@ITERATE@%GENERIC%@ENDITERATE@", ", ",
             errorAt(1, "@ITERATE@ may not occur inside an @ITERATE@ body.")},
         Row{"Context", &kVhdl, "%context%entity",
@@ -217,9 +220,10 @@ INSTANTIATE_TEST_SUITE_P(
         Row{"IfKindOutside", &kVhdl, "@IFKIND bit@@ENDIF@", "",
             errorAt(1, "@IFKIND and @IFNKIND" + kPortsOnly)},
         Row{"IfKindUnknownName", &kOnePort, "@ITERATE@%PORT%@IFKIND bits@@ENDIF@@ENDITERATE@", "",
-            errorAt(1, "Invalid syntax for @IFKIND or @IFNKIND directive, must be of the form:\n"
-                       "@IFKIND KIND|KIND@ with KIND one of bit, vector, integer, record, array, "
-                       "enum, interface, other")},
+            errorAt(1,
+                    "Invalid syntax for @IFKIND or @IFNKIND directive, must be of the form:\n"
+                    "@IFKIND KIND|KIND@ with KIND one of bit, vector, integer, record, array, "
+                    "enum, interface, other")},
         Row{"TypeOutside", &kVhdl, "x\n@PORT_TYPE@", "x\n", errorAt(2, "@PORT_TYPE@" + kPortsOnly)},
         Row{"TypeDecKeepsDeclaredTypeOfNonBitPorts", &kVhdl,
             "@SET SIGDELIM=;@@ITERATE@%SIGNAL%@VHDL_TYPEDEC@@ENDITERATE@",
@@ -232,14 +236,13 @@ INSTANTIATE_TEST_SUITE_P(
     rowName);
 
 // Generics with and without default and type, ports with and without declared type.
-const Design kDeclared{DesignLanguage::Verilog,
-                       {{"clk", -1, -1, 'I', "wire", K::Bit},
-                        {"d", 1, 0, 'I', "", K::Other},
-                        {"q", -1, -1, 'O', "logic", K::Bit}},
-                       {{"WIDTH", "natural", "8", "8"},
-                        {"DEPTH", "positive", "", "16"},
-                        {"P", "", "4", "4"}},
-                       ""};
+const Design kDeclared{
+    DesignLanguage::Verilog,
+    {{"clk", -1, -1, 'I', "wire", K::Bit},
+     {"d", 1, 0, 'I', "", K::Other},
+     {"q", -1, -1, 'O', "logic", K::Bit}},
+    {{"WIDTH", "natural", "8", "8"}, {"DEPTH", "positive", "", "16"}, {"P", "", "4", "4"}},
+    ""};
 
 const Design kEmptyValue{DesignLanguage::Verilog, {}, {{"W", "", "", ""}}, ""};
 
@@ -267,15 +270,15 @@ INSTANTIATE_TEST_SUITE_P(
         Row{"NoDefault", &kDeclared,
             "@ITERATE@%GENERIC%@IFNDEFAULT@-g @ITERATOR@=@GENERIC_VALUE@@ENDIF@@ENDITERATE@",
             ", -g DEPTH=16, ", ""},
-        Row{"ValueNobodyGave", &kEmptyValue, "x\n@ITERATE@%GENERIC%@ITERATOR@ => @GENERIC_VALUE@@ENDITERATE@",
-            "x\nW => ",
+        Row{"ValueNobodyGave", &kEmptyValue,
+            "x\n@ITERATE@%GENERIC%@ITERATOR@ => @GENERIC_VALUE@@ENDITERATE@", "x\nW => ",
             "Error - Template file line 2 needs the value of generic W, which has neither a "
             "default nor a -g value; give one with -g W=VALUE\n"},
         Row{"VerilogParameterTypes", &kDeclared,
             "@ITERATE@%GENERIC%parameter @IFTYPED@@GENERIC_TYPE@ @ENDIF@@ITERATOR@@ENDITERATE@",
             "parameter natural WIDTH, parameter positive DEPTH, parameter P", ""},
-        Row{"UntypedGeneric", &kDeclared, "@ITERATE@%GENERIC%@IFNTYPED@@ITERATOR@@ENDIF@@ENDITERATE@",
-            ", , P", ""},
+        Row{"UntypedGeneric", &kDeclared,
+            "@ITERATE@%GENERIC%@IFNTYPED@@ITERATOR@@ENDIF@@ENDITERATE@", ", , P", ""},
         Row{"PortTypes", &kDeclared,
             "@ITERATE@%SIGNAL%@IFTYPED@@PORT_TYPE@ @ENDIF@@IFNTYPED@? @ENDIF@@ITERATOR@"
             "@ENDITERATE@",
@@ -295,16 +298,16 @@ INSTANTIATE_TEST_SUITE_P(
         Row{"NoDefaultInPortBody", &kDeclared, "@ITERATE@%PORT%@IFNDEFAULT@@ENDIF@@ENDITERATE@",
             ", ", errorAt(1, kDefaultOnly)},
         Row{"TypedOutside", &kDeclared, "x\n@IFNTYPED@", "x\n", errorAt(2, kTypedOnly)},
-        Row{"WordTakesNoArgument", &kDeclared,
-            "@ITERATE@%GENERIC%@IFDEFAULT x@@ENDIF@@ENDITERATE@", "",
-            errorAt(1, "Keyword: @IFDEFAULT x@ is not a valid Variable or Directive name.")}),
+        Row{"WordTakesNoArgument", &kDeclared, "@ITERATE@%GENERIC%@IFDEFAULT x@@ENDIF@@ENDITERATE@",
+            "", errorAt(1, "Keyword: @IFDEFAULT x@ is not a valid Variable or Directive name.")}),
     rowName);
 
 const std::string kIfPortForm = errorAt(
     1, "Invalid syntax for @IFPORT or @IFNPORT directive, must be of the form:\n@IFPORT PATTERN@");
-const std::string kIfPortAlternative = errorAt(
-    1, "Invalid syntax for @IFPORT or @IFNPORT directive, an alternative is empty:\n"
-       "@IFPORT PATTERN|PATTERN@");
+const std::string kIfPortAlternative =
+    errorAt(1,
+            "Invalid syntax for @IFPORT or @IFNPORT directive, an alternative is empty:\n"
+            "@IFPORT PATTERN|PATTERN@");
 
 INSTANTIATE_TEST_SUITE_P(
     IfPort, DesignWordsTest,
@@ -338,8 +341,8 @@ INSTANTIATE_TEST_SUITE_P(
         Row{"AlternativesFollowCaseRule", &kOnePort,
             "@SET CASESENSITIVEIF=OFF@@ITERATE@%PORT%@IFPORT x|CLK_IN@y@ENDIF@@ENDITERATE@", "y",
             ""},
-        Row{"EmptyAlternativeBetween", &kOnePort,
-            "@ITERATE@%PORT%@IFPORT a||b@@ENDIF@@ENDITERATE@", "", kIfPortAlternative},
+        Row{"EmptyAlternativeBetween", &kOnePort, "@ITERATE@%PORT%@IFPORT a||b@@ENDIF@@ENDITERATE@",
+            "", kIfPortAlternative},
         Row{"EmptyLastAlternative", &kOnePort, "@ITERATE@%PORT%@IFPORT a|@@ENDIF@@ENDITERATE@", "",
             kIfPortAlternative},
         Row{"LoneBar", &kOnePort, "@ITERATE@%PORT%@IFPORT |@@ENDIF@@ENDITERATE@", "",
@@ -355,16 +358,33 @@ struct GlobRow {
 
 TEST(IfPort, Patterns) {
   const GlobRow rows[] = {
-      {"clk", "clk", true},       {"clk", "clk*", true},      {"clk_a", "clk*", true},
-      {"sclk", "clk*", false},    {"sys_clk", "*_clk", true}, {"clk", "*_clk", false},
-      {"rst_n", "*_n", true},     {"rst_n", "r?t_?", true},   {"rst", "r?t_?", false},
-      {"a", "?", true},           {"", "*", true},            {"ab", "?", false},
-      {"abcbc", "a*bc", true},    {"abcbd", "a*bc", false},   {"aXbXc", "*X*X*", true},
-      {"aXb", "*X*X*", false},    {"a*b", "a\\*b", false},    {"mississippi", "*ss*ss*i", true},
-      {"Data", "data", false},    {"data", "d**a", true},     {"x", "", false},
-      {"sys_clk", "clk*|*clk", true},   {"x_clk_i", "clk*|*clk|*_clk_i", true},
-      {"clkx", "a|*x", true},           {"b", "a|b", true},
-      {"a|b", "a|b", false},            {"ab", "a|b", false},
+      {"clk", "clk", true},
+      {"clk", "clk*", true},
+      {"clk_a", "clk*", true},
+      {"sclk", "clk*", false},
+      {"sys_clk", "*_clk", true},
+      {"clk", "*_clk", false},
+      {"rst_n", "*_n", true},
+      {"rst_n", "r?t_?", true},
+      {"rst", "r?t_?", false},
+      {"a", "?", true},
+      {"", "*", true},
+      {"ab", "?", false},
+      {"abcbc", "a*bc", true},
+      {"abcbd", "a*bc", false},
+      {"aXbXc", "*X*X*", true},
+      {"aXb", "*X*X*", false},
+      {"a*b", "a\\*b", false},
+      {"mississippi", "*ss*ss*i", true},
+      {"Data", "data", false},
+      {"data", "d**a", true},
+      {"x", "", false},
+      {"sys_clk", "clk*|*clk", true},
+      {"x_clk_i", "clk*|*clk|*_clk_i", true},
+      {"clkx", "a|*x", true},
+      {"b", "a|b", true},
+      {"a|b", "a|b", false},
+      {"ab", "a|b", false},
       {"a|b", "a?b", true},
   };
   for (const GlobRow& row : rows) {
@@ -394,8 +414,8 @@ INSTANTIATE_TEST_SUITE_P(
             "std_logic_vector(3 downto 0)|yen, d",
             ""},
         Row{"ShowRange", &kUnknown, "@SHOWRANGE@%iport%", "en, ", kDataError},
-        Row{"ShowRangeInIteration", &kUnknown,
-            "@ITERATE@%IPORT%@SHOWRANGE@@ITERATOR@@ENDITERATE@", "en, ", kDataError},
+        Row{"ShowRangeInIteration", &kUnknown, "@ITERATE@%IPORT%@SHOWRANGE@@ITERATOR@@ENDITERATE@",
+            "en, ", kDataError},
         Row{"ExpandBus", &kUnknown, "@EXPANDBUS@%iport%", "en", kDataError},
         Row{"ExpandBusIteration", &kUnknown, "@EXPANDBUS@@ITERATE@%IPORT%x@ENDITERATE@", "x",
             kDataError},

@@ -112,10 +112,11 @@ TEST(KeywordTable, SortedPrefixFreeAndFoundIgnoringCase) {
   EXPECT_TRUE(keywordWord(-1).empty());
   EXPECT_TRUE(keywordWord(kKeywordCount).empty());
   const std::pair<const char*, int> lookups[] = {
-      {"@settings@", kKwSet},      {"@commentary@", kKwComment}, {"@map@", kKwMap},
-      {"@mapx@", kKwNoMatch},      {"%", kKwNoMatch},            {"%\x80%", kKwNoMatch},
-      {"@se", kKwNoMatch},         {"text", kKwPlainText},       {"", kKwPlainText},
-      {" %module%", kKwPlainText}};
+      {"@settings@", kKwSet}, {"@commentary@", kKwComment},
+      {"@map@", kKwMap},      {"@mapx@", kKwNoMatch},
+      {"%", kKwNoMatch},      {"%\x80%", kKwNoMatch},
+      {"@se", kKwNoMatch},    {"text", kKwPlainText},
+      {"", kKwPlainText},     {" %module%", kKwPlainText}};
   for (const auto& [token, index] : lookups) EXPECT_EQ(lookupKeyword(token), index) << token;
 }
 
@@ -128,7 +129,7 @@ TEST(SignalName, PatternsAndCase) {
   };
   const NameRow rows[] = {
       {"data", "*", true, true},      {"", "*", true, true},         {"data", "d?t?", true, true},
-      {"data", "?????", true, false}, {"data", "???", true, false},   {"data", "d*", true, false},
+      {"data", "?????", true, false}, {"data", "???", true, false},  {"data", "d*", true, false},
       {"d*", "d*", true, true},       {"data", "**", true, false},   {"Data", "data", true, false},
       {"Data", "dATA", false, true},  {"Da?a", "da?a", false, true}, {"a[b", "A{B", false, false}};
   StbDataList data(nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr, nullptr);
@@ -277,8 +278,9 @@ TEST(NameSearch, AgreesWithAWalkOverAllPorts) {
 TEST(TokenReader, TokenLengthIsBounded) {
   const std::string limit(TokenReader::kMaxTokenSize, 'x');
   const std::string tooLong = handlers_test::errorAt(
-      1, "Token: the token that starts on line 1 is longer than the limit of 16777216 bytes "
-         "(16 MB).");
+      1,
+      "Token: the token that starts on line 1 is longer than the limit of 16777216 bytes "
+      "(16 MB).");
   struct BoundRow {
     std::string templateText;
     size_t outputSize;
@@ -288,8 +290,9 @@ TEST(TokenReader, TokenLengthIsBounded) {
       {limit, limit.size(), handlers_test::kNoError},
       {limit + "x", 0, tooLong},
       {"a\n%" + limit + "%", 2,
-       handlers_test::errorAt(2, "Token: the token that starts on line 2 is longer than the "
-                                 "limit of 16777216 bytes (16 MB).")},
+       handlers_test::errorAt(2,
+                              "Token: the token that starts on line 2 is longer than the "
+                              "limit of 16777216 bytes (16 MB).")},
       {"@ITERATE@%" + limit, 0, tooLong},
       {"@ITERATE@%PORT%" + limit + "x@ENDITERATE@", 0, tooLong},
   };

@@ -24,7 +24,7 @@ TEST_P(ExpansionWalkTest, OneRecordVisitsEveryBitAndStaysDone) {
   PortRecord bus("bus", c.left, c.right, 'O');
   bus.setMappedName("before");
   ExpansionList bits(bus);
-  bus.setMappedName("after");  // the bits keep the name the bus had when they were made
+  bus.setMappedName("after");             // the bits keep the name the bus had when they were made
   for (int pass = 0; pass < 2; ++pass) {  // first() starts the walk over
     PortRecord* const record = bits.first();
     std::vector<int32_t> seen;
@@ -41,11 +41,13 @@ TEST_P(ExpansionWalkTest, OneRecordVisitsEveryBitAndStaysDone) {
   }
 }
 
-INSTANTIATE_TEST_SUITE_P(
-    Ranges, ExpansionWalkTest,
-    ::testing::Values(WalkCase{"falling", 2, 0, {2, 1, 0}}, WalkCase{"rising", 0, 2, {0, 1, 2}},
-                      WalkCase{"one_bit", 4, 4, {4}}),
-    [](const ::testing::TestParamInfo<WalkCase>& info) { return std::string(info.param.name); });
+INSTANTIATE_TEST_SUITE_P(Ranges, ExpansionWalkTest,
+                         ::testing::Values(WalkCase{"falling", 2, 0, {2, 1, 0}},
+                                           WalkCase{"rising", 0, 2, {0, 1, 2}},
+                                           WalkCase{"one_bit", 4, 4, {4}}),
+                         [](const ::testing::TestParamInfo<WalkCase>& info) {
+                           return std::string(info.param.name);
+                         });
 
 // Every bit of a wide bus in order, then the port after it, in both kinds of walk.
 TEST(WideBus, ListAndIterationWriteEveryBit) {

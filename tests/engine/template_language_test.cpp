@@ -59,8 +59,9 @@ INSTANTIATE_TEST_SUITE_P(
         Row{"DoublePercent", kNone, "50%% off", "50", unknown("%%")},
         Row{"CommentCutByPercent", kNone, "a@comment 50% done@b", "a done", unknown("@b")},
         Row{"SettingsIsSet", kNone, "@settings@", "",
-            errorAt(1, "Invalid syntax for @SET directive, must be of the form: "
-                       "@SET STATE_VARIABLE=VALUE@")},
+            errorAt(1,
+                    "Invalid syntax for @SET directive, must be of the form: "
+                    "@SET STATE_VARIABLE=VALUE@")},
         Row{"StrayEndIterate", kNone, "a\n@ENDITERATE@b", "a\n",
             errorAt(2, "@ENDITERATE@ keyword encountered without a matching @ITERATE@.")},
         Row{"TypeDecOutsideIterate", kNone, "a@vhdl_typedec@", "a",
@@ -105,9 +106,11 @@ INSTANTIATE_TEST_SUITE_P(
             "[1:0] d|d|d[1:0]|[1:0] d", ""},
         Row{"MapSwitch", kSmallBus, "@MAPSIGNAL q TO r@@SET map=on@%oport%@SET Map=OFF@%oport%",
             "rq", ""},
-        Row{"CaseValues", {{"Data", -1, -1, 'I'}},
+        Row{"CaseValues",
+            {{"Data", -1, -1, 'I'}},
             "@SET case=invcase@%port%|@SET CASE=LOWCASE@%port%|@UPCASE@@SET case=samecase@%port%",
-            "dATA|data|Data", ""},
+            "dATA|data|Data",
+            ""},
         Row{"NoBlankAfterWord", kNone, "x@SETsigdelim=;@", "x", errorAt(1, kSetForm)},
         Row{"NewlineAfterWord", kNone, "@SET\nsigdelim=;@", "", errorAt(2, kSetForm)},
         Row{"BlankThenEnd", kNone, "@SET ", "", errorAt(1, kSetForm)},
@@ -128,25 +131,27 @@ INSTANTIATE_TEST_SUITE_P(
 // width.
 INSTANTIATE_TEST_SUITE_P(
     Wrapping, TemplateTest,
-    ::testing::Values(
-        Row{"BreaksAfterDelimiter", kAbcd, "@SET outlinewidth=5@%iport%", "a, b, \nc, d", ""},
-        Row{"HeaderValueEqualToDelimiter", kNone,
-            "@SET sigdelim=vhd@@SET outlinewidth=3@ab%ext%c", "abvhd\nc", ""},
-        Row{"OnlyWholeDelimiterCounts", kNone, "@SET outlinewidth=0@, x@SET sigdelim=VHD@%ext%",
-            ", xvhd", ""},
-        Row{"SuppressedDelimiterStillBreaks", kNone,
-            "@SUPPRESNEWLINE@@SET outlinewidth=0@@SET sigdelim=\n@%ext%\n%ext%\tx\n", "vhd\nvhdx",
-            ""},
-        Row{"EmptyDelimiterMatchesEmptyWrites", kAbc,
-            "@SET outlinewidth=-1@@SET sigdelim=@%iport%", "a\nb\nc\n", ""}),
+    ::testing::Values(Row{"BreaksAfterDelimiter", kAbcd, "@SET outlinewidth=5@%iport%",
+                          "a, b, \nc, d", ""},
+                      Row{"HeaderValueEqualToDelimiter", kNone,
+                          "@SET sigdelim=vhd@@SET outlinewidth=3@ab%ext%c", "abvhd\nc", ""},
+                      Row{"OnlyWholeDelimiterCounts", kNone,
+                          "@SET outlinewidth=0@, x@SET sigdelim=VHD@%ext%", ", xvhd", ""},
+                      Row{"SuppressedDelimiterStillBreaks", kNone,
+                          "@SUPPRESNEWLINE@@SET outlinewidth=0@@SET sigdelim=\n@%ext%\n%ext%\tx\n",
+                          "vhd\nvhdx", ""},
+                      Row{"EmptyDelimiterMatchesEmptyWrites", kAbc,
+                          "@SET outlinewidth=-1@@SET sigdelim=@%iport%", "a\nb\nc\n", ""}),
     rowName);
 
-const std::string kIfForm = errorAt(
-    1, "Invalid syntax for @IFHAS or @IFNHAS directive, must be of the form:\n"
-       "@IFHAS SIGNALTYPE=SIGNALNAME@");
-const std::string kIfType = errorAt(
-    1, "Invalid syntax for @IFHAS or @IFNHAS directive, SIGNALTYPE must be one of:\n"
-       "IPORT, OBPORT, OPORT, BPORT, PORT, NODE, SIGNAL.");
+const std::string kIfForm =
+    errorAt(1,
+            "Invalid syntax for @IFHAS or @IFNHAS directive, must be of the form:\n"
+            "@IFHAS SIGNALTYPE=SIGNALNAME@");
+const std::string kIfType =
+    errorAt(1,
+            "Invalid syntax for @IFHAS or @IFNHAS directive, SIGNALTYPE must be one of:\n"
+            "IPORT, OBPORT, OPORT, BPORT, PORT, NODE, SIGNAL.");
 const std::string kDepth =
     errorAt(1, "Maximum number of nested @IFHAS or @IFNHAS directives exceeded.");
 const std::string kEndIf = "@ENDIF@ directive encountered without a matching @IFHAS or @IFNHAS.";
@@ -237,31 +242,47 @@ INSTANTIATE_TEST_SUITE_P(
     PortLists, TemplateTest,
     ::testing::Values(
         Row{"OnePortOrNone", {{"a", -1, -1, 'I'}}, "[%iport%][%oport%]", "[a][]", ""},
-        Row{"NodesOnlyInNodeAndSignal", {{"a", -1, -1, 'I'}, {"nb", 1, 0, 'N'}},
-            "%node%;%signal%;%port%;%busport%", "nb;a, nb;a;", ""},
-        Row{"KeepsListOrder", {{"x", -1, -1, 'O'}, {"y", -1, -1, 'B'}, {"z", -1, -1, 'O'}},
-            "%obport%", "x, y, z", ""},
+        Row{"NodesOnlyInNodeAndSignal",
+            {{"a", -1, -1, 'I'}, {"nb", 1, 0, 'N'}},
+            "%node%;%signal%;%port%;%busport%",
+            "nb;a, nb;a;",
+            ""},
+        Row{"KeepsListOrder",
+            {{"x", -1, -1, 'O'}, {"y", -1, -1, 'B'}, {"z", -1, -1, 'O'}},
+            "%obport%",
+            "x, y, z",
+            ""},
         Row{"RangesAndBits",
             {{"d", 1, 0, 'I'}, {"a", 0, 1, 'I'}, {"en", -1, -1, 'I'}, {"x", 0, 0, 'I'}},
             "@SHOWRANGE@%port%|@SET SHOWRANGE=AsPostfix@%port%|@EXPANDBUS@%port%",
             "[1:0] d, [0:1] a, en, [0:0] x|d[1:0], a[0:1], en, x[0:0]|"
             "d_1_, d_0_, a_0_, a_1_, en, x_0_",
             ""},
-        Row{"EmptyBrackets", {{"d", 7, 6, 'I'}}, "@SET BUSLEFT=@@SET BUSRIGHT=@@EXPANDBUS@%port%",
-            "d7, d6", ""},
-        Row{"NegativeIndices", {{"n", 3, -2, 'I'}},
-            "@EXPANDBUS@%port%|@NOEXPANDBUS@@SHOWRANGE@%port%",
-            "n_3_, n_2_, n_1_, n_0_, n, n_-2_|[3:-2] n", ""},
-        Row{"RangeEnds", {{"h", INT_MAX - 1, INT_MAX, 'I'}, {"l", INT_MIN + 1, INT_MIN, 'I'}},
-            "@EXPANDBUS@%port%", "h_2147483646_, h_2147483647_, l_-2147483647_, l_-2147483648_",
+        Row{"EmptyBrackets",
+            {{"d", 7, 6, 'I'}},
+            "@SET BUSLEFT=@@SET BUSRIGHT=@@EXPANDBUS@%port%",
+            "d7, d6",
             ""},
-        Row{"CaseSparesDelimiter", {{"Data", -1, -1, 'I'}, {"x", -1, -1, 'I'}},
-            "@INVCASE@@SET SIGDELIM=aB@%port%", "dATAaBX", ""}),
+        Row{"NegativeIndices",
+            {{"n", 3, -2, 'I'}},
+            "@EXPANDBUS@%port%|@NOEXPANDBUS@@SHOWRANGE@%port%",
+            "n_3_, n_2_, n_1_, n_0_, n, n_-2_|[3:-2] n",
+            ""},
+        Row{"RangeEnds",
+            {{"h", INT_MAX - 1, INT_MAX, 'I'}, {"l", INT_MIN + 1, INT_MIN, 'I'}},
+            "@EXPANDBUS@%port%",
+            "h_2147483646_, h_2147483647_, l_-2147483647_, l_-2147483648_",
+            ""},
+        Row{"CaseSparesDelimiter",
+            {{"Data", -1, -1, 'I'}, {"x", -1, -1, 'I'}},
+            "@INVCASE@@SET SIGDELIM=aB@%port%",
+            "dATAaBX",
+            ""}),
     rowName);
 
 const Ports kTyped = {{"en", -1, -1, 'I'}, {"data", 7, 0, 'I'}, {"addr", 0, 3, 'I'}};
-const std::string kIterator = errorAt(
-    1, "Iterator must be one of: %IPORT% %OBPORT% %OPORT% %BPORT% %PORT% %NODE% %SIGNAL%");
+const std::string kIterator =
+    errorAt(1, "Iterator must be one of: %IPORT% %OBPORT% %OPORT% %BPORT% %PORT% %NODE% %SIGNAL%");
 const std::string kUnterminated = "@ITERATE@ must be terminated by @ENDITERATE@!";
 
 INSTANTIATE_TEST_SUITE_P(
@@ -276,24 +297,35 @@ INSTANTIATE_TEST_SUITE_P(
             "@ITERATE@%IPORT%@ITERATOR@@SET SIGDELIM=;@@ENDITERATE@|%iport%", "a;b;c|a;b;c", ""},
         Row{"CaseFromBodyPersists", kAbc, "@ITERATE@%IPORT%@ITERATOR@@UPCASE@@ENDITERATE@",
             "a, B, C", ""},
-        Row{"BodyKeepsBlanks", {{"a", -1, -1, 'I'}},
-            "@ITERATE@%IPORT% @ITERATOR@\t@TAB@\n@ENDITERATE@", " a\t\t\n", ""},
+        Row{"BodyKeepsBlanks",
+            {{"a", -1, -1, 'I'}},
+            "@ITERATE@%IPORT% @ITERATOR@\t@TAB@\n@ENDITERATE@",
+            " a\t\t\n",
+            ""},
         Row{"VhdlTypes", kTyped,
             "@SET VHDL_BUSTYPE=bit_vector@@SET VHDL_NETTYPE=bit@@SET SIGDELIM=\n@"
             "@ITERATE@%IPORT%@ITERATOR@ : in @VHDL_TYPEDEC@;@ENDITERATE@",
             "en : in bit;\ndata : in bit_vector(7 downto 0);\naddr : in bit_vector(0 to 3);", ""},
-        Row{"VhdlBounds", {{"z", 0, 0, 'I'}, {"n", 3, -2, 'I'}},
+        Row{"VhdlBounds",
+            {{"z", 0, 0, 'I'}, {"n", 3, -2, 'I'}},
             "@ITERATE@%IPORT%@VHDL_TYPEDEC@@ENDITERATE@",
-            "std_logic_vector(0 to 0), std_logic_vector(3 downto -2)", ""},
-        Row{"VhdlExpandedBits", {{"d", 7, 6, 'I'}},
+            "std_logic_vector(0 to 0), std_logic_vector(3 downto -2)",
+            ""},
+        Row{"VhdlExpandedBits",
+            {{"d", 7, 6, 'I'}},
             "@EXPANDBUS@@ITERATE@%IPORT%@VHDL_TYPEDEC@@ENDITERATE@",
-            "std_logic_vector(7 to 7), std_logic_vector(6 to 6)", ""},
-        Row{"VhdlTypesIgnoreCase", {{"data", 7, 0, 'I'}},
+            "std_logic_vector(7 to 7), std_logic_vector(6 to 6)",
+            ""},
+        Row{"VhdlTypesIgnoreCase",
+            {{"data", 7, 0, 'I'}},
             "@UPCASE@@ITERATE@%IPORT%@ITERATOR@ : @VHDL_TYPEDEC@@ENDITERATE@",
-            "DATA : std_logic_vector(7 downto 0)", ""},
-        Row{"VhdlPieceEqualToDelimiterWraps", {{"d", 1, 0, 'I'}},
+            "DATA : std_logic_vector(7 downto 0)",
+            ""},
+        Row{"VhdlPieceEqualToDelimiterWraps",
+            {{"d", 1, 0, 'I'}},
             "@SET SIGDELIM=(@@SET OUTLINEWIDTH=0@@ITERATE@%IPORT%@VHDL_TYPEDEC@@ENDITERATE@",
-            "std_logic_vector(\n1 downto 0)", ""},
+            "std_logic_vector(\n1 downto 0)",
+            ""},
         Row{"ConditionalPerPass", kDesign,
             "@ITERATE@%PORT%@IFHAS IPORT=clk@+@ENDIF@@ITERATOR@@ENDITERATE@", "+clk, +data, +q",
             ""},
@@ -318,13 +350,13 @@ INSTANTIATE_TEST_SUITE_P(
         Row{"UnterminatedBody", kAbc, "z@ITERATE@%PORT%@ITERATOR@\nx\n", "z",
             errorAt(3, kUnterminated)},
         Row{"PortListInBody", kAbc, "@ITERATE@%PORT%x%port%y@ENDITERATE@z", "x, ",
-            errorAt(1, "Variables: %IPORT% %OBPORT% %OPORT% %BPORT% %PORT% %NODE% %SIGNAL% are "
-                       "not valid within @ITERATE@")},
+            errorAt(1,
+                    "Variables: %IPORT% %OBPORT% %OPORT% %BPORT% %PORT% %NODE% %SIGNAL% are "
+                    "not valid within @ITERATE@")},
         Row{"ReplayErrorOnEndIterateLine", kAbc,
             "\n@ITERATE@%PORT%\n@ITERATOR@\n@FOO@\nx\n@ENDITERATE@\n", "\n\na\n, ",
             errorAt(6, "Keyword: @FOO@ is not a valid Variable or Directive name.")},
-        Row{"SecondEndIterateIsStray", kAbc, "@ITERATE@%PORT%x@ENDITERATE@@ENDITERATE@",
-            "x, x, x",
+        Row{"SecondEndIterateIsStray", kAbc, "@ITERATE@%PORT%x@ENDITERATE@@ENDITERATE@", "x, x, x",
             errorAt(1, "@ENDITERATE@ keyword encountered without a matching @ITERATE@.")}),
     rowName);
 

@@ -34,11 +34,11 @@ inline bool inCi() {
 // A missing reference tool skips the test on a laptop but fails it under CI=true, so that a
 // broken install step cannot turn the suite green. Use in the body of a TEST.
 #define DIFFTEST_REQUIRE_TOOL(path, name)                                      \
-  do {                                                                          \
-    if ((path).empty()) {                                                       \
+  do {                                                                         \
+    if ((path).empty()) {                                                      \
       if (difftest::inCi()) FAIL() << (name) << " is not installed (CI=true)"; \
-      GTEST_SKIP() << (name) << " is not installed";                            \
-    }                                                                           \
+      GTEST_SKIP() << (name) << " is not installed";                           \
+    }                                                                          \
   } while (false)
 
 struct ToolRun {
@@ -49,8 +49,7 @@ struct ToolRun {
 /// Runs `argv` (argv[0] a full path) in `workDir` when one is given.
 inline ToolRun runTool(const std::vector<std::string>& argv, const std::string& workDir = "",
                        unsigned timeoutSeconds = 120) {
-  pinforge_test::RunResult run =
-      pinforge_test::runProgram(argv, workDir, {}, true, timeoutSeconds);
+  pinforge_test::RunResult run = pinforge_test::runProgram(argv, workDir, {}, true, timeoutSeconds);
   return {run.status, std::move(run.out)};
 }
 

@@ -45,7 +45,8 @@ inline std::string readBack(std::FILE* file) {
   std::rewind(file);
   std::string text;
   char buffer[8192];
-  for (size_t got; (got = std::fread(buffer, 1, sizeof buffer, file)) > 0;) text.append(buffer, got);
+  for (size_t got; (got = std::fread(buffer, 1, sizeof buffer, file)) > 0;)
+    text.append(buffer, got);
   return text;
 }
 

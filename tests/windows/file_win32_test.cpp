@@ -7,8 +7,8 @@
 #include <set>
 #include <string>
 
-#include "platform/hostkit.h"
 #include "hostkit/wide_text-win32.h"
+#include "platform/hostkit.h"
 #include "windows/scratch_folder.h"
 
 namespace {
@@ -34,8 +34,8 @@ TEST(FileWin32, TemporaryFilesAreNewUniqueAndBinary) {
     EXPECT_GE(std::fputs("a\nb\r\n", stream), 0);
     std::fclose(stream);
     WIN32_FILE_ATTRIBUTE_DATA data{};
-    ASSERT_TRUE(::GetFileAttributesExW(Host::win32::widen(name).c_str(), GetFileExInfoStandard,
-                                       &data));
+    ASSERT_TRUE(
+        ::GetFileAttributesExW(Host::win32::widen(name).c_str(), GetFileExInfoStandard, &data));
     EXPECT_EQ(data.nFileSizeLow, 5u);
     names.insert(name);
     EXPECT_TRUE(File::remove(name.c_str()));
@@ -73,7 +73,8 @@ std::string readAll(const std::string& path) {
   std::FILE* in = std::fopen(path.c_str(), "rb");
   if (in == nullptr) return "<missing>";
   char buffer[256];
-  for (size_t got; (got = std::fread(buffer, 1, sizeof buffer, in)) > 0;) content.append(buffer, got);
+  for (size_t got; (got = std::fread(buffer, 1, sizeof buffer, in)) > 0;)
+    content.append(buffer, got);
   std::fclose(in);
   return content;
 }

@@ -11,8 +11,8 @@
 #include <string_view>
 #include <vector>
 
-#include "platform/hostkit.h"
 #include "hostkit/wide_text-win32.h"
+#include "platform/hostkit.h"
 #include "windows/scratch_folder.h"
 
 namespace {
@@ -85,8 +85,8 @@ class PathChange {
  public:
   explicit PathChange(const std::wstring& value) {
     m_Saved.resize(32768);
-    m_Saved.resize(::GetEnvironmentVariableW(L"PATH", m_Saved.data(),
-                                             static_cast<DWORD>(m_Saved.size())));
+    m_Saved.resize(
+        ::GetEnvironmentVariableW(L"PATH", m_Saved.data(), static_cast<DWORD>(m_Saved.size())));
     ::SetEnvironmentVariableW(L"PATH", value.c_str());
   }
   ~PathChange() { ::SetEnvironmentVariableW(L"PATH", m_Saved.c_str()); }
@@ -117,7 +117,8 @@ TEST(ProcessWin32, ReturnsTheExitCode) {
 
 TEST(ProcessWin32, ArgumentsArriveAsGiven) {
   const std::vector<std::string> arguments = {
-      "plain", "two words", "a\\b", "c:\\dir with space\\", "quote\"inside", "", "\xc3\xa9t\xc3\xa9"};
+      "plain", "two words",        "a\\b", "c:\\dir with space\\", "quote\"inside",
+      "",      "\xc3\xa9t\xc3\xa9"};
   std::vector<std::string> argv = {ownPath()};
   argv.insert(argv.end(), arguments.begin(), arguments.end());
   std::string output;

@@ -35,8 +35,8 @@ class ScratchFolder {
     return Host::win32::narrow(m_Path) + "\\" + std::string(name);
   }
   bool write(std::string_view name, std::string_view content) const {
-    HANDLE handle = ::CreateFileW(Host::win32::widen(file(name)).c_str(), GENERIC_WRITE, 0,
-                                  nullptr, CREATE_ALWAYS, FILE_ATTRIBUTE_NORMAL, nullptr);
+    HANDLE handle = ::CreateFileW(Host::win32::widen(file(name)).c_str(), GENERIC_WRITE, 0, nullptr,
+                                  CREATE_ALWAYS, FILE_ATTRIBUTE_NORMAL, nullptr);
     if (handle == INVALID_HANDLE_VALUE) return false;
     DWORD written = 0;
     const bool ok = ::WriteFile(handle, content.data(), static_cast<DWORD>(content.size()),
@@ -46,8 +46,7 @@ class ScratchFolder {
     return ok;
   }
   bool exists(std::string_view name) const {
-    return ::GetFileAttributesW(Host::win32::widen(file(name)).c_str()) !=
-           INVALID_FILE_ATTRIBUTES;
+    return ::GetFileAttributesW(Host::win32::widen(file(name)).c_str()) != INVALID_FILE_ATTRIBUTES;
   }
 
  private:

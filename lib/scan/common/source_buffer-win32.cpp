@@ -9,8 +9,8 @@
 #include <cstring>
 #include <string>
 
-#include "scan/common/source_buffer.h"
 #include "hostkit/wide_text-win32.h"
+#include "scan/common/source_buffer.h"
 
 namespace scan {
 

@@ -36,7 +36,9 @@ class Value {
   bool isReal() const { return std::holds_alternative<double>(m_Data); }
   bool isBoolean() const { return std::holds_alternative<bool>(m_Data); }
   bool isString() const { return std::holds_alternative<std::string>(m_Data); }
-  bool isComposite() const { return std::holds_alternative<std::shared_ptr<const Composite>>(m_Data); }
+  bool isComposite() const {
+    return std::holds_alternative<std::shared_ptr<const Composite>>(m_Data);
+  }
   /// The width of an unsigned integer; 0 for every other value.
   int unsignedWidth() const { return m_UnsignedWidth; }
 
@@ -44,7 +46,9 @@ class Value {
   double asReal() const { return std::get<double>(m_Data); }
   bool asBoolean() const { return std::get<bool>(m_Data); }
   const std::string& asString() const { return std::get<std::string>(m_Data); }
-  const Composite& asComposite() const { return *std::get<std::shared_ptr<const Composite>>(m_Data); }
+  const Composite& asComposite() const {
+    return *std::get<std::shared_ptr<const Composite>>(m_Data);
+  }
 
   /// An integer, or a boolean as 0/1; nothing for reals, strings and none.
   std::optional<int64_t> toInteger() const;
@@ -54,8 +58,7 @@ class Value {
  private:
   template <typename T>
   explicit Value(T v) : m_Data(std::move(v)) {}
-  std::variant<std::monostate, int64_t, double, bool, std::string,
-               std::shared_ptr<const Composite>>
+  std::variant<std::monostate, int64_t, double, bool, std::string, std::shared_ptr<const Composite>>
       m_Data;
   int m_UnsignedWidth = 0;
 };

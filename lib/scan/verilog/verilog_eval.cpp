@@ -50,8 +50,7 @@ bool Evaluator::integer(const Expr& expr, Scope& scope, int64_t& out) {
 // wildcard imports (without following their own imports), then the compilation unit.
 template <typename Map>
 typename Map::mapped_type* Evaluator::findInScopes(const std::string& name, Scope& scope,
-                                                   Map Scope::*members, Scope*& owner,
-                                                   int depth) {
+                                                   Map Scope::*members, Scope*& owner, int depth) {
   if (depth > 8) return nullptr;
   auto it = (scope.*members).find(name);
   if (it != (scope.*members).end()) {

@@ -43,11 +43,10 @@ class Evaluator {
   bool eval(const Expr& expr, Scope& scope, Locals* locals, Value& out);
   /// Applies the binary operator `expr` to the value `a` of its left operand.
   bool binary(const Expr& expr, const Value& a, Scope& scope, Locals* locals, Value& out);
-  bool unsignedBinary(Op op, const Value& a, const Value& b, int64_t x, int64_t y,
-                      Value& out);
+  bool unsignedBinary(Op op, const Value& a, const Value& b, int64_t x, int64_t y, Value& out);
   bool convert(const TypeSpec& type, Scope& scope, Value& value);
-  bool evalElement(const Expr& select, const std::string& name, Parameter& parameter,
-                   Scope& owner, Scope& scope, Locals* locals, Value& out);
+  bool evalElement(const Expr& select, const std::string& name, Parameter& parameter, Scope& owner,
+                   Scope& scope, Locals* locals, Value& out);
   bool assignSelect(const Stmt& stmt, const Value& v, Scope& scope, Locals& locals);
   bool evalName(const Expr& expr, Scope& scope, Locals* locals, Value& out);
   bool evalParameter(const std::string& name, Parameter& parameter, Scope& owner, Value& out);

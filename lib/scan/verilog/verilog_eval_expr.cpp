@@ -47,7 +47,8 @@ uint64_t unsignedPower(uint64_t base, uint64_t exponent) {
 }  // namespace
 
 bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out) {
-  if (++m_Steps > limits::kVerilogEvalSteps) return fail("evaluation did not finish within the step limit");
+  if (++m_Steps > limits::kVerilogEvalSteps)
+    return fail("evaluation did not finish within the step limit");
   DepthGuard nesting(m_Nesting, limits::kVerilogEvalNesting);
   if (nesting.tooDeep()) return fail("evaluation is nested too deeply");
   switch (expr.kind) {
@@ -93,9 +94,9 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
       return eval(*expr.args[yes ? 1 : 2], scope, locals, out);
     }
     case Expr::Kind::Select: {
-      if (const Expr& base = *expr.args[0]; base.kind == Expr::Kind::Name &&
-                                            !(locals && base.scope.empty() &&
-                                              locals->count(base.name))) {
+      if (const Expr& base = *expr.args[0];
+          base.kind == Expr::Kind::Name &&
+          !(locals && base.scope.empty() && locals->count(base.name))) {
         Scope* owner = nullptr;
         Parameter* parameter = nullptr;
         if (base.scope.empty()) {
@@ -135,7 +136,8 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
       int64_t v = 0;
       if (!toInteger(operand, v)) return false;
       uint64_t u = static_cast<uint64_t>(v);
-      if (int w = operand.unsignedWidth(); w && (op == Op::Plus || op == Op::Minus || op == Op::BitNot)) {
+      if (int w = operand.unsignedWidth();
+          w && (op == Op::Plus || op == Op::Minus || op == Op::BitNot)) {
         out = unsignedValue(op == Op::Plus ? u : op == Op::Minus ? uint64_t{0} - u : ~u, w);
         return true;
       }
@@ -145,17 +147,26 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
         return true;
       }
       int64_t r = 0;
-      if (op == Op::Plus) r = v;
+      if (op == Op::Plus)
+        r = v;
       else if (op == Op::Minus) {
         if (!checkedSub(0, v, r)) return fail("arithmetic overflow");
-      } else if (op == Op::LogicalNot) r = v == 0;
-      else if (op == Op::BitNot) r = ~v;
-      else if (op == Op::BitAnd) r = u == ~uint64_t{0};
-      else if (op == Op::BitNand) r = u != ~uint64_t{0};
-      else if (op == Op::BitOr) r = u != 0;
-      else if (op == Op::BitNor) r = u == 0;
-      else if (op == Op::BitXor) r = std::popcount(u) & 1;
-      else r = !(std::popcount(u) & 1);
+      } else if (op == Op::LogicalNot)
+        r = v == 0;
+      else if (op == Op::BitNot)
+        r = ~v;
+      else if (op == Op::BitAnd)
+        r = u == ~uint64_t{0};
+      else if (op == Op::BitNand)
+        r = u != ~uint64_t{0};
+      else if (op == Op::BitOr)
+        r = u != 0;
+      else if (op == Op::BitNor)
+        r = u == 0;
+      else if (op == Op::BitXor)
+        r = std::popcount(u) & 1;
+      else
+        r = !(std::popcount(u) & 1);
       out = Value::integer(r);
       return true;
     }
@@ -183,48 +194,61 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
 
 // Unsigned operands make the operation unsigned at the wider operand's width (an integer
 // counts 32 bits), wrapping as Verilog does: with N = 32'd0, N - 1 is 4294967295.
-bool Evaluator::unsignedBinary(Op op, const Value& a, const Value& b, int64_t x,
-                               int64_t y, Value& out) {
-  bool selfSized = op == Op::ShiftLeft || op == Op::ShiftRight || op == Op::ArithShiftLeft || op == Op::ArithShiftRight || op == Op::Power;
+bool Evaluator::unsignedBinary(Op op, const Value& a, const Value& b, int64_t x, int64_t y,
+                               Value& out) {
+  bool selfSized = op == Op::ShiftLeft || op == Op::ShiftRight || op == Op::ArithShiftLeft ||
+                   op == Op::ArithShiftRight || op == Op::Power;
   int width = selfSized ? a.unsignedWidth() : std::max(operandWidth(a), operandWidth(b));
   uint64_t mask = lowMask(width);
   uint64_t ux = static_cast<uint64_t>(x) & mask, uy = static_cast<uint64_t>(y) & mask;
   if (isComparison(op)) {
-    bool result = op == Op::Less    ? ux < uy
-                  : op == Op::LessEqual ? ux <= uy
-                  : op == Op::Greater  ? ux > uy
+    bool result = op == Op::Less           ? ux < uy
+                  : op == Op::LessEqual    ? ux <= uy
+                  : op == Op::Greater      ? ux > uy
                   : op == Op::GreaterEqual ? ux >= uy
-                  : isInequality(op) ? ux != uy
-                                 : ux == uy;
+                  : isInequality(op)       ? ux != uy
+                                           : ux == uy;
     out = Value::integer(result);
     return true;
   }
   uint64_t r = 0;
-  if (op == Op::Plus) r = ux + uy;
-  else if (op == Op::Minus) r = ux - uy;
-  else if (op == Op::Times) r = ux * uy;
+  if (op == Op::Plus)
+    r = ux + uy;
+  else if (op == Op::Minus)
+    r = ux - uy;
+  else if (op == Op::Times)
+    r = ux * uy;
   else if (op == Op::Divide || op == Op::Modulo) {
     if (uy == 0) return fail("division by zero");
     r = op == Op::Divide ? ux / uy : ux % uy;
   } else if (op == Op::Power) {
-    if (y < 0 && !b.unsignedWidth()) r = ux == 1 ? 1 : 0;
-    else r = unsignedPower(ux, static_cast<uint64_t>(y));
-  } else if (op == Op::ShiftLeft || op == Op::ArithShiftLeft) r = y < 0 || y >= 64 ? 0 : ux << y;
-  else if (op == Op::ShiftRight || op == Op::ArithShiftRight) r = y < 0 || y >= 64 ? 0 : ux >> y;
-  else if (op == Op::BitAnd) r = ux & uy;
-  else if (op == Op::BitOr) r = ux | uy;
-  else if (op == Op::BitXor) r = ux ^ uy;
-  else if (op == Op::BitXnor || op == Op::BitXnorAlt) r = ~(ux ^ uy);
-  else return fail("unsupported operator '" + std::string(operatorText(op)) + "'");
+    if (y < 0 && !b.unsignedWidth())
+      r = ux == 1 ? 1 : 0;
+    else
+      r = unsignedPower(ux, static_cast<uint64_t>(y));
+  } else if (op == Op::ShiftLeft || op == Op::ArithShiftLeft)
+    r = y < 0 || y >= 64 ? 0 : ux << y;
+  else if (op == Op::ShiftRight || op == Op::ArithShiftRight)
+    r = y < 0 || y >= 64 ? 0 : ux >> y;
+  else if (op == Op::BitAnd)
+    r = ux & uy;
+  else if (op == Op::BitOr)
+    r = ux | uy;
+  else if (op == Op::BitXor)
+    r = ux ^ uy;
+  else if (op == Op::BitXnor || op == Op::BitXnorAlt)
+    r = ~(ux ^ uy);
+  else
+    return fail("unsupported operator '" + std::string(operatorText(op)) + "'");
   out = unsignedValue(r, width);
   return true;
 }
 
-bool Evaluator::binary(const Expr& expr, const Value& a, Scope& scope, Locals* locals,
-                       Value& out) {
+bool Evaluator::binary(const Expr& expr, const Value& a, Scope& scope, Locals* locals, Value& out) {
   Op op = expr.op;
   Value b;
-  if (op == Op::LogicalAnd || op == Op::LogicalOr) {  // short-circuit, as constant functions rely on it
+  if (op == Op::LogicalAnd ||
+      op == Op::LogicalOr) {  // short-circuit, as constant functions rely on it
     int64_t x = 0;
     bool left = a.isReal() ? a.asReal() != 0 : (toInteger(a, x) && x != 0);
     if (!m_Error.empty()) return false;
@@ -251,19 +275,25 @@ bool Evaluator::binary(const Expr& expr, const Value& a, Scope& scope, Locals* l
       out = Value::integer(compare(op, *x, *y));
       return true;
     }
-    if (op == Op::Plus) out = Value::real(*x + *y);
-    else if (op == Op::Minus) out = Value::real(*x - *y);
-    else if (op == Op::Times) out = Value::real(*x * *y);
+    if (op == Op::Plus)
+      out = Value::real(*x + *y);
+    else if (op == Op::Minus)
+      out = Value::real(*x - *y);
+    else if (op == Op::Times)
+      out = Value::real(*x * *y);
     else if (op == Op::Divide) {
       if (*y == 0) return fail("division by zero");
       out = Value::real(*x / *y);
-    } else if (op == Op::Power) out = Value::real(std::pow(*x, *y));
-    else return fail("operator '" + std::string(operatorText(op)) + "' needs integers");
+    } else if (op == Op::Power)
+      out = Value::real(std::pow(*x, *y));
+    else
+      return fail("operator '" + std::string(operatorText(op)) + "' needs integers");
     return true;
   }
   int64_t x = 0, y = 0, r = 0;
   if (!toInteger(a, x) || !toInteger(b, y)) return false;
-  bool selfSized = op == Op::ShiftLeft || op == Op::ShiftRight || op == Op::ArithShiftLeft || op == Op::ArithShiftRight || op == Op::Power;
+  bool selfSized = op == Op::ShiftLeft || op == Op::ShiftRight || op == Op::ArithShiftLeft ||
+                   op == Op::ArithShiftRight || op == Op::Power;
   if (selfSized ? a.unsignedWidth() != 0 : a.unsignedWidth() || b.unsignedWidth())
     return unsignedBinary(op, a, b, x, y, out);
   if (isComparison(op)) {
@@ -272,9 +302,12 @@ bool Evaluator::binary(const Expr& expr, const Value& a, Scope& scope, Locals* l
   }
   uint64_t ux = static_cast<uint64_t>(x);
   bool ok = true;
-  if (op == Op::Plus) ok = checkedAdd(x, y, r);
-  else if (op == Op::Minus) ok = checkedSub(x, y, r);
-  else if (op == Op::Times) ok = checkedMul(x, y, r);
+  if (op == Op::Plus)
+    ok = checkedAdd(x, y, r);
+  else if (op == Op::Minus)
+    ok = checkedSub(x, y, r);
+  else if (op == Op::Times)
+    ok = checkedMul(x, y, r);
   else if (op == Op::Divide) {
     if (y == 0) return fail("division by zero");
     ok = checkedDiv(x, y, r);
@@ -282,16 +315,26 @@ bool Evaluator::binary(const Expr& expr, const Value& a, Scope& scope, Locals* l
     if (y == 0) return fail("division by zero");
     r = y == -1 ? 0 : x % y;
   } else if (op == Op::Power) {
-    if (y < 0) r = x == 1 ? 1 : x == -1 ? (y % 2 ? -1 : 1) : 0;
-    else ok = checkedPow(x, y, r);
-  } else if (op == Op::ShiftLeft || op == Op::ArithShiftLeft) r = y < 0 || y >= 64 ? 0 : static_cast<int64_t>(ux << y);
-  else if (op == Op::ShiftRight) r = y < 0 || y >= 64 ? 0 : static_cast<int64_t>(ux >> y);
-  else if (op == Op::ArithShiftRight) r = y < 0 ? 0 : y >= 64 ? (x < 0 ? -1 : 0) : x >> y;
-  else if (op == Op::BitAnd) r = x & y;
-  else if (op == Op::BitOr) r = x | y;
-  else if (op == Op::BitXor) r = x ^ y;
-  else if (op == Op::BitXnor || op == Op::BitXnorAlt) r = ~(x ^ y);
-  else return fail("unsupported operator '" + std::string(operatorText(op)) + "'");
+    if (y < 0)
+      r = x == 1 ? 1 : x == -1 ? (y % 2 ? -1 : 1) : 0;
+    else
+      ok = checkedPow(x, y, r);
+  } else if (op == Op::ShiftLeft || op == Op::ArithShiftLeft)
+    r = y < 0 || y >= 64 ? 0 : static_cast<int64_t>(ux << y);
+  else if (op == Op::ShiftRight)
+    r = y < 0 || y >= 64 ? 0 : static_cast<int64_t>(ux >> y);
+  else if (op == Op::ArithShiftRight)
+    r = y < 0 ? 0 : y >= 64 ? (x < 0 ? -1 : 0) : x >> y;
+  else if (op == Op::BitAnd)
+    r = x & y;
+  else if (op == Op::BitOr)
+    r = x | y;
+  else if (op == Op::BitXor)
+    r = x ^ y;
+  else if (op == Op::BitXnor || op == Op::BitXnorAlt)
+    r = ~(x ^ y);
+  else
+    return fail("unsupported operator '" + std::string(operatorText(op)) + "'");
   if (!ok) return fail("arithmetic overflow in '" + std::string(operatorText(op)) + "'");
   out = Value::integer(r);
   return true;

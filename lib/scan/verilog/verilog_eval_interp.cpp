@@ -35,8 +35,8 @@ bool Evaluator::run(const std::vector<Stmt>& body, Scope& scope, Locals& locals,
 
 bool Evaluator::runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flow) {
   if (++m_Steps > limits::kVerilogEvalSteps)
-    return fail("constant function did not finish within " + std::to_string(limits::kVerilogEvalSteps) +
-                " steps");
+    return fail("constant function did not finish within " +
+                std::to_string(limits::kVerilogEvalSteps) + " steps");
   DepthGuard nesting(m_Nesting, limits::kVerilogEvalNesting);
   if (nesting.tooDeep()) return fail("evaluation is nested too deeply");
   auto truth = [&](const ExprPtr& condition, bool& result) {

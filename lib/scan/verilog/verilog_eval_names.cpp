@@ -87,9 +87,9 @@ bool Evaluator::evalName(const Expr& expr, Scope& scope, Locals* locals, Value& 
     parameter = findParameter(expr.name, scope, owner);
   }
   if (!parameter)
-    return failAt(Unresolved::Kind::UnknownName, expr.name,
-                  "unknown name '" + (expr.scope.empty() ? "" : expr.scope + "::") + expr.name +
-                      "'");
+    return failAt(
+        Unresolved::Kind::UnknownName, expr.name,
+        "unknown name '" + (expr.scope.empty() ? "" : expr.scope + "::") + expr.name + "'");
   return evalParameter(expr.name, *parameter, *owner, out);
 }
 
@@ -176,8 +176,8 @@ bool Evaluator::evalSystem(const Expr& expr, Scope& scope, Locals* locals, Value
     args.push_back(std::move(v));
   }
   auto needs = [&](size_t count) {
-    return args.size() == count || fail(name + " takes " + std::to_string(count) + " argument" +
-                                        (count == 1 ? "" : "s"));
+    return args.size() == count ||
+           fail(name + " takes " + std::to_string(count) + " argument" + (count == 1 ? "" : "s"));
   };
   if (name == "$clog2") {
     int64_t n = 0;
@@ -198,8 +198,8 @@ bool Evaluator::evalSystem(const Expr& expr, Scope& scope, Locals* locals, Value
     }
     return true;
   }
-  if (name == "$rtoi" || name == "$itor" || name == "$floor" || name == "$ceil" ||
-      name == "$ln" || name == "$log10" || name == "$exp" || name == "$sqrt") {
+  if (name == "$rtoi" || name == "$itor" || name == "$floor" || name == "$ceil" || name == "$ln" ||
+      name == "$log10" || name == "$exp" || name == "$sqrt") {
     if (!needs(1)) return false;
     std::optional<double> x = args[0].toReal();
     if (!x) return fail(name + " needs a number");

@@ -18,12 +18,37 @@ namespace scan::verilog {
 /// that messages quote the operator as it was written.
 enum class Op : uint8_t {
   None,
-  Plus, Minus, Times, Divide, Modulo, Power,
-  LogicalAnd, LogicalOr, LogicalNot,
-  BitAnd, BitOr, BitXor, BitXnor, BitXnorAlt, BitNot, BitNand, BitNor,
-  Equal, NotEqual, CaseEqual, CaseNotEqual, WildEqual, WildNotEqual,
-  Less, LessEqual, Greater, GreaterEqual,
-  ShiftLeft, ShiftRight, ArithShiftLeft, ArithShiftRight,
+  Plus,
+  Minus,
+  Times,
+  Divide,
+  Modulo,
+  Power,
+  LogicalAnd,
+  LogicalOr,
+  LogicalNot,
+  BitAnd,
+  BitOr,
+  BitXor,
+  BitXnor,
+  BitXnorAlt,
+  BitNot,
+  BitNand,
+  BitNor,
+  Equal,
+  NotEqual,
+  CaseEqual,
+  CaseNotEqual,
+  WildEqual,
+  WildNotEqual,
+  Less,
+  LessEqual,
+  Greater,
+  GreaterEqual,
+  ShiftLeft,
+  ShiftRight,
+  ArithShiftLeft,
+  ArithShiftRight,
   RangeSelect,       ///< x[i:j]
   PlusSelect,        ///< x[i+:j]
   MinusSelect,       ///< x[i-:j]
@@ -47,7 +72,7 @@ struct Expr {
   ~Expr();
 
   enum class Kind {
-    Number,     ///< integer literal; `unknown` when it holds x or z bits
+    Number,  ///< integer literal; `unknown` when it holds x or z bits
     Real,
     String,
     Name,       ///< `name`, or `scope::name` when `scope` is set
@@ -69,7 +94,7 @@ struct Expr {
   std::string scope;  ///< package of a scoped name
   int64_t integer = 0;
   double real = 0;
-  int width = 0;  ///< literal size in bits; 0 when unsized
+  int width = 0;          ///< literal size in bits; 0 when unsized
   bool isSigned = false;  ///< a sized literal written with 's
   bool unknown = false;
   bool tooWide = false;  ///< an integer literal whose value does not fit in 64 bits
@@ -102,13 +127,13 @@ struct Dimension {
 
 struct TypeSpec {
   enum class Base {
-    Implicit,   ///< no data type: a single bit (wire, input a)
-    Bit,        ///< logic, reg, bit
-    Atom,       ///< integer, int, byte, ... (atomWidth bits)
-    Real,       ///< real, string, event, ... : no bits to speak of
-    Named,      ///< a typedef, type parameter or interface: `name` (`scope`::name)
-    Struct,     ///< packed struct or union of `members`
-    Enum,       ///< enum over `members[0]` (or int)
+    Implicit,  ///< no data type: a single bit (wire, input a)
+    Bit,       ///< logic, reg, bit
+    Atom,      ///< integer, int, byte, ... (atomWidth bits)
+    Real,      ///< real, string, event, ... : no bits to speak of
+    Named,     ///< a typedef, type parameter or interface: `name` (`scope`::name)
+    Struct,    ///< packed struct or union of `members`
+    Enum,      ///< enum over `members[0]` (or int)
   };
   Base base = Base::Implicit;
   std::string written;  ///< the type name as written, for reporting
@@ -127,12 +152,12 @@ struct TypeSpec {
 struct Stmt {
   enum class Kind { Block, Assign, If, For, While, Repeat, Return, Case, Declare, Nothing };
   Kind kind = Kind::Nothing;
-  std::string target;  ///< assigned or declared variable
-  Op op = Op::None;    ///< Assign: the operator of `+=`, `<<=`, ...; None for `=`
-  ExprPtr value;       ///< right-hand side, condition, count or returned value
-  std::vector<Stmt> body;     ///< block statements; If: then, else; loops: init, step, body
+  std::string target;      ///< assigned or declared variable
+  Op op = Op::None;        ///< Assign: the operator of `+=`, `<<=`, ...; None for `=`
+  ExprPtr value;           ///< right-hand side, condition, count or returned value
+  std::vector<Stmt> body;  ///< block statements; If: then, else; loops: init, step, body
   std::vector<std::vector<ExprPtr>> labels;  ///< Case: one label list per body statement
-  bool hasDefault = false;  ///< Case: the last body statement is the default
+  bool hasDefault = false;                   ///< Case: the last body statement is the default
   /// Assign to a bit or part select, target[index], target[index selectOp indexEnd].
   ExprPtr index;
   ExprPtr indexEnd;

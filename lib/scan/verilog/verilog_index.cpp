@@ -61,10 +61,14 @@ class IndexWalk {
 
 const char* unitKindName(UnitKind kind) {
   switch (kind) {
-    case UnitKind::Module: return "module";
-    case UnitKind::Interface: return "interface";
-    case UnitKind::Program: return "program";
-    case UnitKind::Package: return "package";
+    case UnitKind::Module:
+      return "module";
+    case UnitKind::Interface:
+      return "interface";
+    case UnitKind::Program:
+      return "program";
+    case UnitKind::Package:
+      return "package";
   }
   return "module";
 }
@@ -73,31 +77,45 @@ namespace {
 
 const char* wordName(Word word) {
   switch (word) {
-    case Word::Endmodule: return "endmodule";
-    case Word::Endinterface: return "endinterface";
-    case Word::Endprogram: return "endprogram";
-    case Word::Endpackage: return "endpackage";
-    case Word::Endprimitive: return "endprimitive";
-    case Word::Endclass: return "endclass";
-    case Word::Endchecker: return "endchecker";
-    case Word::Endconfig: return "endconfig";
-    case Word::Endfunction: return "endfunction";
-    case Word::Endtask: return "endtask";
-    case Word::Endclocking: return "endclocking";
-    case Word::Endgroup: return "endgroup";
-    case Word::Endproperty: return "endproperty";
-    case Word::Endsequence: return "endsequence";
-    case Word::Endspecify: return "endspecify";
-    default: return "end";
+    case Word::Endmodule:
+      return "endmodule";
+    case Word::Endinterface:
+      return "endinterface";
+    case Word::Endprogram:
+      return "endprogram";
+    case Word::Endpackage:
+      return "endpackage";
+    case Word::Endprimitive:
+      return "endprimitive";
+    case Word::Endclass:
+      return "endclass";
+    case Word::Endchecker:
+      return "endchecker";
+    case Word::Endconfig:
+      return "endconfig";
+    case Word::Endfunction:
+      return "endfunction";
+    case Word::Endtask:
+      return "endtask";
+    case Word::Endclocking:
+      return "endclocking";
+    case Word::Endgroup:
+      return "endgroup";
+    case Word::Endproperty:
+      return "endproperty";
+    case Word::Endsequence:
+      return "endsequence";
+    case Word::Endspecify:
+      return "endspecify";
+    default:
+      return "end";
   }
 }
 
 // Bodies are read in coarse mode; the unit headers and the top level are not.
 class CoarseScope {
  public:
-  explicit CoarseScope(Preprocessor& pre) : m_Pre(pre), m_Was(pre.coarse()) {
-    pre.setCoarse(true);
-  }
+  explicit CoarseScope(Preprocessor& pre) : m_Pre(pre), m_Was(pre.coarse()) { pre.setCoarse(true); }
   ~CoarseScope() { m_Pre.setCoarse(m_Was); }
 
  private:
@@ -112,10 +130,20 @@ bool startsNewUnit(Word word) {
 // Statements whose place a header parse may need.
 bool isDeclaration(Word word) {
   switch (word) {
-    case Word::Input: case Word::Output: case Word::Inout: case Word::Ref:
-    case Word::Parameter: case Word::Localparam: case Word::Typedef: case Word::Import:
-    case Word::NetKind: case Word::VariableType: case Word::AtomType: case Word::RealType:
-    case Word::Var: case Word::Function:
+    case Word::Input:
+    case Word::Output:
+    case Word::Inout:
+    case Word::Ref:
+    case Word::Parameter:
+    case Word::Localparam:
+    case Word::Typedef:
+    case Word::Import:
+    case Word::NetKind:
+    case Word::VariableType:
+    case Word::AtomType:
+    case Word::RealType:
+    case Word::Var:
+    case Word::Function:
       return true;
     default:
       return false;
@@ -180,10 +208,10 @@ void IndexWalk::registerName(DesignIndex::NameMap& names, size_t unit, const Tok
             std::to_string(first.start.source->locate(first.start.offset).line);
   }
   if (at.source)
-    m_Index.m_Diagnostics.warning(
-        *at.source, at.offset,
-        std::string(unitKindName(record.kind)) + " '" + record.name + "' is already declared at " +
-            where + "; the first declaration is used");
+    m_Index.m_Diagnostics.warning(*at.source, at.offset,
+                                  std::string(unitKindName(record.kind)) + " '" + record.name +
+                                      "' is already declared at " + where +
+                                      "; the first declaration is used");
 }
 
 void IndexWalk::unit(UnitKind kind, Word end, const Token& keyword) {
@@ -270,7 +298,8 @@ bool IndexWalk::body(size_t unit, Word end) {
         break;
       case Word::Clocking: {
         Token next;
-        if (read(next) && next.kind == TokenKind::Identifier && read(next)) {}
+        if (read(next) && next.kind == TokenKind::Identifier && read(next)) {
+        }
         if (next.isSymbol("@")) {
           if (!skipBlock(word, token)) return false;
           statementStart = true;
@@ -329,7 +358,8 @@ void IndexWalk::topLevel() {
         break;
       case Word::Interface: {
         Token next;
-        if (read(next) && next.kind == TokenKind::Identifier && classify(next.text) == Word::Class) {
+        if (read(next) && next.kind == TokenKind::Identifier &&
+            classify(next.text) == Word::Class) {
           skipBlock(Word::Class, next);
         } else {
           unread(next);

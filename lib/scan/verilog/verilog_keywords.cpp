@@ -157,22 +157,39 @@ Word classify(std::string_view word) {
 
 Word closingWord(Word opening) {
   switch (opening) {
-    case Word::Module: case Word::Macromodule: return Word::Endmodule;
-    case Word::Interface: return Word::Endinterface;
-    case Word::Program: return Word::Endprogram;
-    case Word::Package: return Word::Endpackage;
-    case Word::Primitive: return Word::Endprimitive;
-    case Word::Class: return Word::Endclass;
-    case Word::Checker: return Word::Endchecker;
-    case Word::Config: return Word::Endconfig;
-    case Word::Function: return Word::Endfunction;
-    case Word::Task: return Word::Endtask;
-    case Word::Clocking: return Word::Endclocking;
-    case Word::Covergroup: return Word::Endgroup;
-    case Word::Property: return Word::Endproperty;
-    case Word::Sequence: return Word::Endsequence;
-    case Word::Specify: return Word::Endspecify;
-    default: return Word::None;
+    case Word::Module:
+    case Word::Macromodule:
+      return Word::Endmodule;
+    case Word::Interface:
+      return Word::Endinterface;
+    case Word::Program:
+      return Word::Endprogram;
+    case Word::Package:
+      return Word::Endpackage;
+    case Word::Primitive:
+      return Word::Endprimitive;
+    case Word::Class:
+      return Word::Endclass;
+    case Word::Checker:
+      return Word::Endchecker;
+    case Word::Config:
+      return Word::Endconfig;
+    case Word::Function:
+      return Word::Endfunction;
+    case Word::Task:
+      return Word::Endtask;
+    case Word::Clocking:
+      return Word::Endclocking;
+    case Word::Covergroup:
+      return Word::Endgroup;
+    case Word::Property:
+      return Word::Endproperty;
+    case Word::Sequence:
+      return Word::Endsequence;
+    case Word::Specify:
+      return Word::Endspecify;
+    default:
+      return Word::None;
   }
 }
 

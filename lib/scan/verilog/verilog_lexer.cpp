@@ -36,7 +36,8 @@ inline uint8_t cls(char c) { return kClass[static_cast<unsigned char>(c)]; }
 size_t operatorLength(const char* p) {
   char b = p[1], c = b ? p[2] : '\0';
   switch (p[0]) {
-    case '.': return b == '*' ? 2 : 1;
+    case '.':
+      return b == '*' ? 2 : 1;
     case '<':
       if (b == '<') return c == '<' ? (p[3] == '=' ? 4 : 3) : c == '=' ? 3 : 2;
       if (b == '-' && c == '>') return 3;
@@ -48,27 +49,42 @@ size_t operatorLength(const char* p) {
     case '!':
       if (b == '=') return c == '=' || c == '?' ? 3 : 2;
       return 1;
-    case '*': return b == '*' || b == '=' ? 2 : 1;
-    case '&': return b == '&' || b == '=' ? 2 : 1;
+    case '*':
+      return b == '*' || b == '=' ? 2 : 1;
+    case '&':
+      return b == '&' || b == '=' ? 2 : 1;
     case '|':
       if ((b == '-' || b == '=') && c == '>') return 3;
       return b == '|' || b == '=' ? 2 : 1;
-    case '~': return b == '&' || b == '|' || b == '^' ? 2 : 1;
-    case '^': return b == '~' || b == '=' ? 2 : 1;
-    case ':': return b == ':' || b == '=' || b == '/' ? 2 : 1;
-    case '+': return b == ':' || b == '+' || b == '=' ? 2 : 1;
+    case '~':
+      return b == '&' || b == '|' || b == '^' ? 2 : 1;
+    case '^':
+      return b == '~' || b == '=' ? 2 : 1;
+    case ':':
+      return b == ':' || b == '=' || b == '/' ? 2 : 1;
+    case '+':
+      return b == ':' || b == '+' || b == '=' ? 2 : 1;
     case '-':
       if (b == '>' && c == '>') return 3;
       return b == ':' || b == '-' || b == '=' || b == '>' ? 2 : 1;
     case '/':
-    case '%': return b == '=' ? 2 : 1;
-    default: return 1;
+    case '%':
+      return b == '=' ? 2 : 1;
+    default:
+      return 1;
   }
 }
 
 inline bool isBaseLetter(char c) {
   switch (c) {
-    case 'b': case 'B': case 'o': case 'O': case 'd': case 'D': case 'h': case 'H':
+    case 'b':
+    case 'B':
+    case 'o':
+    case 'O':
+    case 'd':
+    case 'D':
+    case 'h':
+    case 'H':
       return true;
     default:
       return false;
@@ -205,9 +221,27 @@ const char* Lexer::skipIrrelevant(const char* p) {
         }
         ++p;
         continue;
-      case ')': case ',': case '.': case '[': case ']': case '{': case '}': case '=':
-      case '#': case '+': case '-': case '*': case '&': case '|': case '~': case '^': case '!':
-      case '<': case '>': case '?': case '%':
+      case ')':
+      case ',':
+      case '.':
+      case '[':
+      case ']':
+      case '{':
+      case '}':
+      case '=':
+      case '#':
+      case '+':
+      case '-':
+      case '*':
+      case '&':
+      case '|':
+      case '~':
+      case '^':
+      case '!':
+      case '<':
+      case '>':
+      case '?':
+      case '%':
         ++p;
         continue;
       default:
@@ -237,7 +271,14 @@ void Lexer::next(Token& token) {
     token.kind = TokenKind::Number;
   } else {
     switch (c) {
-      case '(': case ')': case ',': case ';': case '[': case ']': case '{': case '}':
+      case '(':
+      case ')':
+      case ',':
+      case ';':
+      case '[':
+      case ']':
+      case '{':
+      case '}':
       case '@':
         token.kind = TokenKind::Symbol;
         ++p;

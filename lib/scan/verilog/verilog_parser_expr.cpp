@@ -10,29 +10,54 @@ namespace {
 int precedence(const Token& token) {
   if (token.kind != TokenKind::Symbol) return 0;
   switch (operatorOf(token.text)) {
-    case Op::LogicalOr: return 1;
-    case Op::LogicalAnd: return 2;
-    case Op::BitOr: return 3;
-    case Op::BitXor: case Op::BitXnor: case Op::BitXnorAlt: return 4;
-    case Op::BitAnd: return 5;
-    case Op::Equal: case Op::NotEqual: case Op::CaseEqual: case Op::CaseNotEqual:
-    case Op::WildEqual: case Op::WildNotEqual:
+    case Op::LogicalOr:
+      return 1;
+    case Op::LogicalAnd:
+      return 2;
+    case Op::BitOr:
+      return 3;
+    case Op::BitXor:
+    case Op::BitXnor:
+    case Op::BitXnorAlt:
+      return 4;
+    case Op::BitAnd:
+      return 5;
+    case Op::Equal:
+    case Op::NotEqual:
+    case Op::CaseEqual:
+    case Op::CaseNotEqual:
+    case Op::WildEqual:
+    case Op::WildNotEqual:
       return 6;
-    case Op::Less: case Op::LessEqual: case Op::Greater: case Op::GreaterEqual: return 7;
-    case Op::ShiftLeft: case Op::ShiftRight: case Op::ArithShiftLeft: case Op::ArithShiftRight:
+    case Op::Less:
+    case Op::LessEqual:
+    case Op::Greater:
+    case Op::GreaterEqual:
+      return 7;
+    case Op::ShiftLeft:
+    case Op::ShiftRight:
+    case Op::ArithShiftLeft:
+    case Op::ArithShiftRight:
       return 8;
-    case Op::Plus: case Op::Minus: return 9;
-    case Op::Times: case Op::Divide: case Op::Modulo: return 10;
-    case Op::Power: return 11;
-    default: return 0;
+    case Op::Plus:
+    case Op::Minus:
+      return 9;
+    case Op::Times:
+    case Op::Divide:
+    case Op::Modulo:
+      return 10;
+    case Op::Power:
+      return 11;
+    default:
+      return 0;
   }
 }
 
 bool isUnaryOperator(const Token& token) {
   if (token.kind != TokenKind::Symbol) return false;
   std::string_view op = token.text;
-  return op == "+" || op == "-" || op == "!" || op == "~" || op == "&" || op == "|" ||
-         op == "^" || op == "~&" || op == "~|" || op == "~^" || op == "^~";
+  return op == "+" || op == "-" || op == "!" || op == "~" || op == "&" || op == "|" || op == "^" ||
+         op == "~&" || op == "~|" || op == "~^" || op == "^~";
 }
 
 }  // namespace

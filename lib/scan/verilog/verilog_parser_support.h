@@ -9,9 +9,16 @@ namespace scan::verilog {
 
 inline bool isTypeWord(Word word) {
   switch (word) {
-    case Word::NetKind: case Word::Var: case Word::VariableType: case Word::AtomType:
-    case Word::RealType: case Word::Signed: case Word::Unsigned: case Word::Struct:
-    case Word::Union: case Word::Enum:
+    case Word::NetKind:
+    case Word::Var:
+    case Word::VariableType:
+    case Word::AtomType:
+    case Word::RealType:
+    case Word::Signed:
+    case Word::Unsigned:
+    case Word::Struct:
+    case Word::Union:
+    case Word::Enum:
       return true;
     default:
       return false;

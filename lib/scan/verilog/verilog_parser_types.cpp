@@ -107,7 +107,8 @@ void Parser::enumBody(TypeSpec& type) {
 }
 
 bool Parser::dataType(TypeSpec& type) {
-  DepthGuard guard(m_Depth, limits::kVerilogSyntaxNesting);  // struct members and enum bases nest types in types
+  DepthGuard guard(
+      m_Depth, limits::kVerilogSyntaxNesting);  // struct members and enum bases nest types in types
   if (guard.tooDeep()) {
     fail("data type nested too deeply");
     return false;

@@ -95,7 +95,8 @@ class PortBuilder {
       for (const Dimension& dim : current->packed) {
         Bounds bounds;
         m_OwnDimension = depth == 0;
-        if (scope == &m_Model.scope ? !dimension(dim, bounds) : !foreignDimension(dim, *scope, bounds))
+        if (scope == &m_Model.scope ? !dimension(dim, bounds)
+                                    : !foreignDimension(dim, *scope, bounds))
           return false;
         dims.push_back(bounds);
       }
@@ -196,8 +197,8 @@ class PortBuilder {
   }
 
   void emit(const std::string& name, const std::string& typeName, int direction,
-            const SourceBuffer* source, size_t offset, const Range& range,
-            const Written& written, const std::string& problem) {
+            const SourceBuffer* source, size_t offset, const Range& range, const Written& written,
+            const std::string& problem) {
     size_t line = source ? m_Lines.lineOf(*source, offset) : 0;
     ScanPort port(name, typeName, direction, static_cast<int>(line));
     port.setDeclaredType(written.type);
@@ -381,8 +382,8 @@ class PortBuilder {
       Range range;
       std::string problem;
       if (!memberRange(member, type, range)) {
-        problem = rangeFailed(ref.name, written.expression, !member.left, first->source,
-                              first->offset);
+        problem =
+            rangeFailed(ref.name, written.expression, !member.left, first->source, first->offset);
         range = {};
       }
       if (member.left) {
@@ -413,8 +414,8 @@ class PortBuilder {
     if (ok && total > 1) range = {true, total - 1, 0};
     std::string problem;
     if (!ok) problem = rangeFailed(ref.name, ref.text, false, first->source, first->offset);
-    Written whole{rangeText(range),
-                  range.present ? ScanPort::Kind::BitVector : ScanPort::Kind::Bit, ref.text};
+    Written whole{rangeText(range), range.present ? ScanPort::Kind::BitVector : ScanPort::Kind::Bit,
+                  ref.text};
     emit(ref.name, "", first->direction, first->source, first->offset, range, whole, problem);
   }
 
@@ -426,15 +427,15 @@ class PortBuilder {
   const RangeHints& m_Hints;
   std::vector<ScanPort> m_Ports;
   std::string m_Error;
-  std::string m_Reason;  ///< m_Error with its fix, when one is known
+  std::string m_Reason;         ///< m_Error with its fix, when one is known
   bool m_OwnDimension = false;  ///< the failed dimension is one written on the port itself
 };
 
 }  // namespace
 
-std::vector<ScanPort> buildPorts(UnitModel& model, Evaluator& evaluator,
-                                 const DesignIndex& index, Diagnostics& diagnostics,
-                                 LineCounter& lines, const RangeHints& hints) {
+std::vector<ScanPort> buildPorts(UnitModel& model, Evaluator& evaluator, const DesignIndex& index,
+                                 Diagnostics& diagnostics, LineCounter& lines,
+                                 const RangeHints& hints) {
   return PortBuilder(model, evaluator, index, diagnostics, lines, hints).build();
 }
 

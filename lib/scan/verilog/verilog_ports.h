@@ -40,8 +40,8 @@ struct RangeHints {
   std::vector<std::string> missingPackages;  ///< imported, but in no design file
 };
 
-std::vector<ScanPort> buildPorts(UnitModel& model, Evaluator& evaluator,
-                                 const DesignIndex& index, Diagnostics& diagnostics,
-                                 LineCounter& lines, const RangeHints& hints);
+std::vector<ScanPort> buildPorts(UnitModel& model, Evaluator& evaluator, const DesignIndex& index,
+                                 Diagnostics& diagnostics, LineCounter& lines,
+                                 const RangeHints& hints);
 
 }  // namespace scan::verilog

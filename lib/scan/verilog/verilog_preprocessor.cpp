@@ -23,16 +23,36 @@ constexpr size_t kMaxExpansionBytes = 1u << 20;
 
 // Directives with no effect on ports: the rest of their line is ignored.
 constexpr std::array<std::string_view, 31> kLineDirectives = {
-    "timescale",          "default_nettype",       "resetall",
-    "celldefine",         "endcelldefine",         "unconnected_drive",
-    "nounconnected_drive", "line",                 "begin_keywords",
-    "end_keywords",       "default_decay_time",    "default_trireg_strength",
-    "delay_mode_distributed", "delay_mode_path",   "delay_mode_unit",
-    "delay_mode_zero",    "accelerate",            "noaccelerate",
-    "protect",            "endprotect",            "expand_vectornets",
-    "noexpand_vectornets", "suppress_faults",      "nosuppress_faults",
-    "enable_portfaults",  "disable_portfaults",    "remove_gatenames",
-    "noremove_gatenames", "remove_netnames",       "noremove_netnames",
+    "timescale",
+    "default_nettype",
+    "resetall",
+    "celldefine",
+    "endcelldefine",
+    "unconnected_drive",
+    "nounconnected_drive",
+    "line",
+    "begin_keywords",
+    "end_keywords",
+    "default_decay_time",
+    "default_trireg_strength",
+    "delay_mode_distributed",
+    "delay_mode_path",
+    "delay_mode_unit",
+    "delay_mode_zero",
+    "accelerate",
+    "noaccelerate",
+    "protect",
+    "endprotect",
+    "expand_vectornets",
+    "noexpand_vectornets",
+    "suppress_faults",
+    "nosuppress_faults",
+    "enable_portfaults",
+    "disable_portfaults",
+    "remove_gatenames",
+    "noremove_gatenames",
+    "remove_netnames",
+    "noremove_netnames",
     "uselib",
 };
 
@@ -58,9 +78,7 @@ std::string_view trim(std::string_view s) {
 }  // namespace
 
 Preprocessor::Preprocessor(Diagnostics* diagnostics, MacroTable& macros, SourceStore& sources)
-    : m_Diagnostics(diagnostics ? diagnostics : &m_Quiet),
-      m_Macros(macros),
-      m_Sources(sources) {}
+    : m_Diagnostics(diagnostics ? diagnostics : &m_Quiet), m_Macros(macros), m_Sources(sources) {}
 
 Preprocessor::~Preprocessor() = default;
 
@@ -69,8 +87,8 @@ void Preprocessor::start(const SourceBuffer& file, size_t offset, size_t openCon
   m_Conditionals.assign(openConditionals, Conditional{});
   m_Skipping = false;
   const char* begin = file.begin();
-  Frame frame{Lexer(begin, file.end(), &file, Lexer::npos, m_Diagnostics), &file,
-               openConditionals, nullptr, nullptr};
+  Frame frame{Lexer(begin, file.end(), &file, Lexer::npos, m_Diagnostics), &file, openConditionals,
+              nullptr, nullptr};
   frame.lexer.setPosition(begin + std::min(offset, file.text().size()));
   frame.lexer.setCoarse(m_Coarse);
   m_Frames.push_back(std::move(frame));
@@ -391,8 +409,7 @@ void Preprocessor::skipProtected(const Token& token, std::string_view endMarker)
   restOfLine();
 }
 
-void Preprocessor::pushText(const Token& at, std::string text,
-                            std::shared_ptr<const Macro> macro) {
+void Preprocessor::pushText(const Token& at, std::string text, std::shared_ptr<const Macro> macro) {
   auto owned = std::make_unique<std::string>(std::move(text));
   const char* begin = owned->data();
   const char* end = begin + owned->size();
@@ -524,7 +541,8 @@ void Preprocessor::expand(const Token& token) {
   std::vector<std::string> args;
   if (macro->functionLike && !collectArguments(token, *macro, args)) return;
   if (++m_Expansions > kMaxExpansions || m_ExpansionBytes > kMaxExpansionBytes) {
-    if (!m_BudgetReported) error(token, "expansion of macro `" + m_OutermostMacro + " is too large");
+    if (!m_BudgetReported)
+      error(token, "expansion of macro `" + m_OutermostMacro + " is too large");
     m_BudgetReported = true;
     return;
   }

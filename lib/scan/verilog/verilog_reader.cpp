@@ -193,8 +193,7 @@ bool VerilogReader::applyOverrides(UnitModel& model, UnitReader& reader) {
   return ok;
 }
 
-std::vector<ScanGeneric> VerilogReader::describeParameters(UnitModel& model,
-                                                          Evaluator& evaluator) {
+std::vector<ScanGeneric> VerilogReader::describeParameters(UnitModel& model, Evaluator& evaluator) {
   std::vector<ScanGeneric> generics;
   LineCounter lines;
   for (const ParameterDeclaration& declared : model.parameters) {

@@ -15,11 +15,11 @@
 namespace scan::verilog {
 
 struct Parameter {
-  ExprPtr value;                      ///< null when the declaration gives no default
-  std::shared_ptr<TypeSpec> type;     ///< the declared type, when one is written
-  bool isType = false;                ///< a `parameter type`
+  ExprPtr value;                   ///< null when the declaration gives no default
+  std::shared_ptr<TypeSpec> type;  ///< the declared type, when one is written
+  bool isType = false;             ///< a `parameter type`
   std::shared_ptr<TypeSpec> typeValue;
-  std::vector<Dimension> unpacked;    ///< a parameter array's dimensions
+  std::vector<Dimension> unpacked;  ///< a parameter array's dimensions
   // Evaluation state: the value once known, and a mark that catches circular definitions.
   std::optional<Value> cached;
   bool busy = false;
@@ -32,7 +32,7 @@ struct Scope {
   std::unordered_map<std::string, std::shared_ptr<TypeSpec>> typedefs;
   std::unordered_set<std::string> unpackedTypedefs;  ///< typedefs with unpacked dimensions
   std::unordered_map<std::string, std::shared_ptr<Function>> functions;
-  std::vector<std::string> wildcardImports;               ///< import pkg::*
+  std::vector<std::string> wildcardImports;                   ///< import pkg::*
   std::unordered_map<std::string, std::string> namedImports;  ///< name -> package
 };
 

@@ -63,21 +63,37 @@ namespace {
 
 int directionOf(Word word) {
   switch (word) {
-    case Word::Input: return ScanPort::Input;
-    case Word::Output: return ScanPort::Output;
-    case Word::Inout: return ScanPort::Inout;
-    case Word::Ref: return ScanPort::Ref;
-    default: return 0;
+    case Word::Input:
+      return ScanPort::Input;
+    case Word::Output:
+      return ScanPort::Output;
+    case Word::Inout:
+      return ScanPort::Inout;
+    case Word::Ref:
+      return ScanPort::Ref;
+    default:
+      return 0;
   }
 }
 
 bool startsAnsiPort(Parser& parser) {
   TokenStream& tokens = parser.tokens();
   switch (tokens.peekWord()) {
-    case Word::Input: case Word::Output: case Word::Inout: case Word::Ref: case Word::Interface:
-    case Word::NetKind: case Word::Var: case Word::VariableType: case Word::AtomType:
-    case Word::RealType: case Word::Signed: case Word::Unsigned: case Word::Struct:
-    case Word::Union: case Word::Enum:
+    case Word::Input:
+    case Word::Output:
+    case Word::Inout:
+    case Word::Ref:
+    case Word::Interface:
+    case Word::NetKind:
+    case Word::Var:
+    case Word::VariableType:
+    case Word::AtomType:
+    case Word::RealType:
+    case Word::Signed:
+    case Word::Unsigned:
+    case Word::Struct:
+    case Word::Union:
+    case Word::Enum:
       return true;
     default:
       return tokens.peek().isSymbol("[") || parser.userTypeAt(0);
@@ -206,8 +222,8 @@ void readParameters(Parser& parser, Scope& scope, bool local = false,
       }
     }
     if (declared && !local)
-      declared->push_back({name, isType, typeText, std::move(defaultText), nameToken.source,
-                           nameToken.offset});
+      declared->push_back(
+          {name, isType, typeText, std::move(defaultText), nameToken.source, nameToken.offset});
     scope.parameters.emplace(std::move(name), std::move(parameter));
     if (!tokens.acceptSymbol(",")) return;
   }
@@ -423,8 +439,7 @@ void readHeader(Parser& parser, UnitModel& model) {
 // is parameterised by its body's parameters; the imports of a non-ANSI body are part of the
 // context its port declarations need. True when the item was a port declaration of a non-ANSI
 // unit.
-bool readBodyItem(Parser& parser, UnitModel& model,
-                  const std::unordered_set<std::string>& listed) {
+bool readBodyItem(Parser& parser, UnitModel& model, const std::unordered_set<std::string>& listed) {
   TokenStream& tokens = parser.tokens();
   Word word = tokens.peekWord();
   if (word == Word::Parameter && !model.parameterList) {
@@ -481,8 +496,7 @@ bool readBodyItem(Parser& parser, UnitModel& model,
     }
     if (tokens.peek().isSymbol("=")) break;
   } while (!parser.failed() && tokens.acceptSymbol(","));
-  if (direction && !parser.failed() && !tokens.peek().isSymbol(";") &&
-      !tokens.peek().isSymbol("="))
+  if (direction && !parser.failed() && !tokens.peek().isSymbol(";") && !tokens.peek().isSymbol("="))
     parser.expectSymbol(";");
   parser.skipStatement();
   return direction != 0;

@@ -22,7 +22,7 @@ class SourceStore;
 struct PortDeclaration {
   std::string name;
   TypeSpec type;
-  std::string typeText;  ///< the data type as written, normalised; empty when none is
+  std::string typeText;   ///< the data type as written, normalised; empty when none is
   bool unpacked = false;  ///< unpacked dimensions follow the name
   int direction = 0;
   /// No direction was written and the type may name an interface; decided once types are
@@ -36,8 +36,8 @@ struct PortDeclaration {
 struct PortReference {
   struct Member {
     std::string signal;
-    ExprPtr left;   ///< select, when written
-    ExprPtr right;  ///< second bound of a part select
+    ExprPtr left;      ///< select, when written
+    ExprPtr right;     ///< second bound of a part select
     Op op = Op::None;  ///< the kind of part select
   };
   std::string name;  ///< empty for an unnamed concatenation
@@ -68,12 +68,12 @@ struct ParameterDeclaration {
 struct UnitModel {
   Scope scope;
   bool ansi = true;
-  bool parameterList = false;                   ///< the header has a `#(...)` list
+  bool parameterList = false;                    ///< the header has a `#(...)` list
   std::vector<ParameterDeclaration> parameters;  ///< in declaration order
   /// Package imports of the header and, for non-ANSI units, of the body: "import p::*;".
   std::vector<std::string> imports;
-  std::vector<PortDeclaration> ports;           ///< ANSI ports, in order
-  std::vector<PortReference> headerList;        ///< non-ANSI header, in order
+  std::vector<PortDeclaration> ports;                         ///< ANSI ports, in order
+  std::vector<PortReference> headerList;                      ///< non-ANSI header, in order
   std::unordered_map<std::string, PortDeclaration> declared;  ///< non-ANSI direction declarations
   std::unordered_map<std::string, NetDeclaration> netTypes;   ///< net/variable declarations
   /// Errors met in the header (and, for a non-ANSI header, the port declarations).

@@ -35,8 +35,33 @@ enum class ExprKind : uint8_t {
 };
 
 enum class Op : uint8_t {
-  None, Add, Sub, Mul, Div, Mod, Rem, Pow, Abs, Not, Neg, Plus, Concat,
-  Eq, Ne, Lt, Le, Gt, Ge, And, Or, Nand, Nor, Xor, Xnor, To, Downto,
+  None,
+  Add,
+  Sub,
+  Mul,
+  Div,
+  Mod,
+  Rem,
+  Pow,
+  Abs,
+  Not,
+  Neg,
+  Plus,
+  Concat,
+  Eq,
+  Ne,
+  Lt,
+  Le,
+  Gt,
+  Ge,
+  And,
+  Or,
+  Nand,
+  Nor,
+  Xor,
+  Xnor,
+  To,
+  Downto,
 };
 
 struct Expr;
@@ -62,34 +87,45 @@ struct Expr {
 struct SubtypeIndication {
   std::vector<std::string_view> typeMark;  ///< components of the (selected) type mark
   size_t offset = 0;
-  ExprId rangeConstraint = kNoExpr;        ///< `range ...`
-  std::vector<ExprId> indexConstraint;     ///< `(r1, r2, ...)`, first dimension first
+  ExprId rangeConstraint = kNoExpr;     ///< `range ...`
+  std::vector<ExprId> indexConstraint;  ///< `(r1, r2, ...)`, first dimension first
   bool valid() const { return !typeMark.empty(); }
 };
 
 enum class Mode : uint8_t { In = 1, Out = 2, Inout = 3, Buffer = 4, Linkage = 5 };
 
 enum class DeclKind : uint8_t {
-  Constant, Generic, Port, Variable, Subtype, ArrayType, RangeType, EnumType, EnumLiteral,
-  RecordType, OtherType, Function, Alias,
+  Constant,
+  Generic,
+  Port,
+  Variable,
+  Subtype,
+  ArrayType,
+  RangeType,
+  EnumType,
+  EnumLiteral,
+  RecordType,
+  OtherType,
+  Function,
+  Alias,
 };
 
 /// One named declaration of a package, entity header or subprogram.
 struct Decl {
   DeclKind kind = DeclKind::Constant;
-  std::string key;          ///< normalized name used for lookup
-  std::string_view name;    ///< as written
+  std::string key;        ///< normalized name used for lookup
+  std::string_view name;  ///< as written
   size_t offset = 0;
   Mode mode = Mode::In;
-  SubtypeIndication subtype;       ///< objects, subtypes; element type of arrays
-  ExprId init = kNoExpr;           ///< default or initial value; the aliased name of an alias
-  std::vector<ExprId> indexRanges; ///< array types: one discrete range per dimension
-  ExprId range = kNoExpr;          ///< range types
-  std::vector<std::string> fieldKeys;          ///< record types: normalized field names
-  std::vector<SubtypeIndication> fieldTypes;   ///< record types: one per field
-  int64_t position = 0;            ///< enumeration literals; literal count of enum types
-  size_t parameterCount = 0;       ///< functions
-  size_t bodyOffset = 0;           ///< functions with a body: offset of `function`
+  SubtypeIndication subtype;           ///< objects, subtypes; element type of arrays
+  ExprId init = kNoExpr;               ///< default or initial value; the aliased name of an alias
+  std::vector<ExprId> indexRanges;     ///< array types: one discrete range per dimension
+  ExprId range = kNoExpr;              ///< range types
+  std::vector<std::string> fieldKeys;  ///< record types: normalized field names
+  std::vector<SubtypeIndication> fieldTypes;  ///< record types: one per field
+  int64_t position = 0;                       ///< enumeration literals; literal count of enum types
+  size_t parameterCount = 0;                  ///< functions
+  size_t bodyOffset = 0;                      ///< functions with a body: offset of `function`
   bool hasBody = false;
   // Evaluation cache for constants and generics.
   enum class State : uint8_t { Fresh, Busy, Done, Failed } state = State::Fresh;
@@ -103,13 +139,13 @@ enum class StmtKind : uint8_t { Assign, If, For, While, Loop, Exit, Next, Return
 struct Stmt {
   StmtKind kind = StmtKind::Null;
   size_t offset = 0;
-  std::string_view name;         ///< assignment target, loop variable
-  std::string key;               ///< normalized name
-  std::string_view label;        ///< loop label, exit/next target label
-  ExprId expr = kNoExpr;         ///< value, condition, range or selector
-  std::vector<ExprId> conditions;               ///< if/elsif conditions, one per branch
-  std::vector<std::vector<ExprId>> choices;     ///< case choices, one list per branch
-  std::vector<std::vector<int32_t>> branches;   ///< statement lists; an else branch is last
+  std::string_view name;                       ///< assignment target, loop variable
+  std::string key;                             ///< normalized name
+  std::string_view label;                      ///< loop label, exit/next target label
+  ExprId expr = kNoExpr;                       ///< value, condition, range or selector
+  std::vector<ExprId> conditions;              ///< if/elsif conditions, one per branch
+  std::vector<std::vector<ExprId>> choices;    ///< case choices, one list per branch
+  std::vector<std::vector<int32_t>> branches;  ///< statement lists; an else branch is last
 };
 
 /// A parsed subprogram: its parameters and variables are Decls, its statements Stmts.

@@ -15,7 +15,6 @@
 namespace scan::vhdl {
 namespace {
 
-
 bool isIn(std::string_view name, std::initializer_list<std::string_view> names) {
   for (std::string_view n : names)
     if (n == name) return true;
@@ -111,16 +110,23 @@ std::vector<ScanGeneric> Describer::generics(UnitScope& entity,
     ScanGeneric generic;
     generic.name = std::string(text.name);
     switch (text.kind) {
-      case InterfaceText::Kind::Object: generic.kind = ScanGeneric::Kind::Constant; break;
-      case InterfaceText::Kind::Type: generic.kind = ScanGeneric::Kind::Type; break;
-      case InterfaceText::Kind::Package: generic.kind = ScanGeneric::Kind::Package; break;
-      case InterfaceText::Kind::Subprogram: generic.kind = ScanGeneric::Kind::Subprogram; break;
+      case InterfaceText::Kind::Object:
+        generic.kind = ScanGeneric::Kind::Constant;
+        break;
+      case InterfaceText::Kind::Type:
+        generic.kind = ScanGeneric::Kind::Type;
+        break;
+      case InterfaceText::Kind::Package:
+        generic.kind = ScanGeneric::Kind::Package;
+        break;
+      case InterfaceText::Kind::Subprogram:
+        generic.kind = ScanGeneric::Kind::Subprogram;
+        break;
     }
     generic.typeText = text.typeText;
     generic.defaultText = text.defaultText;
-    const std::vector<size_t>* named = text.kind == InterfaceText::Kind::Object
-                                           ? entity.find(normalizeName(text.name))
-                                           : nullptr;
+    const std::vector<size_t>* named =
+        text.kind == InterfaceText::Kind::Object ? entity.find(normalizeName(text.name)) : nullptr;
     for (size_t i = 0; named != nullptr && i < named->size(); ++i) {
       Decl& decl = entity.decls[(*named)[i]];
       Value value;
@@ -151,11 +157,27 @@ Describer::TypeInfo Describer::classify(UnitScope* unit, const SubtypeIndication
       return {TypeClass::Enum};
     if (isIn(name, {"boolean_vector", "integer_vector", "real_vector", "time_vector"}))
       return {TypeClass::Array};
-    if (isIn(name, {"std_logic_vector", "std_ulogic_vector", "bit_vector", "unsigned", "signed",
-                    "unresolved_unsigned", "unresolved_signed", "u_unsigned", "u_signed",
-                    "ufixed", "sfixed", "u_ufixed", "u_sfixed", "unresolved_ufixed",
-                    "unresolved_sfixed", "float", "float32", "float64", "float128",
-                    "unresolved_float", "u_float"}))
+    if (isIn(name, {"std_logic_vector",
+                    "std_ulogic_vector",
+                    "bit_vector",
+                    "unsigned",
+                    "signed",
+                    "unresolved_unsigned",
+                    "unresolved_signed",
+                    "u_unsigned",
+                    "u_signed",
+                    "ufixed",
+                    "sfixed",
+                    "u_ufixed",
+                    "u_sfixed",
+                    "unresolved_ufixed",
+                    "unresolved_sfixed",
+                    "float",
+                    "float32",
+                    "float64",
+                    "float128",
+                    "unresolved_float",
+                    "u_float"}))
       return {TypeClass::BitVector};
     return {};
   }
@@ -222,17 +244,24 @@ std::optional<std::string> Describer::literalText(const TypeInfo& type, const Va
 
 ScanPort::Kind Describer::portKind(UnitScope& entity, const SubtypeIndication& subtype) {
   switch (classify(&entity, subtype, 0).type) {
-    case TypeClass::Bit: return ScanPort::Kind::Bit;
-    case TypeClass::BitVector: return ScanPort::Kind::BitVector;
-    case TypeClass::Integer: return ScanPort::Kind::Integer;
+    case TypeClass::Bit:
+      return ScanPort::Kind::Bit;
+    case TypeClass::BitVector:
+      return ScanPort::Kind::BitVector;
+    case TypeClass::Integer:
+      return ScanPort::Kind::Integer;
     case TypeClass::Boolean:
     case TypeClass::Character:
-    case TypeClass::Enum: return ScanPort::Kind::Enum;
-    case TypeClass::Record: return ScanPort::Kind::Record;
+    case TypeClass::Enum:
+      return ScanPort::Kind::Enum;
+    case TypeClass::Record:
+      return ScanPort::Kind::Record;
     case TypeClass::String:
-    case TypeClass::Array: return ScanPort::Kind::Array;
+    case TypeClass::Array:
+      return ScanPort::Kind::Array;
     case TypeClass::Real:
-    case TypeClass::Other: return ScanPort::Kind::Other;
+    case TypeClass::Other:
+      return ScanPort::Kind::Other;
   }
   return ScanPort::Kind::Other;
 }

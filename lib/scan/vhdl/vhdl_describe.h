@@ -48,17 +48,26 @@ class Describer {
   /// the expression that could not be evaluated when it is one of the entity's (null
   /// otherwise); `typeMark` the port's type.
   std::string failureHint(UnitScope& entity, const Expr* failed,
-                          const std::vector<std::string_view>& typeMark,
-                          const std::string& reason);
+                          const std::vector<std::string_view>& typeMark, const std::string& reason);
 
  private:
   enum class TypeClass {
-    Bit, BitVector, Integer, Real, Boolean, Character, String, Enum, Record, Array, Other
+    Bit,
+    BitVector,
+    Integer,
+    Real,
+    Boolean,
+    Character,
+    String,
+    Enum,
+    Record,
+    Array,
+    Other
   };
   struct TypeInfo {
     TypeClass type = TypeClass::Other;
-    UnitScope* unit = nullptr;    ///< for Enum: where the type is declared
-    const Decl* decl = nullptr;   ///< for Enum: the type, its literals follow it
+    UnitScope* unit = nullptr;   ///< for Enum: where the type is declared
+    const Decl* decl = nullptr;  ///< for Enum: the type, its literals follow it
   };
 
   TypeInfo classify(UnitScope* unit, const SubtypeIndication& subtype, int depth);

@@ -47,7 +47,8 @@ void Design::expandUses(UnitScope& scope, const std::vector<UseClause>& uses) {
     const SourceBuffer& source = m_Index.source(*context);
     Lexer lexer(source.text(), context->offset);
     Token t = lexer.next();
-    while (t.kind != TokenKind::End && !(t.kind == TokenKind::Identifier && equalsWord(t.text, "end"))) {
+    while (t.kind != TokenKind::End &&
+           !(t.kind == TokenKind::Identifier && equalsWord(t.text, "end"))) {
       bool isUse = t.kind == TokenKind::Identifier && equalsWord(t.text, "use");
       bool isContext = t.kind == TokenKind::Identifier && equalsWord(t.text, "context") &&
                        t.offset != context->offset;
@@ -89,8 +90,7 @@ UnitScope* Design::parse(const UnitRecord& record) {
 
 UnitScope* Design::entity(const UnitRecord& record) { return parse(record); }
 
-UnitScope* Design::package(std::string_view library, std::string_view name,
-                           const UnitScope& from) {
+UnitScope* Design::package(std::string_view library, std::string_view name, const UnitScope& from) {
   std::string_view named = library == "work" ? std::string_view(from.record->library) : library;
   const UnitRecord* record = m_Index.find(UnitKind::Package, named, name);
   for (size_t i = 0; record == nullptr && i < m_Index.libraries().size(); ++i)

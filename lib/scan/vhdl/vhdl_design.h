@@ -21,8 +21,8 @@ struct UnitScope {
   ExprArena arena;
   std::vector<Decl> decls;
   std::unordered_map<std::string, std::vector<size_t>> byKey;  ///< decl indices per name
-  bool parseFailed = false;   ///< its header or declarations met an error; decls are partial
-  UnitScope* spec = nullptr;  ///< for a package body: its package
+  bool parseFailed = false;     ///< its header or declarations met an error; decls are partial
+  UnitScope* spec = nullptr;    ///< for a package body: its package
   std::vector<UseClause> uses;  ///< context clause with context references expanded
   bool bodyLooked = false;
   UnitScope* body = nullptr;  ///< for a package: its body, once looked up

@@ -172,7 +172,8 @@ Evaluator::Found Evaluator::resolve(const EvalContext& c, const Expr& e, size_t 
   const Expr& prefix = c.unit->arena[static_cast<size_t>(e.a)];
   UnitScope* package = nullptr;
   if (prefix.kind == ExprKind::Name) {
-    if (!m_Design.isLibraryName(prefix.key)) package = m_Design.package("work", prefix.key, *c.unit);
+    if (!m_Design.isLibraryName(prefix.key))
+      package = m_Design.package("work", prefix.key, *c.unit);
   } else if (prefix.kind == ExprKind::Selected) {
     const Expr& library = c.unit->arena[static_cast<size_t>(prefix.a)];
     if (library.kind == ExprKind::Name)
@@ -264,8 +265,10 @@ bool Evaluator::evalName(const EvalContext& c, const Expr& e, Value& out) {
       return true;
     }
     static constexpr std::pair<std::string_view, double> kMathConstants[] = {
-        {"math_pi", 3.14159265358979323846}, {"math_e", 2.71828182845904523536},
-        {"math_2_pi", 6.28318530717958647693}, {"math_log_of_2", 0.69314718055994530942}};
+        {"math_pi", 3.14159265358979323846},
+        {"math_e", 2.71828182845904523536},
+        {"math_2_pi", 6.28318530717958647693},
+        {"math_log_of_2", 0.69314718055994530942}};
     for (const auto& [name, v] : kMathConstants)
       if (equalsWord(e.text, name)) {
         out = Value::real(v);
@@ -280,8 +283,8 @@ bool Evaluator::evalCall(const EvalContext& c, const Expr& e, Value& out) {
   const Expr& prefix = c.unit->arena[static_cast<size_t>(e.a)];
   std::string_view text = c.unit->source->text().substr(prefix.begin, prefix.end - prefix.begin);
   Found f = resolve(c, prefix, e.args.size());
-  if (f.local != nullptr || (f.decl != nullptr && (isObjectDecl(f.decl->kind) ||
-                                                   f.decl->kind == DeclKind::Alias)) ||
+  if (f.local != nullptr ||
+      (f.decl != nullptr && (isObjectDecl(f.decl->kind) || f.decl->kind == DeclKind::Alias)) ||
       (!f && prefix.kind != ExprKind::Name && isValuePrefix(c, prefix))) {
     Value array;
     return eval(c, e.a, array) && indexValue(c, e, array, out);
@@ -386,23 +389,48 @@ bool Evaluator::applyBinary(const EvalContext& c, const Expr& e, const Value& a,
     int64_t r = 0;
     bool ok = true;
     switch (e.op) {
-      case Op::Add: ok = checkedAdd(x, y, r); break;
-      case Op::Sub: ok = checkedSub(x, y, r); break;
-      case Op::Mul: ok = checkedMul(x, y, r); break;
-      case Op::Div: ok = checkedDiv(x, y, r); break;
-      case Op::Rem: ok = y != 0 && checkedDiv(x, y, r) && checkedSub(x, r * y, r); break;
+      case Op::Add:
+        ok = checkedAdd(x, y, r);
+        break;
+      case Op::Sub:
+        ok = checkedSub(x, y, r);
+        break;
+      case Op::Mul:
+        ok = checkedMul(x, y, r);
+        break;
+      case Op::Div:
+        ok = checkedDiv(x, y, r);
+        break;
+      case Op::Rem:
+        ok = y != 0 && checkedDiv(x, y, r) && checkedSub(x, r * y, r);
+        break;
       case Op::Mod:
         ok = y != 0 && checkedDiv(x, y, r) && checkedSub(x, r * y, r);
         if (ok && r != 0 && ((r < 0) != (y < 0))) r += y;
         break;
-      case Op::Pow: ok = checkedPow(x, y, r); break;
-      case Op::Eq: out = Value::boolean(x == y); return true;
-      case Op::Ne: out = Value::boolean(x != y); return true;
-      case Op::Lt: out = Value::boolean(x < y); return true;
-      case Op::Le: out = Value::boolean(x <= y); return true;
-      case Op::Gt: out = Value::boolean(x > y); return true;
-      case Op::Ge: out = Value::boolean(x >= y); return true;
-      default: return failWith("cannot evaluate " + quoted(text));
+      case Op::Pow:
+        ok = checkedPow(x, y, r);
+        break;
+      case Op::Eq:
+        out = Value::boolean(x == y);
+        return true;
+      case Op::Ne:
+        out = Value::boolean(x != y);
+        return true;
+      case Op::Lt:
+        out = Value::boolean(x < y);
+        return true;
+      case Op::Le:
+        out = Value::boolean(x <= y);
+        return true;
+      case Op::Gt:
+        out = Value::boolean(x > y);
+        return true;
+      case Op::Ge:
+        out = Value::boolean(x >= y);
+        return true;
+      default:
+        return failWith("cannot evaluate " + quoted(text));
     }
     if (!ok) return failWith("arithmetic overflow or division by zero in " + quoted(text));
     out = Value::integer(r);
@@ -412,44 +440,89 @@ bool Evaluator::applyBinary(const EvalContext& c, const Expr& e, const Value& a,
   std::optional<double> y = b.toReal();
   if (x && y && !a.isBoolean() && !b.isBoolean()) {
     switch (e.op) {
-      case Op::Add: out = Value::real(*x + *y); return true;
-      case Op::Sub: out = Value::real(*x - *y); return true;
-      case Op::Mul: out = Value::real(*x * *y); return true;
+      case Op::Add:
+        out = Value::real(*x + *y);
+        return true;
+      case Op::Sub:
+        out = Value::real(*x - *y);
+        return true;
+      case Op::Mul:
+        out = Value::real(*x * *y);
+        return true;
       case Op::Div:
         if (*y == 0) return failWith("division by zero in " + quoted(text));
         out = Value::real(*x / *y);
         return true;
-      case Op::Pow: out = Value::real(std::pow(*x, *y)); return true;
-      case Op::Eq: out = Value::boolean(*x == *y); return true;
-      case Op::Ne: out = Value::boolean(*x != *y); return true;
-      case Op::Lt: out = Value::boolean(*x < *y); return true;
-      case Op::Le: out = Value::boolean(*x <= *y); return true;
-      case Op::Gt: out = Value::boolean(*x > *y); return true;
-      case Op::Ge: out = Value::boolean(*x >= *y); return true;
-      default: break;
+      case Op::Pow:
+        out = Value::real(std::pow(*x, *y));
+        return true;
+      case Op::Eq:
+        out = Value::boolean(*x == *y);
+        return true;
+      case Op::Ne:
+        out = Value::boolean(*x != *y);
+        return true;
+      case Op::Lt:
+        out = Value::boolean(*x < *y);
+        return true;
+      case Op::Le:
+        out = Value::boolean(*x <= *y);
+        return true;
+      case Op::Gt:
+        out = Value::boolean(*x > *y);
+        return true;
+      case Op::Ge:
+        out = Value::boolean(*x >= *y);
+        return true;
+      default:
+        break;
     }
   }
   if (a.isBoolean() && b.isBoolean()) {
     bool p = a.asBoolean();
     bool q = b.asBoolean();
     switch (e.op) {
-      case Op::And: out = Value::boolean(p && q); return true;
-      case Op::Or: out = Value::boolean(p || q); return true;
-      case Op::Xor: out = Value::boolean(p != q); return true;
-      case Op::Nand: out = Value::boolean(!(p && q)); return true;
-      case Op::Nor: out = Value::boolean(!(p || q)); return true;
-      case Op::Xnor: out = Value::boolean(p == q); return true;
-      case Op::Eq: out = Value::boolean(p == q); return true;
-      case Op::Ne: out = Value::boolean(p != q); return true;
-      default: break;
+      case Op::And:
+        out = Value::boolean(p && q);
+        return true;
+      case Op::Or:
+        out = Value::boolean(p || q);
+        return true;
+      case Op::Xor:
+        out = Value::boolean(p != q);
+        return true;
+      case Op::Nand:
+        out = Value::boolean(!(p && q));
+        return true;
+      case Op::Nor:
+        out = Value::boolean(!(p || q));
+        return true;
+      case Op::Xnor:
+        out = Value::boolean(p == q);
+        return true;
+      case Op::Eq:
+        out = Value::boolean(p == q);
+        return true;
+      case Op::Ne:
+        out = Value::boolean(p != q);
+        return true;
+      default:
+        break;
     }
   }
   if (a.isString() && b.isString()) {
     switch (e.op) {
-      case Op::Eq: out = Value::boolean(a.asString() == b.asString()); return true;
-      case Op::Ne: out = Value::boolean(a.asString() != b.asString()); return true;
-      case Op::Concat: out = Value::string(a.asString() + b.asString()); return true;
-      default: break;
+      case Op::Eq:
+        out = Value::boolean(a.asString() == b.asString());
+        return true;
+      case Op::Ne:
+        out = Value::boolean(a.asString() != b.asString());
+        return true;
+      case Op::Concat:
+        out = Value::string(a.asString() + b.asString());
+        return true;
+      default:
+        break;
     }
   }
   return failWith("cannot evaluate " + quoted(text));

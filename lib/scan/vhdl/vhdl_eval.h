@@ -76,11 +76,11 @@ class Evaluator {
 
   /// What an aggregate's target type tells about its elements and bounds.
   struct TargetType {
-    const Decl* record = nullptr;         ///< a record type: its fields
+    const Decl* record = nullptr;  ///< a record type: its fields
     UnitScope* recordUnit = nullptr;
-    bool constrained = false;             ///< an array with known bounds
+    bool constrained = false;  ///< an array with known bounds
     RangeValue bounds;
-    bool indexed = false;                 ///< an unconstrained array with a known index subtype
+    bool indexed = false;  ///< an unconstrained array with a known index subtype
     RangeValue index;
     const SubtypeIndication* element = nullptr;  ///< array element subtype, when known
     UnitScope* elementUnit = nullptr;
@@ -93,8 +93,7 @@ class Evaluator {
               const SubtypeIndication* subtype, Value& out);
   bool describeType(UnitScope* unit, const SubtypeIndication& subtype, TargetType& out, int depth);
   bool evalAggregate(const EvalContext& c, const Expr& e, const TargetType* type, Value& out);
-  bool evalRecordAggregate(const EvalContext& c, const Expr& e, const TargetType& type,
-                           Value& out);
+  bool evalRecordAggregate(const EvalContext& c, const Expr& e, const TargetType& type, Value& out);
   bool evalElement(const EvalContext& c, ExprId id, const TargetType* type, Value& out);
   bool indexValue(const EvalContext& c, const Expr& call, const Value& array, Value& out);
   /// True when `prefix` names a value (an object, a call or a field of one) rather than a

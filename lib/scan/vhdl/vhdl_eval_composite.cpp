@@ -58,7 +58,8 @@ bool Evaluator::evalAs(const EvalContext& c, ExprId id, UnitScope* typeUnit,
 
 bool Evaluator::describeType(UnitScope* unit, const SubtypeIndication& s, TargetType& out,
                              int depth) {
-  if (depth > limits::kVhdlDefinitionChain) return failWith("a subtype is defined in terms of itself");
+  if (depth > limits::kVhdlDefinitionChain)
+    return failWith("a subtype is defined in terms of itself");
   EvalContext c{unit, nullptr};
   if (!out.constrained && !s.indexConstraint.empty() &&
       unit->arena[static_cast<size_t>(s.indexConstraint[0])].kind != ExprKind::Open) {
@@ -185,7 +186,8 @@ bool Evaluator::evalAggregate(const EvalContext& c, const Expr& e, const TargetT
     }
   }
   if (!positional.empty() && !chosen.empty())
-    return failWith("aggregate " + quoted(sourceText(c, e)) + " mixes positional and named elements");
+    return failWith("aggregate " + quoted(sourceText(c, e)) +
+                    " mixes positional and named elements");
   RangeValue bounds;
   if (type != nullptr && type->constrained) {
     bounds = type->bounds;
@@ -233,8 +235,7 @@ bool Evaluator::evalAggregate(const EvalContext& c, const Expr& e, const TargetT
   return true;
 }
 
-bool Evaluator::indexValue(const EvalContext& c, const Expr& call, const Value& array,
-                           Value& out) {
+bool Evaluator::indexValue(const EvalContext& c, const Expr& call, const Value& array, Value& out) {
   std::string_view text = sourceText(c, call);
   if (!array.isComposite() || !array.asComposite().fields.empty() || call.args.size() != 1)
     return failWith("indexing " + quoted(text) + " is not supported in bounds");
@@ -258,10 +259,9 @@ bool Evaluator::isValuePrefix(const EvalContext& c, const Expr& prefix) {
       return true;
     case ExprKind::Name: {
       Found f = lookup(c, prefix.key, kAnyArity);
-      return f.local != nullptr ||
-             (f.decl != nullptr && (f.decl->kind == DeclKind::Constant ||
-                                    f.decl->kind == DeclKind::Generic ||
-                                    f.decl->kind == DeclKind::Alias));
+      return f.local != nullptr || (f.decl != nullptr && (f.decl->kind == DeclKind::Constant ||
+                                                          f.decl->kind == DeclKind::Generic ||
+                                                          f.decl->kind == DeclKind::Alias));
     }
     case ExprKind::Selected:
       return isValuePrefix(c, c.unit->arena[static_cast<size_t>(prefix.a)]);
@@ -274,7 +274,8 @@ bool Evaluator::selectField(const EvalContext& c, const Expr& e, Value& out) {
   Value record;
   if (!eval(c, e.a, record)) return false;
   const Composite* r = record.isComposite() ? &record.asComposite() : nullptr;
-  auto it = r ? std::find(r->fields.begin(), r->fields.end(), e.key) : std::vector<std::string>::const_iterator{};
+  auto it = r ? std::find(r->fields.begin(), r->fields.end(), e.key)
+              : std::vector<std::string>::const_iterator{};
   if (r == nullptr || it == r->fields.end())
     return failWith(quoted(sourceText(c, c.unit->arena[static_cast<size_t>(e.a)])) +
                     " has no field " + quoted(e.text));
@@ -291,7 +292,8 @@ bool Evaluator::evalImage(const EvalContext& c, const Expr& e, Value& out) {
   Found f = prefix.kind == ExprKind::Name || prefix.kind == ExprKind::Selected
                 ? resolve(c, prefix, kAnyArity)
                 : Found{};
-  for (int hops = 0; f.decl != nullptr && f.decl->kind == DeclKind::Subtype && hops < limits::kVhdlDefinitionChain;
+  for (int hops = 0; f.decl != nullptr && f.decl->kind == DeclKind::Subtype &&
+                     hops < limits::kVhdlDefinitionChain;
        ++hops)
     f = resolveMark(EvalContext{f.unit, nullptr}, f.decl->subtype.typeMark);
   if (f.decl != nullptr && f.decl->kind == DeclKind::EnumType && v.isInteger()) {
@@ -300,7 +302,8 @@ bool Evaluator::evalImage(const EvalContext& c, const Expr& e, Value& out) {
     if (position < 0 || position >= f.decl->position)
       return failWith("the value in " + quoted(sourceText(c, e)) + " is out of range");
     std::string_view name = f.unit->decls[at + 1 + static_cast<size_t>(position)].name;
-    out = Value::string(name[0] == '\\' || name[0] == '\'' ? std::string(name) : asciiLowered(name));
+    out =
+        Value::string(name[0] == '\\' || name[0] == '\'' ? std::string(name) : asciiLowered(name));
     return true;
   }
   if (v.isBoolean()) {

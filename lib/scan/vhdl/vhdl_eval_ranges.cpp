@@ -10,7 +10,6 @@
 namespace scan::vhdl {
 namespace {
 
-
 std::string markText(const std::vector<std::string_view>& mark) {
   std::string out;
   for (std::string_view part : mark) {
@@ -36,7 +35,8 @@ bool Evaluator::evalRange(const EvalContext& c, ExprId id, RangeValue& out) {
       if (!eval(c, e.a, left) || !eval(c, e.b, right)) return false;
       std::optional<int64_t> l = left.isInteger() ? left.toInteger() : std::nullopt;
       std::optional<int64_t> r = right.isInteger() ? right.toInteger() : std::nullopt;
-      if (!l || !r) return failWith("the bounds of " + quoted(sourceText(c, e)) + " are not integers");
+      if (!l || !r)
+        return failWith("the bounds of " + quoted(sourceText(c, e)) + " are not integers");
       out = RangeValue{*l, *r, e.op == Op::To};
       return true;
     }
@@ -113,8 +113,8 @@ bool Evaluator::declRange(UnitScope* unit, Decl& decl, RangeValue& out) {
       if (v.isComposite()) return compositeRange(v, decl.name, out);
       if (!v.isString()) return false;
       int64_t n = static_cast<int64_t>(v.asString().size());
-      bool isString = !decl.subtype.typeMark.empty() &&
-                      equalsWord(decl.subtype.typeMark.back(), "string");
+      bool isString =
+          !decl.subtype.typeMark.empty() && equalsWord(decl.subtype.typeMark.back(), "string");
       out = isString ? RangeValue{1, n, true} : RangeValue{0, n - 1, true};
       return true;
     }
@@ -140,7 +140,8 @@ bool Evaluator::compositeRange(const Value& v, std::string_view name, RangeValue
 }
 
 bool Evaluator::prefixRange(const EvalContext& c, const Expr& prefix, RangeValue& out) {
-  if (prefix.kind == ExprKind::Selected && isValuePrefix(c, c.unit->arena[static_cast<size_t>(prefix.a)])) {
+  if (prefix.kind == ExprKind::Selected &&
+      isValuePrefix(c, c.unit->arena[static_cast<size_t>(prefix.a)])) {
     Value v;
     if (!selectField(c, prefix, v)) return false;
     if (v.isComposite()) return compositeRange(v, prefix.text, out);
@@ -196,12 +197,18 @@ bool Evaluator::evalAttribute(const EvalContext& c, const Expr& e, Value& out) {
   if (attribute == "left" || attribute == "right" || attribute == "high" || attribute == "low" ||
       attribute == "length" || attribute == "ascending") {
     if (!prefixRange(c, prefix, r)) return false;
-    if (attribute == "left") out = Value::integer(r.left);
-    else if (attribute == "right") out = Value::integer(r.right);
-    else if (attribute == "high") out = Value::integer(r.high());
-    else if (attribute == "low") out = Value::integer(r.low());
-    else if (attribute == "length") out = Value::integer(r.length());
-    else out = Value::boolean(r.ascending);
+    if (attribute == "left")
+      out = Value::integer(r.left);
+    else if (attribute == "right")
+      out = Value::integer(r.right);
+    else if (attribute == "high")
+      out = Value::integer(r.high());
+    else if (attribute == "low")
+      out = Value::integer(r.low());
+    else if (attribute == "length")
+      out = Value::integer(r.length());
+    else
+      out = Value::boolean(r.ascending);
     return true;
   }
   return failWith("attribute " + quoted(sourceText(c, e)) + " is not supported in bounds");
@@ -217,7 +224,8 @@ Evaluator::Shape Evaluator::shapeOfDecl(UnitScope* unit, const Decl& decl, Range
   switch (decl.kind) {
     case DeclKind::ArrayType: {
       ExprId first = decl.indexRanges[0];
-      if (unit->arena[static_cast<size_t>(first)].kind == ExprKind::Box) return Shape::Unconstrained;
+      if (unit->arena[static_cast<size_t>(first)].kind == ExprKind::Box)
+        return Shape::Unconstrained;
       if (evalRange(c, first, out)) return Shape::Array;
       failed = &unit->arena[static_cast<size_t>(first)];
       return Shape::Failed;
@@ -234,9 +242,12 @@ Evaluator::Shape Evaluator::shapeOfDecl(UnitScope* unit, const Decl& decl, Range
       Found f = resolveMark(c, s.typeMark);
       if (f.decl != nullptr) return shapeOfDecl(f.unit, *f.decl, out, failed, depth + 1);
       switch (builtinShape(normalizeName(s.typeMark.back()))) {
-        case BuiltinShape::Scalar: return Shape::Scalar;
-        case BuiltinShape::UnconstrainedArray: return Shape::Unconstrained;
-        case BuiltinShape::NotBuiltin: return Shape::Unknown;
+        case BuiltinShape::Scalar:
+          return Shape::Scalar;
+        case BuiltinShape::UnconstrainedArray:
+          return Shape::Unconstrained;
+        case BuiltinShape::NotBuiltin:
+          return Shape::Unknown;
       }
       return Shape::Unknown;
     }
@@ -248,9 +259,12 @@ Evaluator::Shape Evaluator::shapeOfDecl(UnitScope* unit, const Decl& decl, Range
     case DeclKind::Alias: {  // of a predefined type: the aliases of declared ones were followed
       const Expr& target = unit->arena[static_cast<size_t>(decl.init)];
       switch (builtinShape(target.kind == ExprKind::Name ? target.key : std::string())) {
-        case BuiltinShape::Scalar: return Shape::Scalar;
-        case BuiltinShape::UnconstrainedArray: return Shape::Unconstrained;
-        case BuiltinShape::NotBuiltin: return Shape::Unknown;
+        case BuiltinShape::Scalar:
+          return Shape::Scalar;
+        case BuiltinShape::UnconstrainedArray:
+          return Shape::Unconstrained;
+        case BuiltinShape::NotBuiltin:
+          return Shape::Unknown;
       }
       return Shape::Unknown;
     }
@@ -281,9 +295,12 @@ Evaluator::Shape Evaluator::portShape(const EvalContext& c, const SubtypeIndicat
   Found f = resolveMark(c, s.typeMark);
   if (f.decl != nullptr) return shapeOfDecl(f.unit, *f.decl, out, failed, 0);
   switch (builtinShape(normalizeName(s.typeMark.back()))) {
-    case BuiltinShape::Scalar: return Shape::Scalar;
-    case BuiltinShape::UnconstrainedArray: return Shape::Unconstrained;
-    case BuiltinShape::NotBuiltin: return Shape::Unknown;
+    case BuiltinShape::Scalar:
+      return Shape::Scalar;
+    case BuiltinShape::UnconstrainedArray:
+      return Shape::Unconstrained;
+    case BuiltinShape::NotBuiltin:
+      return Shape::Unknown;
   }
   return Shape::Unknown;
 }

@@ -24,8 +24,7 @@ Token nextToken(Lexer& lexer) {
 std::string join(const std::vector<Token>& tokens, size_t from, size_t to) {
   std::string out;
   for (size_t i = from; i < to && i < tokens.size(); ++i) {
-    if (i > from && tokens[i].offset > tokens[i - 1].offset + tokens[i - 1].text.size())
-      out += ' ';
+    if (i > from && tokens[i].offset > tokens[i - 1].offset + tokens[i - 1].text.size()) out += ' ';
     out += tokens[i].text;
   }
   return out;
@@ -36,9 +35,12 @@ template <typename Stop>
 size_t findOutside(const std::vector<Token>& tokens, size_t from, Stop stop) {
   long depth = 0;
   for (size_t i = from; i < tokens.size(); ++i) {
-    if (tokens[i].is('(')) ++depth;
-    else if (tokens[i].is(')')) --depth;
-    else if (depth == 0 && stop(tokens[i])) return i;
+    if (tokens[i].is('('))
+      ++depth;
+    else if (tokens[i].is(')'))
+      --depth;
+    else if (depth == 0 && stop(tokens[i]))
+      return i;
   }
   return tokens.size();
 }
@@ -70,9 +72,9 @@ void addObjects(const std::vector<Token>& tokens, std::vector<InterfaceText>& ou
     out.push_back(std::move(item));
   }
   if (i < tokens.size()) ++i;
-  if (i < tokens.size() && (isWord(tokens[i], "in") || isWord(tokens[i], "out") ||
-                            isWord(tokens[i], "inout") || isWord(tokens[i], "buffer") ||
-                            isWord(tokens[i], "linkage")))
+  if (i < tokens.size() &&
+      (isWord(tokens[i], "in") || isWord(tokens[i], "out") || isWord(tokens[i], "inout") ||
+       isWord(tokens[i], "buffer") || isWord(tokens[i], "linkage")))
     ++i;
   size_t assign = findOutside(tokens, i, [](const Token& t) { return t.isSymbol(":="); });
   size_t typeEnd = findOutside(tokens, i, [](const Token& t) { return isWord(t, "bus"); });
@@ -123,8 +125,10 @@ bool readList(Lexer& lexer, std::vector<InterfaceText>& out) {
       if (t.is(')')) return true;
       continue;
     }
-    if (t.is('(')) ++depth;
-    else if (t.is(')')) --depth;
+    if (t.is('('))
+      ++depth;
+    else if (t.is(')'))
+      --depth;
     element.push_back(t);
   }
 }

@@ -15,13 +15,20 @@ namespace {
 
 const char* kindWord(UnitKind kind) {
   switch (kind) {
-    case UnitKind::Entity: return "entity";
-    case UnitKind::Architecture: return "architecture";
-    case UnitKind::Package: return "package";
-    case UnitKind::PackageBody: return "package body";
-    case UnitKind::PackageInstance: return "package";
-    case UnitKind::Configuration: return "configuration";
-    case UnitKind::Context: return "context";
+    case UnitKind::Entity:
+      return "entity";
+    case UnitKind::Architecture:
+      return "architecture";
+    case UnitKind::Package:
+      return "package";
+    case UnitKind::PackageBody:
+      return "package body";
+    case UnitKind::PackageInstance:
+      return "package";
+    case UnitKind::Configuration:
+      return "configuration";
+    case UnitKind::Context:
+      return "context";
   }
   return "unit";
 }
@@ -227,8 +234,8 @@ void DesignIndex::registerUnit(UnitRecord unit, size_t nameOffset, const SourceB
     m_Diagnostics.warning(source, nameOffset,
                           std::string(kindWord(unit.kind)) + " '" + unit.name +
                               "' is already defined in library '" + unit.library + "' at " +
-                              m_Sources[first.file]->path() + ":" +
-                              std::to_string(where.line) + "; this definition is ignored");
+                              m_Sources[first.file]->path() + ":" + std::to_string(where.line) +
+                              "; this definition is ignored");
     return;
   }
   m_Units.push_back(std::move(unit));

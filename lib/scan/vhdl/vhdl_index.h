@@ -19,7 +19,13 @@ class Diagnostics;
 namespace scan::vhdl {
 
 enum class UnitKind : uint8_t {
-  Entity, Architecture, Package, PackageBody, PackageInstance, Configuration, Context,
+  Entity,
+  Architecture,
+  Package,
+  PackageBody,
+  PackageInstance,
+  Configuration,
+  Context,
 };
 
 /// `use a.b.c;` (or `context a.b;`) as normalized names.
@@ -33,7 +39,7 @@ struct UnitRecord {
   std::string name;     ///< normalized
   std::string library;  ///< normalized
   uint32_t file = 0;
-  size_t offset = 0;    ///< the unit's first keyword
+  size_t offset = 0;  ///< the unit's first keyword
   std::vector<UseClause> uses;
 };
 

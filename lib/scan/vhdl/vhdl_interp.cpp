@@ -16,7 +16,8 @@ bool Evaluator::callFunction(UnitScope* unit, Decl& decl, const std::vector<Valu
       if (const std::vector<size_t>* list = body->find(decl.key))
         for (size_t i : *list) {
           Decl& d = body->decls[i];
-          if (d.kind == DeclKind::Function && d.hasBody && d.parameterCount == decl.parameterCount) {
+          if (d.kind == DeclKind::Function && d.hasBody &&
+              d.parameterCount == decl.parameterCount) {
             bodyDecl = &d;
             bodyUnit = body;
             break;
@@ -36,7 +37,8 @@ bool Evaluator::callFunction(UnitScope* unit, Decl& decl, const std::vector<Valu
   frame.locals.resize(fn->locals.size());
   EvalContext outer{bodyUnit, nullptr};
   for (size_t i = 0; i < fn->parameters.size(); ++i) {
-    if (i < args.size()) frame.parameters[i] = args[i];
+    if (i < args.size())
+      frame.parameters[i] = args[i];
     else if (fn->parameters[i].init == kNoExpr)
       return failWith("missing argument " + quoted(fn->parameters[i].name) + " to " +
                       quoted(decl.name));
@@ -82,8 +84,8 @@ bool Evaluator::callFunction(UnitScope* unit, Decl& decl, const std::vector<Valu
 Evaluator::Flow Evaluator::execute(const EvalContext& c, const std::vector<int32_t>& list,
                                    Value& result, std::string_view& label) {
   for (int32_t index : list) {
-    Flow flow = executeOne(c, c.frame->function->statements[static_cast<size_t>(index)], result,
-                           label);
+    Flow flow =
+        executeOne(c, c.frame->function->statements[static_cast<size_t>(index)], result, label);
     if (flow != Flow::Normal) return flow;
   }
   return Flow::Normal;
@@ -93,7 +95,8 @@ Evaluator::Flow Evaluator::loopBody(const EvalContext& c, const Stmt& s, Value& 
                                     std::string_view& label, bool& stop) {
   Flow flow = execute(c, s.branches[0], result, label);
   if (flow == Flow::Exit || flow == Flow::Next) {
-    bool mine = label.empty() || (!s.label.empty() && normalizeName(label) == normalizeName(s.label));
+    bool mine =
+        label.empty() || (!s.label.empty() && normalizeName(label) == normalizeName(s.label));
     if (mine) {
       label = {};
       stop = flow == Flow::Exit;
@@ -171,9 +174,10 @@ Evaluator::Flow Evaluator::executeOne(const EvalContext& c, const Stmt& s, Value
           } else if (!match) {
             Value v;
             if (!eval(c, choice, v)) return Flow::Failed;
-            match = (v.isInteger() && selector.isInteger() && v.asInteger() == selector.asInteger()) ||
-                    (v.isString() && selector.isString() && v.asString() == selector.asString()) ||
-                    (v.isBoolean() && selector.isBoolean() && v.asBoolean() == selector.asBoolean());
+            match =
+                (v.isInteger() && selector.isInteger() && v.asInteger() == selector.asInteger()) ||
+                (v.isString() && selector.isString() && v.asString() == selector.asString()) ||
+                (v.isBoolean() && selector.isBoolean() && v.asBoolean() == selector.asBoolean());
           }
           if (match) return execute(c, s.branches[i], result, label);
         }

@@ -23,8 +23,7 @@ constexpr std::array<uint8_t, 256> makeClasses() {
     else if (c >= '0' && c <= '9')
       t[c] = Digit;
   }
-  for (char c : std::string_view("&()*+,-./:;<=>|[]?@'"))
-    t[static_cast<unsigned char>(c)] = Delim;
+  for (char c : std::string_view("&()*+,-./:;<=>|[]?@'")) t[static_cast<unsigned char>(c)] = Delim;
   return t;
 }
 
@@ -36,20 +35,121 @@ inline bool isWordChar(char c) {
   return k == Letter || k == Digit || c == '_';
 }
 
-constexpr std::string_view kReserved[] = {
-    "abs", "access", "after", "alias", "all", "and", "architecture", "array", "assert",
-    "assume", "assume_guarantee", "attribute", "begin", "block", "body", "buffer", "bus",
-    "case", "component", "configuration", "constant", "context", "cover", "default",
-    "disconnect", "downto", "else", "elsif", "end", "entity", "exit", "fairness", "file",
-    "for", "force", "function", "generate", "generic", "group", "guarded", "if", "impure",
-    "in", "inertial", "inout", "is", "label", "library", "linkage", "literal", "loop", "map",
-    "mod", "nand", "new", "next", "nor", "not", "null", "of", "on", "open", "or", "others",
-    "out", "package", "parameter", "port", "postponed", "procedure", "process", "property",
-    "protected", "pure", "range", "record", "register", "reject", "release", "rem", "report",
-    "restrict", "restrict_guarantee", "return", "rol", "ror", "select", "sequence",
-    "severity", "shared", "signal", "sla", "sll", "sra", "srl", "strong", "subtype", "then",
-    "to", "transport", "type", "unaffected", "units", "until", "use", "variable", "vmode",
-    "vprop", "vunit", "wait", "when", "while", "with", "xnor", "xor"};
+constexpr std::string_view kReserved[] = {"abs",
+                                          "access",
+                                          "after",
+                                          "alias",
+                                          "all",
+                                          "and",
+                                          "architecture",
+                                          "array",
+                                          "assert",
+                                          "assume",
+                                          "assume_guarantee",
+                                          "attribute",
+                                          "begin",
+                                          "block",
+                                          "body",
+                                          "buffer",
+                                          "bus",
+                                          "case",
+                                          "component",
+                                          "configuration",
+                                          "constant",
+                                          "context",
+                                          "cover",
+                                          "default",
+                                          "disconnect",
+                                          "downto",
+                                          "else",
+                                          "elsif",
+                                          "end",
+                                          "entity",
+                                          "exit",
+                                          "fairness",
+                                          "file",
+                                          "for",
+                                          "force",
+                                          "function",
+                                          "generate",
+                                          "generic",
+                                          "group",
+                                          "guarded",
+                                          "if",
+                                          "impure",
+                                          "in",
+                                          "inertial",
+                                          "inout",
+                                          "is",
+                                          "label",
+                                          "library",
+                                          "linkage",
+                                          "literal",
+                                          "loop",
+                                          "map",
+                                          "mod",
+                                          "nand",
+                                          "new",
+                                          "next",
+                                          "nor",
+                                          "not",
+                                          "null",
+                                          "of",
+                                          "on",
+                                          "open",
+                                          "or",
+                                          "others",
+                                          "out",
+                                          "package",
+                                          "parameter",
+                                          "port",
+                                          "postponed",
+                                          "procedure",
+                                          "process",
+                                          "property",
+                                          "protected",
+                                          "pure",
+                                          "range",
+                                          "record",
+                                          "register",
+                                          "reject",
+                                          "release",
+                                          "rem",
+                                          "report",
+                                          "restrict",
+                                          "restrict_guarantee",
+                                          "return",
+                                          "rol",
+                                          "ror",
+                                          "select",
+                                          "sequence",
+                                          "severity",
+                                          "shared",
+                                          "signal",
+                                          "sla",
+                                          "sll",
+                                          "sra",
+                                          "srl",
+                                          "strong",
+                                          "subtype",
+                                          "then",
+                                          "to",
+                                          "transport",
+                                          "type",
+                                          "unaffected",
+                                          "units",
+                                          "until",
+                                          "use",
+                                          "variable",
+                                          "vmode",
+                                          "vprop",
+                                          "vunit",
+                                          "wait",
+                                          "when",
+                                          "while",
+                                          "with",
+                                          "xnor",
+                                          "xor"};
 
 // A base specifier of a bit-string literal: b o x d, optionally prefixed by u or s.
 bool isBaseSpecifier(const char* p, size_t n) {
@@ -257,18 +357,34 @@ Token Lexer::next() {
   char n = m_Cursor[1];
   size_t length = 1;
   switch (c) {
-    case '=': length = n == '>' ? 2 : 1; break;
-    case '*': length = n == '*' ? 2 : 1; break;
-    case ':': length = n == '=' ? 2 : 1; break;
-    case '/': length = n == '=' ? 2 : 1; break;
-    case '>': length = n == '=' ? 2 : 1; break;
-    case '<': length = n == '=' || n == '>' ? 2 : 1; break;
-    case '?':
-      if (n == '/' && m_Cursor[2] == '=') length = 3;
-      else if ((n == '<' || n == '>') && m_Cursor[2] == '=') length = 3;
-      else if (n == '?' || n == '=' || n == '<' || n == '>') length = 2;
+    case '=':
+      length = n == '>' ? 2 : 1;
       break;
-    default: break;
+    case '*':
+      length = n == '*' ? 2 : 1;
+      break;
+    case ':':
+      length = n == '=' ? 2 : 1;
+      break;
+    case '/':
+      length = n == '=' ? 2 : 1;
+      break;
+    case '>':
+      length = n == '=' ? 2 : 1;
+      break;
+    case '<':
+      length = n == '=' || n == '>' ? 2 : 1;
+      break;
+    case '?':
+      if (n == '/' && m_Cursor[2] == '=')
+        length = 3;
+      else if ((n == '<' || n == '>') && m_Cursor[2] == '=')
+        length = 3;
+      else if (n == '?' || n == '=' || n == '<' || n == '>')
+        length = 2;
+      break;
+    default:
+      break;
   }
   m_Cursor += length;
   return make(TokenKind::Symbol, start);

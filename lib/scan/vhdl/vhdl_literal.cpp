@@ -117,8 +117,10 @@ Value bitStringValue(std::string_view text) {
     size_t size = std::strtoul(std::string(text.substr(0, letters)).c_str(), nullptr, 10);
     if (size > (1u << 20)) return {};
     char fill = isSigned && !bits.empty() ? bits[0] : '0';
-    if (bits.size() < size) bits.insert(0, size - bits.size(), fill);
-    else bits.erase(0, bits.size() - size);
+    if (bits.size() < size)
+      bits.insert(0, size - bits.size(), fill);
+    else
+      bits.erase(0, bits.size() - size);
   }
   return Value::string(std::move(bits));
 }

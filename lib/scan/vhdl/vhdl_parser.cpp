@@ -30,7 +30,9 @@ std::string quoted(std::string_view text) {
 
 Parser::Parser(const SourceBuffer& source, size_t offset, ExprArena& arena,
                Diagnostics& diagnostics)
-    : m_Source(source), m_Lexer(source.text(), offset), m_Arena(arena),
+    : m_Source(source),
+      m_Lexer(source.text(), offset),
+      m_Arena(arena),
       m_Diagnostics(diagnostics) {}
 
 const Token& Parser::peek(size_t ahead) {
@@ -81,8 +83,10 @@ bool Parser::acceptSymbol(std::string_view symbol) {
 }
 
 bool Parser::fail(size_t offset, std::string_view text) {
-  if (!m_Failed && m_WarnOnly) m_Diagnostics.warning(m_Source, offset, text);
-  else if (!m_Failed) m_Diagnostics.error(m_Source, offset, text);
+  if (!m_Failed && m_WarnOnly)
+    m_Diagnostics.warning(m_Source, offset, text);
+  else if (!m_Failed)
+    m_Diagnostics.error(m_Source, offset, text);
   m_Failed = true;
   return false;
 }
@@ -119,8 +123,10 @@ void Parser::skipPast(char symbol) {
   while (!m_Failed && peek().kind != TokenKind::End) {
     Token t = take();
     if (depth <= 0 && t.is(symbol)) return;
-    if (t.is('(')) ++depth;
-    else if (t.is(')')) --depth;
+    if (t.is('('))
+      ++depth;
+    else if (t.is(')'))
+      --depth;
   }
 }
 
@@ -153,8 +159,8 @@ bool Parser::skipSubprogramBody() {
       if (!peekWord("new")) ++open;
     } else if (equalsWord(t.text, "end")) {
       static constexpr std::string_view kStatementEnds[] = {
-          "if", "case", "loop", "record", "units", "protected", "component", "block",
-          "process", "generate", "for"};
+          "if",        "case",  "loop",    "record",   "units", "protected",
+          "component", "block", "process", "generate", "for"};
       bool statement = false;
       for (std::string_view word : kStatementEnds) statement = statement || peekWord(word);
       if (statement) {

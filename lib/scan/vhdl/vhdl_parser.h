@@ -25,8 +25,7 @@ std::string quoted(std::string_view text);
 class Parser {
  public:
   /// Parses `source` from byte `offset`; expressions are appended to `arena`.
-  Parser(const SourceBuffer& source, size_t offset, ExprArena& arena,
-         Diagnostics& diagnostics);
+  Parser(const SourceBuffer& source, size_t offset, ExprArena& arena, Diagnostics& diagnostics);
 
   /// Report lexical errors as they are met. Without this the parser only fails on them, for
   /// text the index pass has already read and reported.

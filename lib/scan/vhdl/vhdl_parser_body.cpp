@@ -7,7 +7,8 @@
 namespace scan::vhdl {
 bool Parser::parseFunction(FunctionBody& body) {
   m_WarnOnly = true;
-  if (acceptWord("pure") || acceptWord("impure")) {}
+  if (acceptWord("pure") || acceptWord("impure")) {
+  }
   if (!expectWord("function")) return false;
   if (!isName(peek())) return failHere("expected a function name");
   body.name = take().text;
@@ -57,8 +58,7 @@ bool Parser::parseFunction(FunctionBody& body) {
 
 bool Parser::parseStatements(FunctionBody& body, std::vector<int32_t>& list) {
   while (!m_Failed) {
-    if (peekWord("end") || peekWord("elsif") || peekWord("else") || peekWord("when"))
-      return true;
+    if (peekWord("end") || peekWord("elsif") || peekWord("else") || peekWord("when")) return true;
     if (peek().kind == TokenKind::End) return failHere("expected 'end'");
     if (!parseStatement(body, list)) return false;
   }

@@ -28,8 +28,8 @@ bool Parser::parseInterfaceList(std::vector<Decl>& out, DeclKind kind) {
       out.resize(first);
       return false;
     };
-    if (peekWord("type") || peekWord("function") || peekWord("procedure") ||
-        peekWord("impure") || peekWord("pure") || peekWord("package")) {
+    if (peekWord("type") || peekWord("function") || peekWord("procedure") || peekWord("impure") ||
+        peekWord("pure") || peekWord("package")) {
       // Generic subprograms and packages carry no bounds for ports; ports of a generic type
       // are scalars as far as ranges go.
       if (peekWord("type") && isName(peek(1))) {
@@ -68,11 +68,16 @@ bool Parser::parseInterfaceList(std::vector<Decl>& out, DeclKind kind) {
       }
       if (!expect(':')) return dropGroup();
       Mode mode = Mode::In;
-      if (acceptWord("in")) mode = Mode::In;
-      else if (acceptWord("out")) mode = Mode::Out;
-      else if (acceptWord("inout")) mode = Mode::Inout;
-      else if (acceptWord("buffer")) mode = Mode::Buffer;
-      else if (acceptWord("linkage")) mode = Mode::Linkage;
+      if (acceptWord("in"))
+        mode = Mode::In;
+      else if (acceptWord("out"))
+        mode = Mode::Out;
+      else if (acceptWord("inout"))
+        mode = Mode::Inout;
+      else if (acceptWord("buffer"))
+        mode = Mode::Buffer;
+      else if (acceptWord("linkage"))
+        mode = Mode::Linkage;
       SubtypeIndication subtype;
       if (!parseSubtypeIndication(subtype)) return dropGroup();
       acceptWord("bus");
@@ -326,9 +331,12 @@ bool Parser::parseTypeDeclaration(std::vector<Decl>& out) {
 bool Parser::parseSubprogram(std::vector<Decl>& out) {
   size_t start = peek().offset;
   bool isFunction = true;
-  if (acceptWord("pure") || acceptWord("impure")) {}
-  if (acceptWord("procedure")) isFunction = false;
-  else if (!expectWord("function")) return false;
+  if (acceptWord("pure") || acceptWord("impure")) {
+  }
+  if (acceptWord("procedure"))
+    isFunction = false;
+  else if (!expectWord("function"))
+    return false;
   const Token& nameToken = peek();
   if (!isName(nameToken) && nameToken.kind != TokenKind::String)
     return failHere("expected a subprogram name");

@@ -93,12 +93,18 @@ ExprId Parser::parseExpression() {
   }
   for (;;) {
     Op op = Op::None;
-    if (peekWord("and")) op = Op::And;
-    else if (peekWord("or")) op = Op::Or;
-    else if (peekWord("xor")) op = Op::Xor;
-    else if (peekWord("nand")) op = Op::Nand;
-    else if (peekWord("nor")) op = Op::Nor;
-    else if (peekWord("xnor")) op = Op::Xnor;
+    if (peekWord("and"))
+      op = Op::And;
+    else if (peekWord("or"))
+      op = Op::Or;
+    else if (peekWord("xor"))
+      op = Op::Xor;
+    else if (peekWord("nand"))
+      op = Op::Nand;
+    else if (peekWord("nor"))
+      op = Op::Nor;
+    else if (peekWord("xnor"))
+      op = Op::Xnor;
     if (op == Op::None || left == kNoExpr) break;
     take();
     left = binary(op, left, parseRelation());
@@ -112,12 +118,18 @@ ExprId Parser::parseRelation() {
   Op op = Op::None;
   if (t.kind == TokenKind::Symbol) {
     std::string_view s = t.text;
-    if (s == "=" || s == "?=") op = Op::Eq;
-    else if (s == "/=" || s == "?/=") op = Op::Ne;
-    else if (s == "<" || s == "?<") op = Op::Lt;
-    else if (s == "<=" || s == "?<=") op = Op::Le;
-    else if (s == ">" || s == "?>") op = Op::Gt;
-    else if (s == ">=" || s == "?>=") op = Op::Ge;
+    if (s == "=" || s == "?=")
+      op = Op::Eq;
+    else if (s == "/=" || s == "?/=")
+      op = Op::Ne;
+    else if (s == "<" || s == "?<")
+      op = Op::Lt;
+    else if (s == "<=" || s == "?<=")
+      op = Op::Le;
+    else if (s == ">" || s == "?>")
+      op = Op::Gt;
+    else if (s == ">=" || s == "?>=")
+      op = Op::Ge;
   }
   if (op == Op::None || left == kNoExpr) return left;
   take();
@@ -138,14 +150,20 @@ ExprId Parser::parseShift() {
 ExprId Parser::parseSimple() {
   size_t begin = peek().offset;
   ExprId left;
-  if (accept('-')) left = unary(Op::Neg, parseTerm(), begin);
-  else if (accept('+')) left = unary(Op::Plus, parseTerm(), begin);
-  else left = parseTerm();
+  if (accept('-'))
+    left = unary(Op::Neg, parseTerm(), begin);
+  else if (accept('+'))
+    left = unary(Op::Plus, parseTerm(), begin);
+  else
+    left = parseTerm();
   for (;;) {
     Op op = Op::None;
-    if (peek().is('+')) op = Op::Add;
-    else if (peek().is('-')) op = Op::Sub;
-    else if (peek().is('&')) op = Op::Concat;
+    if (peek().is('+'))
+      op = Op::Add;
+    else if (peek().is('-'))
+      op = Op::Sub;
+    else if (peek().is('&'))
+      op = Op::Concat;
     if (op == Op::None || left == kNoExpr) return left;
     take();
     left = binary(op, left, parseTerm());
@@ -156,10 +174,14 @@ ExprId Parser::parseTerm() {
   ExprId left = parseFactor();
   for (;;) {
     Op op = Op::None;
-    if (peek().is('*')) op = Op::Mul;
-    else if (peek().is('/')) op = Op::Div;
-    else if (peekWord("mod")) op = Op::Mod;
-    else if (peekWord("rem")) op = Op::Rem;
+    if (peek().is('*'))
+      op = Op::Mul;
+    else if (peek().is('/'))
+      op = Op::Div;
+    else if (peekWord("mod"))
+      op = Op::Mod;
+    else if (peekWord("rem"))
+      op = Op::Rem;
     if (op == Op::None || left == kNoExpr) return left;
     take();
     left = binary(op, left, parseFactor());
@@ -300,8 +322,8 @@ ExprId Parser::parseName() {
   while (id != kNoExpr && !m_Failed) {
     size_t begin = m_Arena[id].begin;
     uint16_t depth = static_cast<uint16_t>(m_Arena[id].depth + 1);
-    if (peek().is('.') && (isName(peek(1)) || peekWord("all", 1) ||
-                           peek(1).kind == TokenKind::String)) {
+    if (peek().is('.') &&
+        (isName(peek(1)) || peekWord("all", 1) || peek(1).kind == TokenKind::String)) {
       take();
       Token suffix = take();
       Expr s;

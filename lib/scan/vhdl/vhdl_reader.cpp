@@ -35,13 +35,19 @@ std::string oneLine(std::string_view text) {
 
 const char* kindName(UnitKind kind) {
   switch (kind) {
-    case UnitKind::Entity: return "entity";
-    case UnitKind::Architecture: return "architecture";
+    case UnitKind::Entity:
+      return "entity";
+    case UnitKind::Architecture:
+      return "architecture";
     case UnitKind::Package:
-    case UnitKind::PackageInstance: return "package";
-    case UnitKind::PackageBody: return "package body";
-    case UnitKind::Configuration: return "configuration";
-    case UnitKind::Context: return "context";
+    case UnitKind::PackageInstance:
+      return "package";
+    case UnitKind::PackageBody:
+      return "package body";
+    case UnitKind::Configuration:
+      return "configuration";
+    case UnitKind::Context:
+      return "context";
   }
   return "unit";
 }
@@ -91,7 +97,8 @@ std::vector<ScanUnitInfo> VhdlReader::listUnits() const {
 std::string VhdlReader::contextOf(const UnitRecord& unit) const {
   size_t begin = 0;
   for (const UnitRecord& other : m_Index.unitsMet())
-    if (other.file == unit.file && other.offset < unit.offset) begin = std::max(begin, other.offset);
+    if (other.file == unit.file && other.offset < unit.offset)
+      begin = std::max(begin, other.offset);
   return contextClauseText(m_Index.source(unit).text(), begin, unit.offset);
 }
 
@@ -137,8 +144,9 @@ ScanPort VhdlReader::readPort(UnitScope& entity, const Decl& decl, const Interfa
         port.setRange(static_cast<int32_t>(range.left), static_cast<int32_t>(range.right),
                       range.ascending);
       } else {
-        m_Diagnostics.warning(source, decl.offset,
-                              "port '" + name + "': its bounds do not fit in 32 bits; no range reported");
+        m_Diagnostics.warning(
+            source, decl.offset,
+            "port '" + name + "': its bounds do not fit in 32 bits; no range reported");
         port.setRangeUnknown("port '" + name + "': its bounds do not fit in 32 bits");
       }
       break;
@@ -152,9 +160,9 @@ ScanPort VhdlReader::readPort(UnitScope& entity, const Decl& decl, const Interfa
       std::string_view text = owner ? owner->source->text() : std::string_view();
       std::string what = owner ? oneLine(text.substr(failed->begin, failed->end - failed->begin))
                                : std::string("its range");
-      m_Diagnostics.warning(source, decl.offset,
-                            "port '" + name + "': cannot evaluate " + what + " (" + reason +
-                                "); no range reported");
+      m_Diagnostics.warning(
+          source, decl.offset,
+          "port '" + name + "': cannot evaluate " + what + " (" + reason + "); no range reported");
       std::string expression =
           owner ? normalizedText(text, failed->begin, failed->end) : std::string("its range");
       const Expr* own = owner == &entity ? failed : nullptr;
@@ -167,9 +175,9 @@ ScanPort VhdlReader::readPort(UnitScope& entity, const Decl& decl, const Interfa
                             "port '" + name + "': type '" + typeName +
                                 "' is not declared in any visible package; no range reported");
       std::string hint = m_Describer.failureHint(entity, nullptr, decl.subtype.typeMark, "");
-      port.setRangeUnknown("port '" + name + "': type '" + typeName + "' is not declared: " +
-                           (hint.empty() ? "add the design file of the package that declares it"
-                                         : hint));
+      port.setRangeUnknown(
+          "port '" + name + "': type '" + typeName + "' is not declared: " +
+          (hint.empty() ? "add the design file of the package that declares it" : hint));
       break;
     }
     case Evaluator::Shape::Scalar:

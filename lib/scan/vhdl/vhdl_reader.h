@@ -20,8 +20,11 @@ namespace scan::vhdl {
 class VhdlReader final : public LanguageReader {
  public:
   explicit VhdlReader(Diagnostics& diagnostics, ScanSettings settings = {})
-      : m_Diagnostics(diagnostics), m_Settings(std::move(settings)), m_Index(diagnostics),
-        m_Design(m_Index, diagnostics), m_Evaluator(m_Design),
+      : m_Diagnostics(diagnostics),
+        m_Settings(std::move(settings)),
+        m_Index(diagnostics),
+        m_Design(m_Index, diagnostics),
+        m_Evaluator(m_Design),
         m_Describer(m_Design, m_Evaluator, diagnostics) {}
 
   void indexFiles(const std::vector<DesignFileEntry>& files) override;

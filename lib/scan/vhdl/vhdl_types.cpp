@@ -31,15 +31,31 @@ bool roundToInteger(double v, int64_t& out) {
 }
 
 BuiltinShape builtinShape(std::string_view name) {
-  static constexpr std::string_view kArrays[] = {
-      "std_logic_vector", "std_ulogic_vector", "bit_vector", "string", "unsigned", "signed",
-      "boolean_vector", "integer_vector", "real_vector", "time_vector", "ufixed", "sfixed",
-      "float", "unresolved_unsigned", "unresolved_signed", "u_unsigned", "u_signed",
-      "u_ufixed", "u_sfixed", "float32", "float64"};
+  static constexpr std::string_view kArrays[] = {"std_logic_vector",
+                                                 "std_ulogic_vector",
+                                                 "bit_vector",
+                                                 "string",
+                                                 "unsigned",
+                                                 "signed",
+                                                 "boolean_vector",
+                                                 "integer_vector",
+                                                 "real_vector",
+                                                 "time_vector",
+                                                 "ufixed",
+                                                 "sfixed",
+                                                 "float",
+                                                 "unresolved_unsigned",
+                                                 "unresolved_signed",
+                                                 "u_unsigned",
+                                                 "u_signed",
+                                                 "u_ufixed",
+                                                 "u_sfixed",
+                                                 "float32",
+                                                 "float64"};
   static constexpr std::string_view kScalars[] = {
-      "std_logic", "std_ulogic", "bit", "boolean", "integer", "natural", "positive", "real",
-      "character", "time", "delay_length", "severity_level", "file_open_kind", "x01", "x01z",
-      "ux01", "ux01z"};
+      "std_logic",      "std_ulogic", "bit",       "boolean", "integer",      "natural",
+      "positive",       "real",       "character", "time",    "delay_length", "severity_level",
+      "file_open_kind", "x01",        "x01z",      "ux01",    "ux01z"};
   for (std::string_view a : kArrays)
     if (a == name) return BuiltinShape::UnconstrainedArray;
   for (std::string_view s : kScalars)
@@ -53,12 +69,15 @@ bool builtinRange(std::string_view name, RangeValue& out) {
     int64_t low;
     int64_t high;
   };
-  static constexpr Entry kRanges[] = {
-      {"integer", kIntegerLow, kIntegerHigh}, {"natural", 0, kIntegerHigh},
-      {"positive", 1, kIntegerHigh},         {"boolean", 0, 1},
-      {"bit", 0, 1},                         {"character", 0, 255},
-      {"std_ulogic", 0, 8},                  {"std_logic", 0, 8},
-      {"severity_level", 0, 3}};
+  static constexpr Entry kRanges[] = {{"integer", kIntegerLow, kIntegerHigh},
+                                      {"natural", 0, kIntegerHigh},
+                                      {"positive", 1, kIntegerHigh},
+                                      {"boolean", 0, 1},
+                                      {"bit", 0, 1},
+                                      {"character", 0, 255},
+                                      {"std_ulogic", 0, 8},
+                                      {"std_logic", 0, 8},
+                                      {"severity_level", 0, 3}};
   for (const Entry& e : kRanges)
     if (e.name == name) {
       out = RangeValue{e.low, e.high, true};

@@ -22,9 +22,15 @@ TEST(StringBase, Compare) {
     int mode;
     int expected;
   } cases[] = {
-      {"verilog", "VERILOG", 0, 1}, {"VeRiLoG", "verilog", 1, 0}, {"abd", "abc", 1, 1},
-      {"ab", "abc", 0, -1},         {"", "", 0, 0},               {"a\0b"s, "a\0c"s, 0, -1},
-      {"a\0b"s, "a"s, 0, 1},        {"\xe9", "\xc9", 1, 1},       {"\xff", "a", 0, 1},
+      {"verilog", "VERILOG", 0, 1},
+      {"VeRiLoG", "verilog", 1, 0},
+      {"abd", "abc", 1, 1},
+      {"ab", "abc", 0, -1},
+      {"", "", 0, 0},
+      {"a\0b"s, "a\0c"s, 0, -1},
+      {"a\0b"s, "a"s, 0, 1},
+      {"\xe9", "\xc9", 1, 1},
+      {"\xff", "a", 0, 1},
       {"[", "{", 1, -1},
   };
   for (const auto& c : cases) {

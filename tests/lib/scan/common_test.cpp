@@ -29,11 +29,20 @@ struct ArithmeticCase {
 };
 
 const ArithmeticCase kArithmetic[] = {
-    {"+", 2, 3, true, 5},       {"+", kMax, 1, false, 0},   {"-", kMin, 1, false, 0},
-    {"-", 0, kMin, false, 0},   {"*", 1 << 20, 1 << 20, true, int64_t{1} << 40},
-    {"*", kMax / 2 + 1, 2, false, 0}, {"/", 7, -2, true, -3}, {"/", 1, 0, false, 0},
-    {"/", kMin, -1, false, 0},  {"**", 2, 62, true, int64_t{1} << 62}, {"**", 2, 63, false, 0},
-    {"**", -3, 3, true, -27},   {"**", 5, 0, true, 1},      {"**", 2, -1, false, 0},
+    {"+", 2, 3, true, 5},
+    {"+", kMax, 1, false, 0},
+    {"-", kMin, 1, false, 0},
+    {"-", 0, kMin, false, 0},
+    {"*", 1 << 20, 1 << 20, true, int64_t{1} << 40},
+    {"*", kMax / 2 + 1, 2, false, 0},
+    {"/", 7, -2, true, -3},
+    {"/", 1, 0, false, 0},
+    {"/", kMin, -1, false, 0},
+    {"**", 2, 62, true, int64_t{1} << 62},
+    {"**", 2, 63, false, 0},
+    {"**", -3, 3, true, -27},
+    {"**", 5, 0, true, 1},
+    {"**", 2, -1, false, 0},
     {"**", 1, kMax, true, 1},
 };
 
@@ -73,12 +82,9 @@ struct LocateCase {
 };
 
 const LocateCase kLocate[] = {
-    {"", 0, 1, 1, ""},
-    {"abc", 2, 1, 3, "abc"},
-    {"ab\ncd", 3, 2, 1, "cd"},
-    {"ab\r\ncd\r\n", 5, 2, 2, "cd"},
-    {"ab\n", 3, 2, 1, ""},
-    {"ab\ncd", 99, 2, 3, "cd"},
+    {"", 0, 1, 1, ""},         {"abc", 2, 1, 3, "abc"},
+    {"ab\ncd", 3, 2, 1, "cd"}, {"ab\r\ncd\r\n", 5, 2, 2, "cd"},
+    {"ab\n", 3, 2, 1, ""},     {"ab\ncd", 99, 2, 3, "cd"},
 };
 
 class Locate : public testing::TestWithParam<LocateCase> {};
@@ -96,10 +102,11 @@ TEST_P(Locate, FindsLineAndColumn) {
 INSTANTIATE_TEST_SUITE_P(Scan, Locate, testing::ValuesIn(kLocate));
 
 TEST(Diagnostics, FormatsWithCaretUnderTheColumn) {
-  auto buffer = scan::SourceBuffer::fromText("f.vhd", "x\n\tab\x01" "c\n");
+  auto buffer = scan::SourceBuffer::fromText("f.vhd",
+                                             "x\n\tab\x01"
+                                             "c\n");
   scan::Diagnostic d{scan::Severity::Warning, buffer.get(), {}, 5, "bad \x02 thing"};
-  EXPECT_EQ(scan::Diagnostics::format(d),
-            "f.vhd:2:4: warning: bad ? thing\n  \tab?c\n  \t  ^\n");
+  EXPECT_EQ(scan::Diagnostics::format(d), "f.vhd:2:4: warning: bad ? thing\n  \tab?c\n  \t  ^\n");
   scan::Diagnostic whole{scan::Severity::Error, nullptr, "g.vhd", 0, "No such file"};
   EXPECT_EQ(scan::Diagnostics::format(whole), "g.vhd: error: No such file\n");
 }

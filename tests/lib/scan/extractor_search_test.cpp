@@ -13,7 +13,8 @@ namespace {
 std::string fixture(const std::string& name) {
   const char* root = std::getenv("PINFORGE_SOURCE_DIR");
   std::string here = __FILE__;
-  std::string base = root ? std::string(root) + "/tests" : here.substr(0, here.rfind("/tests/") + 6);
+  std::string base =
+      root ? std::string(root) + "/tests" : here.substr(0, here.rfind("/tests/") + 6);
   return base + "/fixtures/vhdl/" + name;
 }
 
@@ -26,17 +27,31 @@ struct SearchCase {
 };
 
 const SearchCase kCases[] = {
-    {"named_library_wins", {{"alib", "order_a.vhd"}, {"work", "order_b.vhd"}}, "work",
-     ScanExtractor::SearchAllLibraries, "from_b"},
-    {"registration_order_after_the_named_library",
-     {{"blib", "order_b.vhd"}, {"alib", "order_a.vhd"}}, "work", ScanExtractor::SearchAllLibraries,
+    {"named_library_wins",
+     {{"alib", "order_a.vhd"}, {"work", "order_b.vhd"}},
+     "work",
+     ScanExtractor::SearchAllLibraries,
      "from_b"},
-    {"named_library_only", {{"alib", "order_a.vhd"}}, "work", ScanExtractor::SearchNamedLibraryOnly,
+    {"registration_order_after_the_named_library",
+     {{"blib", "order_b.vhd"}, {"alib", "order_a.vhd"}},
+     "work",
+     ScanExtractor::SearchAllLibraries,
+     "from_b"},
+    {"named_library_only",
+     {{"alib", "order_a.vhd"}},
+     "work",
+     ScanExtractor::SearchNamedLibraryOnly,
      nullptr},
-    {"named_library_other_than_work", {{"alib", "order_a.vhd"}, {"blib", "order_b.vhd"}}, "blib",
-     ScanExtractor::SearchNamedLibraryOnly, "from_b"},
-    {"library_names_ignore_case", {{"WORK", "order_a.vhd"}}, "work",
-     ScanExtractor::SearchNamedLibraryOnly, "from_a"},
+    {"named_library_other_than_work",
+     {{"alib", "order_a.vhd"}, {"blib", "order_b.vhd"}},
+     "blib",
+     ScanExtractor::SearchNamedLibraryOnly,
+     "from_b"},
+    {"library_names_ignore_case",
+     {{"WORK", "order_a.vhd"}},
+     "work",
+     ScanExtractor::SearchNamedLibraryOnly,
+     "from_a"},
 };
 
 class LibrarySearch : public testing::TestWithParam<SearchCase> {};

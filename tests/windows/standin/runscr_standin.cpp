@@ -17,7 +17,8 @@ int main(int argc, char** argv) {
   }
   std::string script;
   char buffer[8192];
-  for (size_t got; (got = std::fread(buffer, 1, sizeof buffer, in)) > 0;) script.append(buffer, got);
+  for (size_t got; (got = std::fread(buffer, 1, sizeof buffer, in)) > 0;)
+    script.append(buffer, got);
   std::fclose(in);
   std::FILE* out = std::fopen("driver.tcl", "wb");
   if (out == nullptr || std::fwrite(script.data(), 1, script.size(), out) != script.size() ||

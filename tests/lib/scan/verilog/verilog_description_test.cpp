@@ -28,8 +28,8 @@ const char* kindName(ScanPort::Kind kind) {
 }
 
 const char* directionName(int direction) {
-  static const char* const names[] = {"?", "in", "out", "inout", "buffer", "linkage", "ref",
-                                      "interface"};
+  static const char* const names[] = {"?",      "in",      "out", "inout",
+                                      "buffer", "linkage", "ref", "interface"};
   return direction >= 1 && direction <= 7 ? names[direction] : names[0];
 }
 
@@ -304,10 +304,8 @@ const std::vector<ProblemCase>& problemCases() {
        "port 'data': cannot evaluate [W-1:0]: parameter 'W' has no value; give one with -g "
        "W=VALUE"},
       {"OverrideGivesTheMissingValue",
-       "module m #(parameter W) (input logic [W-1:0] data);\nendmodule\n",
-       overrides({{"W", "3"}}),
-       "data",
-       ""},
+       "module m #(parameter W) (input logic [W-1:0] data);\nendmodule\n", overrides({{"W", "3"}}),
+       "data", ""},
       {"ScopedTypeOfAMissingPackage",
        "module m (input axi_pkg::req_t req);\nendmodule\n",
        {},
@@ -459,8 +457,8 @@ TEST(VerilogCommandLineTest, BadValuesAreErrorsNamingTheSwitch) {
 }
 
 TEST(VerilogCommandLineTest, HostileValuesEndInMessages) {
-  const std::vector<std::string> values = {
-      std::string("1\0", 2), "`NO_SUCH_MACRO", std::string(100000, '('), "\"open", "1 /* open"};
+  const std::vector<std::string> values = {std::string("1\0", 2), "`NO_SUCH_MACRO",
+                                           std::string(100000, '('), "\"open", "1 /* open"};
   for (const std::string& value : values) {
     SCOPED_TRACE(value.substr(0, 20));
     ScanSettings settings;

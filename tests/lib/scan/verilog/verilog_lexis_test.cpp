@@ -20,13 +20,20 @@ namespace {
 
 char kindLetter(TokenKind kind) {
   switch (kind) {
-    case TokenKind::Identifier: return 'I';
-    case TokenKind::SystemName: return 'S';
-    case TokenKind::Directive: return 'D';
-    case TokenKind::Number: return 'N';
-    case TokenKind::String: return 'Q';
-    case TokenKind::Symbol: return 'P';
-    case TokenKind::End: return 'E';
+    case TokenKind::Identifier:
+      return 'I';
+    case TokenKind::SystemName:
+      return 'S';
+    case TokenKind::Directive:
+      return 'D';
+    case TokenKind::Number:
+      return 'N';
+    case TokenKind::String:
+      return 'Q';
+    case TokenKind::Symbol:
+      return 'P';
+    case TokenKind::End:
+      return 'E';
   }
   return '?';
 }
@@ -62,15 +69,13 @@ INSTANTIATE_TEST_SUITE_P(
     testing::Values(
         LexCase{"EscapedIdentifierDropsItsBlank", "\\bus[0] , \\a+b\tx",
                 "I:\\bus[0] P:, I:\\a+b I:x"},
-        LexCase{"CommentsAndAttributesVanish", "a // c\n/* b */ (* keep *) b",
-                "I:a I:b"},
+        LexCase{"CommentsAndAttributesVanish", "a // c\n/* b */ (* keep *) b", "I:a I:b"},
         LexCase{"EventStarIsNoAttribute", "@(*)", "P:@ P:( P:* P:)"},
         LexCase{"BasedNumbersWithBlanksAndUnknowns", "8 'h FF 4'b1x?z 'sd5 12'o7_7",
                 "N:8 'h FF N:4'b1x?z N:'sd5 N:12'o7_7"},
         LexCase{"UnbasedAndTimeLiterals", "'1 '0 'z 10ns 1.5e3 2step",
                 "N:'1 N:'0 N:'z N:10ns N:1.5e3 N:2step"},
-        LexCase{"AssignmentPatternAndCast", "'{a} int'(x)",
-                "P:'{ I:a P:} I:int P:' P:( I:x P:)"},
+        LexCase{"AssignmentPatternAndCast", "'{a} int'(x)", "P:'{ I:a P:} I:int P:' P:( I:x P:)"},
         LexCase{"StringsKeepEscapes", "\"a \\\"b\\\" // c\" d", "Q:\"a \\\"b\\\" // c\" I:d"},
         LexCase{"OperatorsMaxMunch", "a<<<=b>>>c===d!==e**f->g::h+:i|->j",
                 "I:a P:<<<= I:b P:>>> I:c P:=== I:d P:!== I:e P:** I:f P:-> I:g P::: I:h P:+: "
@@ -160,8 +165,8 @@ INSTANTIATE_TEST_SUITE_P(
                        "[ 7 : 0 ] [ 3 : 1 ] [ 5 : 0 ]"},
         PreprocessCase{"NestedParenthesesInArguments", "`define F(a, b) a+b\n`F((1,2), {3,4})",
                        "( 1 , 2 ) + { 3 , 4 }"},
-        PreprocessCase{"PasteAndStringify", "`define P(a, b) a``b\n`define S(x) `\"x`\"\n`P(n, 1) `S(hi)",
-                       "n1 \"hi\""},
+        PreprocessCase{"PasteAndStringify",
+                       "`define P(a, b) a``b\n`define S(x) `\"x`\"\n`P(n, 1) `S(hi)", "n1 \"hi\""},
         PreprocessCase{"NoSubstitutionInStrings", "`define F(x) \"x\" x\n`F(7)", "\"x\" 7"},
         PreprocessCase{"MacroUsingMacro", "`define A 2\n`define B (`A * `A)\n`B", "( 2 * 2 )"},
         PreprocessCase{"ArgumentWithMacro", "`define A 5\n`define F(x) x+1\n`F(`A)", "5 + 1"},
@@ -170,8 +175,8 @@ INSTANTIATE_TEST_SUITE_P(
                        "x"},
         PreprocessCase{"ElsifTakesFirstDefined",
                        "`define C\n`ifdef A a `elsif B b `elsif C c `else d `endif", "c"},
-        PreprocessCase{"SkippedDefineHasNoEffect", "`ifdef NO `define X 1 `endif\n`ifdef X y `endif",
-                       ""},
+        PreprocessCase{"SkippedDefineHasNoEffect",
+                       "`ifdef NO `define X 1 `endif\n`ifdef X y `endif", ""},
         PreprocessCase{"Undef", "`define X 1\n`undef X\n`ifdef X a `else b `endif", "b"},
         PreprocessCase{"UndefineAll", "`define X 1\n`undefineall\n`ifndef X gone `endif", "gone"},
         PreprocessCase{"IgnoredDirectives",
@@ -254,26 +259,24 @@ INSTANTIATE_TEST_SUITE_P(
     testing::Values(
         EvalCase{"1 + 2 * 3 - 4 / 2", "5"}, EvalCase{"2 ** 3 ** 2", "64"},
         EvalCase{"(1 + 2) * 3", "9"}, EvalCase{"-7 % 3", "-1"}, EvalCase{"1 << 4 | 1", "17"},
-        EvalCase{"-16 >>> 2", "-4"}, EvalCase{"8'hF0 >> 4", "15"},
-        EvalCase{"5 & 3 ^ 1 | 8", "8"}, EvalCase{"~0", "-1"}, EvalCase{"!3 || 0", "0"},
+        EvalCase{"-16 >>> 2", "-4"}, EvalCase{"8'hF0 >> 4", "15"}, EvalCase{"5 & 3 ^ 1 | 8", "8"},
+        EvalCase{"~0", "-1"}, EvalCase{"!3 || 0", "0"},
         EvalCase{"3 > 2 && 2 >= 2 && 1 < 2 && 1 <= 1 && 1 == 1 && 1 != 2", "1"},
         EvalCase{"P > 3 ? Q : 0", "10"}, EvalCase{"N", "4"}, EvalCase{"Q[3:1]", "5"},
         EvalCase{"Q[1]", "1"}, EvalCase{"Q[0+:3]", "2"}, EvalCase{"&4'b1111", "1"},
-        EvalCase{"|Q", "1"}, EvalCase{"^3'b111", "1"},
-        EvalCase{"{4'h1, 4'h2}", "18"}, EvalCase{"{2{2'b10}}", "10"},
+        EvalCase{"|Q", "1"}, EvalCase{"^3'b111", "1"}, EvalCase{"{4'h1, 4'h2}", "18"},
+        EvalCase{"{2{2'b10}}", "10"},
         EvalCase{"$clog2(1) + $clog2(2) * 10 + $clog2(1025) * 100", "1110"},
-        EvalCase{"$bits(N) + $bits(logic [3:0][1:0])", "12"},
-        EvalCase{"R * 2", "real 5.000000"}, EvalCase{"$rtoi(R) + $ceil(R)", "real 5.000000"},
-        EvalCase{"\"ab\" == \"ab\"", "1"}, EvalCase{"int'(P) + 4'(1)", "6"},
-        EvalCase{"1 / 0", "error: division by zero"},
+        EvalCase{"$bits(N) + $bits(logic [3:0][1:0])", "12"}, EvalCase{"R * 2", "real 5.000000"},
+        EvalCase{"$rtoi(R) + $ceil(R)", "real 5.000000"}, EvalCase{"\"ab\" == \"ab\"", "1"},
+        EvalCase{"int'(P) + 4'(1)", "6"}, EvalCase{"1 / 0", "error: division by zero"},
         EvalCase{"9223372036854775807 + 1", "error: arithmetic overflow in '+'"},
         // Unsigned operands wrap at the wider operand's width, an integer counting 32 bits.
         EvalCase{"32'd0 - 1", "4294967295"}, EvalCase{"4'd3 - 4'd4", "15"},
         EvalCase{"8'hFF + 1", "256"}, EvalCase{"-8'd1", "255"}, EvalCase{"~4'b0101", "10"},
         EvalCase{"32'd0 - 1 > 5", "1"}, EvalCase{"Q[0] - 1", "4294967295"},
         EvalCase{"$signed(8'hFF)", "-1"}, EvalCase{"$unsigned(-1)", "4294967295"},
-        EvalCase{"8'hFF << 1", "254"}, EvalCase{"4'sd7 + 4'sd7", "14"},
-        EvalCase{"80'h5 + 1", "6"},
+        EvalCase{"8'hFF << 1", "254"}, EvalCase{"4'sd7 + 4'sd7", "14"}, EvalCase{"80'h5 + 1", "6"},
         EvalCase{"80'h1_0000_0000_0000_0000", "error: the literal does not fit in 64 bits"},
         EvalCase{"99999999999999999999", "error: the literal does not fit in 64 bits"},
         EvalCase{"UNKNOWN + 1", "error: unknown name 'UNKNOWN'"},

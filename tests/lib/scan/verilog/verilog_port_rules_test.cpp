@@ -13,8 +13,8 @@ namespace {
 
 // "name type direction [left:right]" (ascending marked with "a"), or "... -" without range.
 std::string describe(const ScanPort& port) {
-  std::string out = std::string(port.name()) + " " + port.typeName() + " " +
-                    std::to_string(port.direction());
+  std::string out =
+      std::string(port.name()) + " " + port.typeName() + " " + std::to_string(port.direction());
   if (!port.hasRange()) return out + " -";
   int32_t left = 0, right = 0;
   port.getBounds(left, right);
@@ -26,7 +26,8 @@ std::vector<std::string> portsOf(const std::vector<std::string>& files, const ch
   scan::Diagnostics diagnostics(nullptr);
   scan::verilog::VerilogReader reader(diagnostics);
   int n = 0;
-  for (const std::string& text : files) reader.indexText("f" + std::to_string(n++) + ".sv", text, "work");
+  for (const std::string& text : files)
+    reader.indexText("f" + std::to_string(n++) + ".sv", text, "work");
   std::vector<std::string> out;
   if (!reader.selectUnit("work", unit)) return {"not found"};
   scan::UnitDescription description;
@@ -100,11 +101,13 @@ INSTANTIATE_TEST_SUITE_P(
                  {"module m #(parameter logic [3:0] P = 4'hA, int Q = P + 1, type T = bit [Q:0])\n"
                   " (input T a, input [P:0] b); endmodule"},
                  {"a T 1 [11:0]", "b  1 [10:0]"}},
-        RuleCase{"UnitInElseBranch", {"`ifdef NEVER\n`else\nmodule m(input a);\nendmodule\n`endif"},
+        RuleCase{"UnitInElseBranch",
+                 {"`ifdef NEVER\n`else\nmodule m(input a);\nendmodule\n`endif"},
                  {"a  1 -"}},
-        RuleCase{"DefineInBodyReachesLaterFiles",
-                 {"module first; `define LATER 9\nendmodule", "module m(input [`LATER:0] a); endmodule"},
-                 {"a  1 [9:0]"}},
+        RuleCase{
+            "DefineInBodyReachesLaterFiles",
+            {"module first; `define LATER 9\nendmodule", "module m(input [`LATER:0] a); endmodule"},
+            {"a  1 [9:0]"}},
         RuleCase{"DuplicateInLaterFileIgnored",
                  {"module m(input a); endmodule", "module m(output [1:0] z); endmodule"},
                  {"a  1 -"}},

@@ -30,9 +30,9 @@ const std::map<std::string, size_t> kImpliedWidths = {
 
 // Type names that are Verilog keywords rather than user types.
 const std::set<std::string> kBuiltinTypes = {
-    "",       "wire",    "reg",     "logic",   "bit",      "tri",     "tri0",    "tri1",
-    "triand", "trior",   "wand",    "wor",     "uwire",    "var",     "integer", "int",
-    "shortint", "longint", "byte",  "time",    "signed",   "unsigned", "supply0", "supply1"};
+    "",         "wire",    "reg",  "logic", "bit",    "tri",      "tri0",    "tri1",
+    "triand",   "trior",   "wand", "wor",   "uwire",  "var",      "integer", "int",
+    "shortint", "longint", "byte", "time",  "signed", "unsigned", "supply0", "supply1"};
 
 int directionCode(const std::string& direction) {
   if (direction == "input") return ScanPort::Input;
@@ -58,8 +58,7 @@ bool lineInSource(const std::string& src, int line) {
       while (at < src.size() && std::isdigit(static_cast<unsigned char>(src[at]))) ++at;
       if (at == digits) return false;
       if (part % 2 == 0) *bounds[part / 2] = std::atoi(src.c_str() + digits);
-      if (part < 3 && (at == src.size() || src[at++] != (part % 2 == 0 ? '.' : '-')))
-        return false;
+      if (part < 3 && (at == src.size() || src[at++] != (part % 2 == 0 ? '.' : '-'))) return false;
     }
     return true;
   };
@@ -173,8 +172,8 @@ class YosysDifferential : public ::testing::TestWithParam<std::string> {
     for (size_t i = 0; i < modules.size(); ++i) {
       const std::string json = m_Workdir + "/top" + std::to_string(i) + ".json";
       if (!together) {
-        const ToolRun run = yosys(
-            files, "hierarchy -top " + modules[i] + "\nwrite_json " + json + "\n", "top");
+        const ToolRun run =
+            yosys(files, "hierarchy -top " + modules[i] + "\nwrite_json " + json + "\n", "top");
         if (run.status != 0) {
           std::cout << "  note: module " << modules[i]
                     << " left out, Yosys cannot elaborate it: " << firstErrorLine(run.output)
@@ -224,8 +223,7 @@ class YosysDifferential : public ::testing::TestWithParam<std::string> {
                     << "), Yosys has no such port";
     // Yosys numbers ports of struct and enum types after all others, so with user types
     // its order says nothing.
-    if (oursByName.empty() && ours.size() == ports.size() && oursOrder != theirOrder &&
-        !userTypes)
+    if (oursByName.empty() && ours.size() == ports.size() && oursOrder != theirOrder && !userTypes)
       ADD_FAILURE() << where << ": port order: ours " << oursOrder << "; Yosys " << theirOrder;
   }
 

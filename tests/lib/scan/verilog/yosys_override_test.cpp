@@ -64,21 +64,32 @@ constexpr const char* kClogs =
 // follow an override, constant functions and $clog2. ansi_basic.v and functions.v hold the
 // same constructs but use SV that Yosys does not read, hence the two modules of their own.
 const OverrideCase kCases[] = {
-    {"ExpressionsTruncationAndDerivedParameters", "diff_params.v", "diff_params",
+    {"ExpressionsTruncationAndDerivedParameters",
+     "diff_params.v",
+     "diff_params",
      {{"DATA_W", "4 * 2", "8"},
       {"LOW", "2", "2"},
       {"MODE", "5'b10110", "5'b10110"},
       {"DEPTH", "100", "100"}}},
     {"DerivedParameterSetItself", "diff_params.v", "diff_params", {{"HIGH", "12", "12"}}},
     {"AscendingRanges", "diff_params.v", "diff_params_ascending", {{"N", "7", "7"}}},
-    {"BodyParametersOfANonAnsiModule", "diff_nonansi.v", "diff_nonansi",
+    {"BodyParametersOfANonAnsiModule",
+     "diff_nonansi.v",
+     "diff_nonansi",
      {{"WIDTH", "5", "5"}, {"OFFSET", "2", "2"}}},
-    {"ConstantFunctionOfAnOverride", "diff_nonansi.v", "diff_nonansi_func",
+    {"ConstantFunctionOfAnOverride",
+     "diff_nonansi.v",
+     "diff_nonansi_func",
      {{"N", "1000", "1000"}}},
-    {"OperatorsOverOverrides", "diff_operators.v", "diff_operators",
+    {"OperatorsOverOverrides",
+     "diff_operators.v",
+     "diff_operators",
      {{"A", "9", "9"}, {"B", "2", "2"}, {"MASK", "8'h3C", "8'h3C"}}},
-    {"TypedParametersAndAFollowingLocalparam", "typed.sv", "typed",
-     {{"W", "3", "3"}, {"M", "5'd20", "5'd20"}}, kTyped},
+    {"TypedParametersAndAFollowingLocalparam",
+     "typed.sv",
+     "typed",
+     {{"W", "3", "3"}, {"M", "5'd20", "5'd20"}},
+     kTyped},
     {"ClogAndFunctionsOfABodyParameter", "clogs.v", "clogs", {{"DEPTH", "17", "17"}}, kClogs},
 };
 
@@ -121,7 +132,7 @@ std::string theirRange(const nlohmann::json& port) {
 
 // Types whose width the type itself gives; such a port has no range of its own.
 const std::map<std::string, std::string> kImpliedRanges = {{"integer", "[31:0]"},
-                                                          {"int", "[31:0]"}};
+                                                           {"int", "[31:0]"}};
 
 /// Every port's range by name, as the reader gives it with `settings`; empty when the module
 /// is not found.

@@ -190,10 +190,13 @@ std::string probeLine(size_t index, const std::string& port, ProbeKind kind) {
 
 ProbeKind nextKind(ProbeKind kind) {
   switch (kind) {
-    case ProbeKind::Array: return ProbeKind::Scalar;
-    case ProbeKind::Scalar: return ProbeKind::Positional;
+    case ProbeKind::Array:
+      return ProbeKind::Scalar;
+    case ProbeKind::Scalar:
+      return ProbeKind::Positional;
     case ProbeKind::Positional:
-    case ProbeKind::Opaque: break;
+    case ProbeKind::Opaque:
+      break;
   }
   return ProbeKind::Opaque;
 }
@@ -299,7 +302,7 @@ std::set<std::string> unitKeys(const std::string& text) {
 }
 
 struct FixtureState {
-  std::string workdir;  ///< private copy of the shared libraries with the fixture analysed
+  std::string workdir;    ///< private copy of the shared libraries with the fixture analysed
   std::string rejection;  ///< why GHDL does not analyse the fixture; empty when it does
   bool isPackageFile = false;
   bool declaresEntity = false;
@@ -516,8 +519,8 @@ class GhdlDifferential : public ::testing::TestWithParam<std::string> {
   void comparePort(const std::string& where, const GhdlPort& theirs, const GhdlBounds& bounds,
                    const ScanPort& ours) {
     if (ours.direction() != modeCode(theirs.mode))
-      ADD_FAILURE() << where << ": direction: ours " << ours.direction() << ", GHDL "
-                    << theirs.mode << " (" << modeCode(theirs.mode) << ")";
+      ADD_FAILURE() << where << ": direction: ours " << ours.direction() << ", GHDL " << theirs.mode
+                    << " (" << modeCode(theirs.mode) << ")";
     if (!theirs.typeMark.empty() && lowerCase(ours.typeName()) != lowerCase(theirs.typeMark))
       ADD_FAILURE() << where << ": type: ours \"" << ours.typeName() << "\", GHDL \""
                     << theirs.typeMark << "\"";
@@ -537,9 +540,9 @@ class GhdlDifferential : public ::testing::TestWithParam<std::string> {
       return;
     }
     const std::string oursRange = describeRange(ours);
-    const bool integerBounds = (bounds.kind == ProbeKind::Array ||
-                                bounds.kind == ProbeKind::Scalar) &&
-                               isInteger(bounds.left) && isInteger(bounds.right);
+    const bool integerBounds =
+        (bounds.kind == ProbeKind::Array || bounds.kind == ProbeKind::Scalar) &&
+        isInteger(bounds.left) && isInteger(bounds.right);
     std::string theirRange = "no range";
     if (integerBounds)
       theirRange = bounds.left + (bounds.ascending ? " to " : " downto ") + bounds.right;
@@ -557,12 +560,11 @@ class GhdlDifferential : public ::testing::TestWithParam<std::string> {
         oursRange == bounds.left + " downto " + bounds.right)
       return;
     ADD_FAILURE() << where << ": range: ours " << oursRange << ", GHDL " << theirRange
-                  << (bounds.kind == ProbeKind::Array        ? " (array)"
-                      : bounds.kind == ProbeKind::Scalar     ? " (scalar)"
-                      : bounds.kind == ProbeKind::Positional ? " (enumeration-indexed array of " +
-                                                                   std::to_string(bounds.length) +
-                                                                   ")"
-                                                             : " (record)");
+                  << (bounds.kind == ProbeKind::Array    ? " (array)"
+                      : bounds.kind == ProbeKind::Scalar ? " (scalar)"
+                      : bounds.kind == ProbeKind::Positional
+                          ? " (enumeration-indexed array of " + std::to_string(bounds.length) + ")"
+                          : " (record)");
   }
 
   static long long rangeLength(const ScanPort& port) {
@@ -641,8 +643,8 @@ TEST_P(GhdlDifferential, PortsMatchGhdl) {
       continue;
     }
     ++compared;
-    if (extractor.findDesignUnit("work", entity.name.c_str(),
-                                 ScanExtractor::SearchAllLibraries) != 0) {
+    if (extractor.findDesignUnit("work", entity.name.c_str(), ScanExtractor::SearchAllLibraries) !=
+        0) {
       ADD_FAILURE() << file << ": entity " << entity.name << " (line " << entity.line
                     << "): not found by ours";
       continue;

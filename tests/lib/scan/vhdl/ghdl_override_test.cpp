@@ -54,9 +54,9 @@ std::vector<std::string> ourBounds(const Case& c) {
       int32_t left = 0;
       int32_t right = 0;
       p->getBounds(left, right);
-      bounds.push_back(p->hasRange() ? name + " " + std::to_string(left) + " " +
-                                           std::to_string(right)
-                                     : name + " no range");
+      bounds.push_back(p->hasRange()
+                           ? name + " " + std::to_string(left) + " " + std::to_string(right)
+                           : name + " no range");
     }
   return bounds;
 }

@@ -35,8 +35,7 @@ std::string rangeOf(const ScanPort& port) {
   int32_t left = 0;
   int32_t right = 0;
   port.getBounds(left, right);
-  return std::to_string(left) + (port.isAscending() ? " to " : " downto ") +
-         std::to_string(right);
+  return std::to_string(left) + (port.isAscending() ? " to " : " downto ") + std::to_string(right);
 }
 
 const ScanPort* portNamed(const scan::UnitDescription& unit, const std::string& name) {
@@ -100,8 +99,7 @@ TEST(VhdlDescription, Vhdl2008GenericTypesSubprogramsAndPackages) {
   expectGenerics(
       d.unit.generics,
       {{"data_t", K::Type, "", "", nullptr, 7},
-       {"combine", K::Subprogram, "function combine (a, b : data_t) return data_t", "", nullptr,
-        8},
+       {"combine", K::Subprogram, "function combine (a, b : data_t) return data_t", "", nullptr, 8},
        {"fixed", K::Package, "new ieee.fixed_generic_pkg generic map (<>)", "", nullptr, 9},
        {"WIDTH", K::Constant, "natural", "8", "8", 10}});
   EXPECT_EQ(d.unit.context, "library ieee;\ncontext ieee.ieee_std_context;");
@@ -159,20 +157,38 @@ TEST(VhdlDescription, OverridesChangeValuesAndEveryWidthUsingThem) {
     std::vector<std::pair<const char*, const char*>> ranges;  ///< port, range
   };
   const Case cases[] = {
-      {"integer", "describe_top", {{"XLEN", "64"}}, {{"XLEN", "64"}},
+      {"integer",
+       "describe_top",
+       {{"XLEN", "64"}},
+       {{"XLEN", "64"}},
        {{"data", "63 downto 0"}, {"wide", "63 downto 0"}}},
-      {"names_ignore_case_and_values_are_expressions", "describe_top",
-       {{"xlen", "BUS_W * 2"}, {"half", "4"}}, {{"XLEN", "24"}, {"HALF", "4"}},
+      {"names_ignore_case_and_values_are_expressions",
+       "describe_top",
+       {{"xlen", "BUS_W * 2"}, {"half", "4"}},
+       {{"XLEN", "24"}, {"HALF", "4"}},
        {{"data", "23 downto 0"}, {"lower", "3 downto 0"}}},
-      {"last_one_wins", "describe_top", {{"XLEN", "8"}, {"XLEN", "9"}}, {{"XLEN", "9"}},
+      {"last_one_wins",
+       "describe_top",
+       {{"XLEN", "8"}, {"XLEN", "9"}},
+       {{"XLEN", "9"}},
        {{"data", "8 downto 0"}}},
-      {"other_literal_kinds", "describe_top",
-       {{"NAME", "\"xyz\""}, {"MODE", "done"}, {"ENABLE", "false"}, {"INIT", "'0'"},
+      {"other_literal_kinds",
+       "describe_top",
+       {{"NAME", "\"xyz\""},
+        {"MODE", "done"},
+        {"ENABLE", "false"},
+        {"INIT", "'0'"},
         {"RATIO", "1.25"}},
-       {{"NAME", "\"xyz\""}, {"MODE", "DONE"}, {"ENABLE", "false"}, {"INIT", "'0'"},
+       {{"NAME", "\"xyz\""},
+        {"MODE", "DONE"},
+        {"ENABLE", "false"},
+        {"INIT", "'0'"},
         {"RATIO", "1.25"}},
        {}},
-      {"generic_without_default", "describe_open", {{"WIDTH", "3"}}, {{"WIDTH", "3"}},
+      {"generic_without_default",
+       "describe_open",
+       {{"WIDTH", "3"}},
+       {{"WIDTH", "3"}},
        {{"d", "2 downto 0"}, {"q", "6 downto 0"}}},
   };
   for (const Case& c : cases) {
@@ -207,46 +223,65 @@ TEST(VhdlDescription, UnevaluableRangesAreUnknownWithTheFix) {
     const char* range;
   };
   const Case cases[] = {
-      {"generic_without_default", {kEntity}, {}, "d",
+      {"generic_without_default",
+       {kEntity},
+       {},
+       "d",
        "unknown: port 'd': cannot evaluate WIDTH-1 downto 0: generic 'WIDTH' has no value; "
        "give one with -g WIDTH=VALUE"},
       {"unconstrained_and_scalar_ports_are_not_unknown", {kEntity}, {}, "u", "-"},
-      {"bad_override_never_falls_back_to_the_default", {kEntity}, {{"WIDTH", "nope"}}, "d",
+      {"bad_override_never_falls_back_to_the_default",
+       {kEntity},
+       {{"WIDTH", "nope"}},
+       "d",
        "unknown: port 'd': cannot evaluate WIDTH-1 downto 0: -g WIDTH=nope cannot be "
        "evaluated: 'nope' is not declared"},
-      {"text_after_the_value", {kEntity}, {{"WIDTH", "3 4"}}, "d",
+      {"text_after_the_value",
+       {kEntity},
+       {{"WIDTH", "3 4"}},
+       "d",
        "unknown: port 'd': cannot evaluate WIDTH-1 downto 0: -g WIDTH=3 4 cannot be "
        "evaluated: unexpected '4' after the value"},
       {"missing_package_of_a_use_clause",
        {"use work.absent_pkg.all;\n"
         "entity e is port (d : in bit_vector(C_W - 1 downto 0)); end;\n"},
-       {}, "d",
+       {},
+       "d",
        "unknown: port 'd': cannot evaluate C_W - 1 downto 0: package 'absent_pkg' is not in "
        "any design file; add the file that declares it"},
       {"missing_package_of_a_selected_name",
-       {"entity e is port (d : in bit_vector(other_pkg.W downto 0)); end;\n"}, {}, "d",
+       {"entity e is port (d : in bit_vector(other_pkg.W downto 0)); end;\n"},
+       {},
+       "d",
        "unknown: port 'd': cannot evaluate other_pkg.W downto 0: package 'other_pkg' is not "
        "in any design file; add the file that declares it"},
       {"type_of_a_missing_package",
        {"library mylib; use mylib.types_pkg.all;\n"
         "entity e is port (t : in bus_t); end;\n"},
-       {}, "t",
+       {},
+       "t",
        "unknown: port 't': type 'bus_t' is not declared: package 'types_pkg' is not in any "
        "design file; add the file that declares it"},
-      {"undeclared_type", {"entity e is port (t : in bus_t); end;\n"}, {}, "t",
+      {"undeclared_type",
+       {"entity e is port (t : in bus_t); end;\n"},
+       {},
+       "t",
        "unknown: port 't': type 'bus_t' is not declared: add the design file of the package "
        "that declares it"},
       {"unsupported_construct_keeps_the_reason",
        {"entity e is generic (S : string := \"ab\");\n"
         "  port (d : in bit_vector(S'foo downto 0)); end;\n"},
-       {}, "d",
+       {},
+       "d",
        "unknown: port 'd': cannot evaluate S'foo downto 0: attribute 'S'foo' is not supported "
        "in bounds"},
       {"range_of_a_package_subtype",
        {"package p is constant C : natural := 8; subtype w_t is bit_vector(C/0 downto 0);\n"
         "end;\n",
         "use work.p.all; entity e is port (w : in w_t); end;\n"},
-       {}, "w", "unknown: port 'w': cannot evaluate C/0 downto 0: arithmetic overflow or division by "
+       {},
+       "w",
+       "unknown: port 'w': cannot evaluate C/0 downto 0: arithmetic overflow or division by "
        "zero in 'C/0'"},
   };
   for (const Case& c : cases) {
@@ -269,7 +304,8 @@ TEST(VhdlDescription, OverrideMistakesAreErrors) {
     const char* message;
   };
   const Case cases[] = {
-      {{{"WIDTH", "nope"}}, "-g WIDTH:1:1: error: -g WIDTH: cannot evaluate the value: 'nope' is not declared"},
+      {{{"WIDTH", "nope"}},
+       "-g WIDTH:1:1: error: -g WIDTH: cannot evaluate the value: 'nope' is not declared"},
       {{{"width", "3 4"}}, "-g width:1:3: error: -g width: unexpected '4' after the value"},
       {{{"WIDTH", ")"}}, "-g WIDTH:1:1: error: "},
       {{{"t", "integer"}},
@@ -298,18 +334,17 @@ TEST(VhdlDescription, InterfaceTextsAsWrittenWithBlanksNormalised) {
       "e");
   ASSERT_TRUE(d.found);
   using K = ScanGeneric::Kind;
-  expectGenerics(d.unit.generics,
-                 {{"A", K::Constant, "integer range 0 to 7", "3 + 4", "7", 2},
-                  {"B", K::Constant, "integer range 0 to 7", "3 + 4", "7", 2},
-                  {"\"+\"", K::Subprogram, "function \"+\" (l, r : bit) return bit", "<>",
-                   nullptr, 5},
-                  {"f", K::Subprogram, "pure function f return natural", "g", nullptr, 6}});
+  expectGenerics(
+      d.unit.generics,
+      {{"A", K::Constant, "integer range 0 to 7", "3 + 4", "7", 2},
+       {"B", K::Constant, "integer range 0 to 7", "3 + 4", "7", 2},
+       {"\"+\"", K::Subprogram, "function \"+\" (l, r : bit) return bit", "<>", nullptr, 5},
+       {"f", K::Subprogram, "pure function f return natural", "g", nullptr, 6}});
   std::vector<std::string> types;
   for (const ScanPort& p : d.unit.ports) types.push_back(p.name() + (": " + p.declaredType()));
-  EXPECT_EQ(types, (std::vector<std::string>{
-                       "x: (resolved) std_ulogic_vector(1 downto 0)",
-                       "y: (resolved) std_ulogic_vector(1 downto 0)", "z: resolved std_ulogic",
-                       "\\Odd  Name\\: bit"}));
+  EXPECT_EQ(types, (std::vector<std::string>{"x: (resolved) std_ulogic_vector(1 downto 0)",
+                                             "y: (resolved) std_ulogic_vector(1 downto 0)",
+                                             "z: resolved std_ulogic", "\\Odd  Name\\: bit"}));
 }
 
 TEST(VhdlDescription, ContextClauseOfTheUnitOnly) {
@@ -321,7 +356,8 @@ TEST(VhdlDescription, ContextClauseOfTheUnitOnly) {
   const Case cases[] = {
       {"none", "entity e is end;", ""},
       {"blanks_and_comments",
-       "-- head\nLibrary  IEEE ;\n  use   ieee . std_logic_1164.all ; -- x\n/* c */ use ieee.numeric_std.all,\n"
+       "-- head\nLibrary  IEEE ;\n  use   ieee . std_logic_1164.all ; -- x\n/* c */ use "
+       "ieee.numeric_std.all,\n"
        "  ieee.math_real.all;\nentity e is end;",
        "Library IEEE ;\nuse ieee . std_logic_1164.all ;\nuse ieee.numeric_std.all, "
        "ieee.math_real.all;"},
@@ -347,16 +383,15 @@ TEST(VhdlDescription, ContextClauseOfTheUnitOnly) {
 }
 
 TEST(VhdlDescription, ListsEveryUnitInFileOrder) {
-  Described d = describe(
-      {"context Ctx is library ieee; end context;\n"
-       "package Pkg is end package;\n"
-       "package body Pkg is end package body;\n"
-       "package Inst is new work.gen generic map (N => 1);\n"
-       "entity Top is end;\n"
-       "architecture RTL of Top is begin end;\n"
-       "configuration Cfg of Top is for RTL end for; end;\n",
-       "entity top is end;\n"},
-      "top");
+  Described d = describe({"context Ctx is library ieee; end context;\n"
+                          "package Pkg is end package;\n"
+                          "package body Pkg is end package body;\n"
+                          "package Inst is new work.gen generic map (N => 1);\n"
+                          "entity Top is end;\n"
+                          "architecture RTL of Top is begin end;\n"
+                          "configuration Cfg of Top is for RTL end for; end;\n",
+                          "entity top is end;\n"},
+                         "top");
   std::vector<std::string> lines;
   for (const ScanUnitInfo& u : d.units)
     lines.push_back(u.library + " " + u.kind + " " + u.name + " " + u.file + ":" +

@@ -65,8 +65,8 @@ TEST_P(Messages, AreReported) {
     size_t at = run.messages.find(line);
     ASSERT_NE(at, std::string::npos) << "missing: " << line << "\nin:\n" << run.messages;
     size_t end = at + std::string(line).size();
-    bool wholeLineEnd = end == run.messages.size() || run.messages[end] == '\n' ||
-                        std::string(line).back() == ' ';
+    bool wholeLineEnd =
+        end == run.messages.size() || run.messages[end] == '\n' || std::string(line).back() == ' ';
     EXPECT_TRUE(wholeLineEnd) << line;
   }
   if (c.lines.empty()) {

@@ -37,13 +37,17 @@ const LexCase kLexCases[] = {
     {"f(x)'length", "id:f sym:( id:x sym:) sym:' id:length"},
     {"'''", "chr:'''"},
     {"\\a b\\ \\x\\\\y\\", "ext:\\a b\\ ext:\\x\\\\y\\"},
-    {"X\"FF\" b\"1_0\" 8UX\"0F\" sx\"F\"", "bits:X\"FF\" bits:b\"1_0\" bits:8UX\"0F\" bits:sx\"F\""},
-    {"16#FF# 2#1010_1010#E2 1_000 1.5e-3 3E6", "num:16#FF# num:2#1010_1010#E2 num:1_000 num:1.5e-3 num:3E6"},
+    {"X\"FF\" b\"1_0\" 8UX\"0F\" sx\"F\"",
+     "bits:X\"FF\" bits:b\"1_0\" bits:8UX\"0F\" bits:sx\"F\""},
+    {"16#FF# 2#1010_1010#E2 1_000 1.5e-3 3E6",
+     "num:16#FF# num:2#1010_1010#E2 num:1_000 num:1.5e-3 num:3E6"},
     {"a -- comment ; entity\nb", "id:a id:b"},
     {"a /* block \n */ b /* unterminated", "id:a id:b bad:/* unterminated"},
     {"\"a \"\"q\"\" -- x\" c", "str:\"a \"\"q\"\" -- x\" id:c"},
     {"\"open\nx", "bad:\"open id:x"},
-    {"a<=b:=c/=d>=e<>f=>g**h??i?/=j", "id:a sym:<= id:b sym::= id:c sym:/= id:d sym:>= id:e sym:<> id:f sym:=> id:g sym:** id:h sym:?? id:i sym:?/= id:j"},
+    {"a<=b:=c/=d>=e<>f=>g**h??i?/=j",
+     "id:a sym:<= id:b sym::= id:c sym:/= id:d sym:>= id:e sym:<> id:f sym:=> id:g sym:** id:h "
+     "sym:?? id:i sym:?/= id:j"},
     {"x\r\ny\x01z", "id:x id:y bad:\x01 id:z"},
     {"b0 bx X\"\"", "id:b0 id:bx bits:X\"\""},
 };
@@ -60,12 +64,23 @@ struct LiteralCase {
 };
 
 const LiteralCase kLiteralCases[] = {
-    {"16#FF#", "i:255"},          {"2#1010_1010#", "i:170"},     {"1_000", "i:1000"},
-    {"1E3", "i:1000"},            {"16#F#E1", "i:240"},          {"2.5", "r:2.5"},
-    {"9223372036854775808", "none"}, {"X\"A\"", "s:1010"},     {"O\"7\"", "s:111"},
-    {"6X\"F\"", "s:001111"},      {"3B\"1010\"", "s:010"},       {"SX\"8\"", "s:1000"},
-    {"6SX\"8\"", "s:111000"},     {"D\"5\"", "s:101"},           {"X\"Z\"", "s:ZZZZ"},
-    {"\"a\"\"b\"", "s:a\"b"},     {"'x'", "s:x"},
+    {"16#FF#", "i:255"},
+    {"2#1010_1010#", "i:170"},
+    {"1_000", "i:1000"},
+    {"1E3", "i:1000"},
+    {"16#F#E1", "i:240"},
+    {"2.5", "r:2.5"},
+    {"9223372036854775808", "none"},
+    {"X\"A\"", "s:1010"},
+    {"O\"7\"", "s:111"},
+    {"6X\"F\"", "s:001111"},
+    {"3B\"1010\"", "s:010"},
+    {"SX\"8\"", "s:1000"},
+    {"6SX\"8\"", "s:111000"},
+    {"D\"5\"", "s:101"},
+    {"X\"Z\"", "s:ZZZZ"},
+    {"\"a\"\"b\"", "s:a\"b"},
+    {"'x'", "s:x"},
 };
 
 class Literals : public testing::TestWithParam<LiteralCase> {};
@@ -74,8 +89,8 @@ TEST_P(Literals, HaveValues) {
   std::string text = GetParam().text;
   Lexer lexer(text);
   scan::Value v = scan::vhdl::literalValue(lexer.next());
-  std::string got = v.isInteger() ? "i:" + std::to_string(v.asInteger())
-                    : v.isReal()  ? "r:" + std::to_string(v.asReal()).substr(0, 3)
+  std::string got = v.isInteger()  ? "i:" + std::to_string(v.asInteger())
+                    : v.isReal()   ? "r:" + std::to_string(v.asReal()).substr(0, 3)
                     : v.isString() ? "s:" + v.asString()
                                    : "none";
   EXPECT_EQ(got, GetParam().expected);

@@ -12,7 +12,9 @@ namespace {
 
 using Outcome = vhdl_test::Described;
 
-Outcome read(const std::string& text, const char* unit) { return vhdl_test::describe({text}, unit); }
+Outcome read(const std::string& text, const char* unit) {
+  return vhdl_test::describe({text}, unit);
+}
 
 std::string repeat(const std::string& s, size_t n) {
   std::string out;
@@ -46,7 +48,7 @@ struct HostileCase {
   std::function<std::string()> text;
   const char* unit;
   bool found;
-  bool headerSound;    ///< readUnit's verdict on the selected unit's header
+  bool headerSound;  ///< readUnit's verdict on the selected unit's header
   size_t ports;
   size_t errors;       ///< exact error count
   size_t rangedPorts;  ///< ports that still got a range
@@ -70,7 +72,9 @@ const HostileCase kCases[] = {
      },
      "e", true, true, 1, 0, 0},
     {"flat_operator_chain_is_no_nesting",
-     [] { return "entity e is port (a : in bit_vector(" + repeat("1+", 100000) + "1 downto 0)); end;"; },
+     [] {
+       return "entity e is port (a : in bit_vector(" + repeat("1+", 100000) + "1 downto 0)); end;";
+     },
      "e", true, true, 1, 0, 1},
     {"huge_identifier",
      [] {
@@ -92,37 +96,47 @@ const HostileCase kCases[] = {
      },
      "e", true, true, 1, 0, 0},
     {"unterminated_block_comment_after_the_unit",
-     [] { return "entity e is port (a : in bit); end;\n/* entity f is end;"; },
-     "e", true, true, 1, 1, 0},
+     [] { return "entity e is port (a : in bit); end;\n/* entity f is end;"; }, "e", true, true, 1,
+     1, 0},
     {"unterminated_string_in_another_unit",
-     [] { return "entity e is generic (S : string := \"abc\n); port (a : in bit); end;\nentity f is port (b : out bit); end;"; },
+     [] {
+       return "entity e is generic (S : string := \"abc\n); port (a : in bit); end;\nentity f is "
+              "port (b : out bit); end;";
+     },
      "f", true, true, 1, 1, 0},
     {"nul_byte_between_ports",
-     [] { return withNul("entity e is port (a : in bit;", " b : out bit); end;"); },
-     "e", true, false, 1, 1, 0},
+     [] { return withNul("entity e is port (a : in bit;", " b : out bit); end;"); }, "e", true,
+     false, 1, 1, 0},
     {"nul_byte_in_another_unit",
-     [] { return withNul("entity f is port (a : in bit;", " b : out bit); end;\nentity e is port (c : in bit); end;"); },
+     [] {
+       return withNul("entity f is port (a : in bit;",
+                      " b : out bit); end;\nentity e is port (c : in bit); end;");
+     },
      "e", true, true, 1, 1, 0},
-    {"header_cut_short_in_a_range", [] { return std::string("entity e is port (a : in bit_vector(7 downto"); }, "e",
-     true, false, 0, 1, 0},
-    {"header_cut_short_in_a_name", [] { return std::string("entity e is port (a : in bit; wi"); }, "e",
-     true, false, 1, 1, 0},
+    {"header_cut_short_in_a_range",
+     [] { return std::string("entity e is port (a : in bit_vector(7 downto"); }, "e", true, false,
+     0, 1, 0},
+    {"header_cut_short_in_a_name", [] { return std::string("entity e is port (a : in bit; wi"); },
+     "e", true, false, 1, 1, 0},
     {"alias_cycles",
      [] {
-       return std::string("package p is alias a1 is a2; alias a2 is a1; alias t1 is t2; alias t2 is t1; end;\n"
-                          "use work.p.all; entity e is port (a : in bit_vector(a1 downto 0); b : in t1); end;");
+       return std::string(
+           "package p is alias a1 is a2; alias a2 is a1; alias t1 is t2; alias t2 is t1; end;\n"
+           "use work.p.all; entity e is port (a : in bit_vector(a1 downto 0); b : in t1); end;");
      },
      "e", true, true, 2, 0, 0},
     {"huge_and_self_referencing_aggregates",
      [] {
-       return std::string("package p is type v is array (natural range <>) of integer;\n"
-                          "constant BIG : v := (0 to 2**30 => 0); constant SELF : v := (0 => SELF(0)); end;\n"
-                          "use work.p.all; entity e is port (a : in bit_vector(BIG(0) downto 0);\n"
-                          "b : in bit_vector(SELF(0) downto 0); c : in bit_vector(BIG'length downto 0)); end;");
+       return std::string(
+           "package p is type v is array (natural range <>) of integer;\n"
+           "constant BIG : v := (0 to 2**30 => 0); constant SELF : v := (0 => SELF(0)); end;\n"
+           "use work.p.all; entity e is port (a : in bit_vector(BIG(0) downto 0);\n"
+           "b : in bit_vector(SELF(0) downto 0); c : in bit_vector(BIG'length downto 0)); end;");
      },
      "e", true, true, 3, 0, 0},
-    {"error_after_the_header", [] { return std::string("entity e is port (a : in bit); begin $ end;"); }, "e",
-     true, true, 1, 1, 0},
+    {"error_after_the_header",
+     [] { return std::string("entity e is port (a : in bit); begin $ end;"); }, "e", true, true, 1,
+     1, 0},
 };
 
 class Hostile : public testing::TestWithParam<HostileCase> {};
@@ -149,7 +163,8 @@ TEST(VhdlRobustness, FlatSumsOfAnyLengthEvaluate) {
     std::string sum = repeat("1 + ", terms - 1) + "1";
     Outcome o = read("package p is constant N : natural := " + sum +
                          "; end package;\nuse work.p.all;\n"
-                         "entity e is port (a : in bit_vector(" + sum + " downto N - N)); end;",
+                         "entity e is port (a : in bit_vector(" +
+                         sum + " downto N - N)); end;",
                      "e");
     ASSERT_EQ(o.unit.ports.size(), 1u) << terms;
     int32_t left = 0;

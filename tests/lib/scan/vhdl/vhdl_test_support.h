@@ -22,7 +22,8 @@ namespace vhdl_test {
 inline std::string fixture(const std::string& name) {
   const char* root = std::getenv("PINFORGE_SOURCE_DIR");
   std::string here = __FILE__;
-  std::string base = root ? std::string(root) + "/tests" : here.substr(0, here.rfind("/tests/") + 6);
+  std::string base =
+      root ? std::string(root) + "/tests" : here.substr(0, here.rfind("/tests/") + 6);
   return base + "/fixtures/vhdl/" + name;
 }
 
@@ -38,8 +39,8 @@ struct Port {
 
   bool operator==(const Port& o) const {
     return name == o.name && type == o.type && direction == o.direction && line == o.line &&
-           hasRange == o.hasRange && (!hasRange || (left == o.left && right == o.right &&
-                                                    ascending == o.ascending));
+           hasRange == o.hasRange &&
+           (!hasRange || (left == o.left && right == o.right && ascending == o.ascending));
   }
 };
 
@@ -68,8 +69,8 @@ inline Run extract(const std::vector<std::pair<std::string, std::string>>& files
       extractor.addDesignFile(library.c_str(), (fixtures ? fixture(file) : file).c_str(),
                               ScanExtractor::Vhdl);
     run.errors = extractor.Parse(ScanExtractor::Vhdl);
-    run.found = extractor.findDesignUnit("work", unit.c_str(),
-                                         ScanExtractor::SearchAllLibraries) == 0;
+    run.found =
+        extractor.findDesignUnit("work", unit.c_str(), ScanExtractor::SearchAllLibraries) == 0;
     ScanPortList* list = extractor.getPorts();
     for (const ScanPort* p = list->firstPort(); p != nullptr; p = list->nextPort(p)) {
       Port port{p->name(), p->typeName(), p->direction(), p->sourceLine(), p->hasRange()};
@@ -120,9 +121,8 @@ inline Described describe(const std::vector<std::string>& texts, const char* uni
     settings.genericOverrides = overrides;
     scan::vhdl::VhdlReader reader(diagnostics, settings);
     for (size_t i = 0; i < texts.size(); ++i)
-      reader.indexSource(
-          scan::SourceBuffer::fromText("f" + std::to_string(i) + ".vhd", texts[i]),
-          i < libraries.size() ? libraries[i] : std::string("work"));
+      reader.indexSource(scan::SourceBuffer::fromText("f" + std::to_string(i) + ".vhd", texts[i]),
+                         i < libraries.size() ? libraries[i] : std::string("work"));
     out.found = reader.selectUnit("work", unit);
     if (out.found) out.headerSound = reader.readUnit(out.unit);
     out.units = reader.listUnits();
