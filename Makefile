@@ -4,6 +4,8 @@
 #   make test-asan          the same under AddressSanitizer and UBSan
 #   make fuzz FUZZ_SECONDS=N  builds the fuzz targets with clang and runs each for N seconds
 #   make install PREFIX=DIR / make uninstall
+#   make format / make check-format   clang-format the C++ files, or only check them
+#   make tidy               clang-tidy (.clang-tidy) over the program's and libraries' sources
 BUILD        ?= build
 ASAN_BUILD   ?= build-asan
 FUZZ_BUILD   ?= build-fuzz
@@ -12,7 +14,7 @@ JOBS         ?= $(shell nproc)
 FUZZ_SECONDS ?= 60
 FUZZ_CXX     ?= clang++
 
-.PHONY: all build test test-asan fuzz demo install uninstall bench clean
+.PHONY: all build test test-asan fuzz demo install uninstall bench clean format check-format tidy
 
 all: build
 
@@ -50,6 +52,15 @@ uninstall:
 
 bench: build
 	sh bench/run.sh $(BUILD)/pinforge
+
+format:
+	sh tools/format.sh
+
+check-format:
+	sh tools/format.sh --check
+
+tidy: $(BUILD)/build.ninja
+	run-clang-tidy -quiet -p $(BUILD) '$(CURDIR)/(src|lib)/'
 
 clean:
 	rm -rf $(BUILD) $(ASAN_BUILD) $(FUZZ_BUILD)
