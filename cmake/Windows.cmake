@@ -17,6 +17,8 @@ set_property(TARGET pinforge PROPERTY SOURCES
 target_link_libraries(pinforge_hostkit PUBLIC shell32)
 # Every fopen of the program takes UTF-8 names (lib/hostkit/fopen-win32.cpp).
 target_link_options(pinforge PRIVATE -Wl,--wrap=fopen)
+set_source_files_properties(${CMAKE_SOURCE_DIR}/lib/hostkit/fopen-win32.cpp PROPERTIES
+                            INCLUDE_DIRECTORIES ${CMAKE_SOURCE_DIR}/lib)
 # A release executable carries no symbols: a third of the size.
 target_link_options(pinforge PRIVATE $<$<CONFIG:Release>:-s>)
 add_custom_command(TARGET pinforge POST_BUILD
