@@ -55,6 +55,8 @@ class Parser {
   bool skipToEndOf(std::string_view lowerWord);
   bool skipSubprogramBody();
 
+  /// A declaration of `kind` named by the identifier token `name`, the rest left at defaults.
+  static Decl declaration(DeclKind kind, const Token& name);
   bool parseInterfaceList(std::vector<Decl>& out, DeclKind kind);
   bool parseSubtypeIndication(SubtypeIndication& out);
   bool parseTypeMark(SubtypeIndication& out);

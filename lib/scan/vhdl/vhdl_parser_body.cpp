@@ -29,11 +29,7 @@ bool Parser::parseFunction(FunctionBody& body) {
       do {
         if (!isName(peek())) return failHere("expected a name");
         Token name = take();
-        Decl d;
-        d.kind = variable ? DeclKind::Variable : DeclKind::Constant;
-        d.key = normalizeName(name.text);
-        d.name = name.text;
-        d.offset = name.offset;
+        Decl d = declaration(variable ? DeclKind::Variable : DeclKind::Constant, name);
         body.locals.push_back(std::move(d));
       } while (accept(','));
       SubtypeIndication subtype;

@@ -4,6 +4,15 @@
 
 namespace scan::vhdl {
 
+Decl Parser::declaration(DeclKind kind, const Token& name) {
+  Decl d;
+  d.kind = kind;
+  d.key = normalizeName(name.text);
+  d.name = name.text;
+  d.offset = name.offset;
+  return d;
+}
+
 bool Parser::parseEntityHeader(std::vector<Decl>& generics, std::vector<Decl>& ports) {
   if (!expectWord("entity")) return false;
   if (!isName(peek())) return failHere("expected the entity name");
@@ -35,11 +44,7 @@ bool Parser::parseInterfaceList(std::vector<Decl>& out, DeclKind kind) {
       if (peekWord("type") && isName(peek(1))) {
         take();
         Token name = take();
-        Decl d;
-        d.kind = DeclKind::OtherType;
-        d.key = normalizeName(name.text);
-        d.name = name.text;
-        d.offset = name.offset;
+        Decl d = declaration(DeclKind::OtherType, name);
         out.push_back(std::move(d));
       }
       long depth = 0;
@@ -58,11 +63,7 @@ bool Parser::parseInterfaceList(std::vector<Decl>& out, DeclKind kind) {
           return dropGroup();
         }
         Token name = take();
-        Decl d;
-        d.kind = kind;
-        d.key = normalizeName(name.text);
-        d.name = name.text;
-        d.offset = name.offset;
+        Decl d = declaration(kind, name);
         out.push_back(std::move(d));
         if (!accept(',')) break;
       }
@@ -178,11 +179,7 @@ bool Parser::parseDeclaration(std::vector<Decl>& out) {
     do {
       if (!isName(peek())) return failHere("expected a constant name");
       Token name = take();
-      Decl d;
-      d.kind = DeclKind::Constant;
-      d.key = normalizeName(name.text);
-      d.name = name.text;
-      d.offset = name.offset;
+      Decl d = declaration(DeclKind::Constant, name);
       out.push_back(std::move(d));
     } while (accept(','));
     SubtypeIndication subtype;
@@ -199,11 +196,7 @@ bool Parser::parseDeclaration(std::vector<Decl>& out) {
     take();
     if (!isName(peek())) return failHere("expected a subtype name");
     Token name = take();
-    Decl d;
-    d.kind = DeclKind::Subtype;
-    d.key = normalizeName(name.text);
-    d.name = name.text;
-    d.offset = name.offset;
+    Decl d = declaration(DeclKind::Subtype, name);
     if (!expectWord("is") || !parseSubtypeIndication(d.subtype)) return false;
     out.push_back(std::move(d));
     return expect(';');
@@ -233,11 +226,7 @@ bool Parser::parseAlias(std::vector<Decl>& out) {
     return !m_Failed;
   }
   Token name = take();
-  Decl d;
-  d.kind = DeclKind::Alias;
-  d.key = normalizeName(name.text);
-  d.name = name.text;
-  d.offset = name.offset;
+  Decl d = declaration(DeclKind::Alias, name);
   if (accept(':') && !parseSubtypeIndication(d.subtype)) return false;
   if (!expectWord("is")) return false;
   if (!isName(peek())) return failHere("expected the aliased name");
@@ -252,11 +241,7 @@ bool Parser::parseTypeDeclaration(std::vector<Decl>& out) {
   take();  // type
   if (!isName(peek())) return failHere("expected a type name");
   Token name = take();
-  Decl d;
-  d.key = normalizeName(name.text);
-  d.name = name.text;
-  d.offset = name.offset;
-  d.kind = DeclKind::OtherType;
+  Decl d = declaration(DeclKind::OtherType, name);
   if (accept(';')) return true;  // incomplete type
   if (!expectWord("is")) return false;
   if (acceptWord("array")) {
@@ -341,11 +326,7 @@ bool Parser::parseSubprogram(std::vector<Decl>& out) {
   if (!isName(nameToken) && nameToken.kind != TokenKind::String)
     return failHere("expected a subprogram name");
   Token name = take();
-  Decl d;
-  d.kind = DeclKind::Function;
-  d.key = normalizeName(name.text);
-  d.name = name.text;
-  d.offset = name.offset;
+  Decl d = declaration(DeclKind::Function, name);
   d.bodyOffset = start;
   if (acceptWord("generic")) {
     std::vector<Decl> generics;

@@ -157,14 +157,15 @@ ScanPort VhdlReader::readPort(UnitScope& entity, const Decl& decl, const Interfa
     case Evaluator::Shape::Failed: {
       // The expression may be a package's, in another file.
       UnitScope* owner = failed ? m_Describer.ownerOf(entity, decl.subtype, *failed) : nullptr;
-      std::string_view text = owner ? owner->source->text() : std::string_view();
-      std::string what = owner ? oneLine(text.substr(failed->begin, failed->end - failed->begin))
-                               : std::string("its range");
+      std::string_view ownerText = owner ? owner->source->text() : std::string_view();
+      std::string what = owner
+                             ? oneLine(ownerText.substr(failed->begin, failed->end - failed->begin))
+                             : std::string("its range");
       m_Diagnostics.warning(
           source, decl.offset,
           "port '" + name + "': cannot evaluate " + what + " (" + reason + "); no range reported");
       std::string expression =
-          owner ? normalizedText(text, failed->begin, failed->end) : std::string("its range");
+          owner ? normalizedText(ownerText, failed->begin, failed->end) : std::string("its range");
       const Expr* own = owner == &entity ? failed : nullptr;
       port.setRangeUnknown("port '" + name + "': cannot evaluate " + expression + ": " +
                            m_Describer.failureHint(entity, own, decl.subtype.typeMark, reason));
