@@ -5,6 +5,7 @@
 
 #include <filesystem>
 #include <set>
+#include <sstream>
 #include <string>
 #include <tuple>
 #include <utility>
@@ -27,6 +28,7 @@ const std::string kFailed = "forge(vhdl) completed with errors.\n";
 const std::string kDone = "forge(vhdl) completed successfully.\n";
 const std::string kMissing = "<missing>";
 const std::string kOther = "entity other is\nend entity other;\n";
+const std::string kTopDesign = "entity top is\n  port (a : in bit);\nend entity top;\n";
 
 /// The templates a name can be given for, as the program lists them: `names` and those of the
 /// source tree, since the binary under test runs from its build folder.
@@ -60,18 +62,10 @@ std::string projectVersion() {
 }
 
 /// A complete command line whose only problem is that the design has no unit "top".
-const Args kComplete = {"-lib", "work",      "other.vhd", "-module", "top",    "-prj",
-                        "demo", "-template", "tpl.txt",   "-o",      "out.txt"};
-Args plus(Args base, const Args& extra) {
-  base.insert(base.end(), extra.begin(), extra.end());
-  return base;
-}
-
-/// A run of the unit "top", which the design holds, writing to `output`.
-Args topRun(const std::string& output) {
-  return {"-lib", "work",      "top.vhd", "-module", "top", "-prj",
-          "demo", "-template", "tpl.txt", "-o",      output};
-}
+const std::string kComplete =
+    " -lib work other.vhd -module top -prj demo -template tpl.txt -o out.txt";
+/// A run of the unit "top", which the design holds.
+const std::string kTop = "-lib work top.vhd -module top -prj demo -template tpl.txt -o ";
 
 std::string sameFile(const std::string& what) {
   return "FATAL ERROR: The " + what + "; nothing was written.\n";
@@ -79,99 +73,59 @@ std::string sameFile(const std::string& what) {
 
 struct Row {
   std::string what;
-  Args args;
+  std::string args;  ///< words separated by blanks
   std::string out;
   std::string err;
   int status;
-  std::vector<std::pair<std::string, std::string>> files = {};  ///< name -> content or kMissing
+  std::string absent = "";  ///< a file the run must not leave
+  std::string name = "";    ///< a file that must hold `text` afterwards
+  std::string text = "";
   std::string before = "";  ///< out.txt before the run, when not empty
   std::string rsp = "";     ///< run.rsp, when not empty
 };
 
 std::vector<Row> rows() {
+  const std::string missingDesign = "gone.vhd: error: No such file or directory\n";
   std::vector<Row> rows = {
-      {"unwritable error file",
-       plus(kComplete, {"-err", "no/such/dir/run.log"}),
+      {"unwritable error file", kComplete + " -err no/such/dir/run.log",
        "FATAL ERROR: Unable to open log file no/such/dir/run.log in write mode: No such file or "
        "directory\n",
-       "",
-       1,
-       {{"out.txt", kMissing}}},
+       "", 1, "out.txt"},
       // The first occurrence of a switch wins, so these come before the complete line.
-      {"missing template keeps the previous output",
-       plus({"-template", "missing.tpl"}, kComplete),
-       kFailed,
-       kMissingTemplate + kUsage,
-       1,
-       {{"out.txt", "previous"}},
-       "previous"},
+      {"missing template keeps the previous output", "-template missing.tpl" + kComplete, kFailed,
+       kMissingTemplate + kUsage, 1, "", "out.txt", "previous", "previous"},
       {"missing template, delete on error, keeps the previous output",
-       plus({"-template", "missing.tpl", "-deleteonerror"}, kComplete),
-       kFailed,
-       kMissingTemplate + kUsage,
-       1,
-       {{"out.txt", "previous"}},
-       "previous"},
-      {"template and output both unopenable",
-       plus({"-o", "no/dir/out.txt", "-template", "missing.tpl"}, kComplete),
-       kFailed,
-       kMissingTemplate + kMissingOutput + kUsage,
-       1,
-       {{"out.txt", kMissing}}},
-      {"error file takes usage and fatal lines",
-       plus({"-err", "run.log", "-template", "missing.tpl"}, kComplete),
-       kFailed,
-       "",
-       1,
-       {{"run.log", kMissingTemplate + kUsage}}},
-      {"device output", plus(topRun("/dev/null"), {"-deleteonerror"}), kDone, "", 0},
-      {"one device for output and errors", plus(topRun("/dev/null"), {"-err", "/dev/null"}), kDone,
-       "", 0},
-      {"full output device", topRun("/dev/full"),
+       "-template missing.tpl -deleteonerror" + kComplete, kFailed, kMissingTemplate + kUsage, 1,
+       "", "out.txt", "previous", "previous"},
+      {"template and output both unopenable", "-o no/dir/out.txt -template missing.tpl" + kComplete,
+       kFailed, kMissingTemplate + kMissingOutput + kUsage, 1, "out.txt"},
+      {"error file takes usage and fatal lines", "-err run.log -template missing.tpl" + kComplete,
+       kFailed, "", 1, "", "run.log", kMissingTemplate + kUsage},
+      {"device output", kTop + "/dev/null -deleteonerror", kDone, "", 0},
+      {"one device for output and errors", kTop + "/dev/null -err /dev/null", kDone, "", 0},
+      {"full output device", kTop + "/dev/full",
        "pinforge:Unable to write output file /dev/full: No space left on device\n" + kFailed, "",
        1},
-      {"full error file", plus({"-err", "/dev/full", "-template", "missing.tpl"}, kComplete),
+      {"full error file", "-err /dev/full -template missing.tpl" + kComplete,
        "pinforge:Unable to write error file /dev/full: No space left on device\n" + kFailed, "", 1},
-      {"missing design file beside the unit's",
-       plus(topRun("out.txt"), {"-lib", "work", "gone.vhd"}),
+      {"missing design file beside the unit's", kTop + "out.txt -lib work gone.vhd",
        "pinforge:Unable to read design file gone.vhd; see the messages above.\n" + kFailed,
-       "gone.vhd: error: No such file or directory\n",
-       1,
-       {{"out.txt", ""}}},
-      {"directory as a design file", plus(topRun("out.txt"), {"-lib", "work", "/"}),
+       missingDesign, 1, "", "out.txt", ""},
+      {"directory as a design file", kTop + "out.txt -lib work /",
        "pinforge:Unable to read design file /; see the messages above.\n" + kFailed,
        "/: error: is a directory\n", 1},
-      {"template is a directory",
-       plus({"-template", "/"}, kComplete),
-       kFailed,
-       "FATAL ERROR: Unable to open template file /: Is a directory\n" + kUsage,
-       1,
-       {{"out.txt", kMissing}}},
-      {"unopenable output", plus({"-o", "no/dir/out.txt"}, kComplete), kFailed,
-       kMissingOutput + kUsage, 1},
-      {"--list of a missing file",
-       {"--list", "-lib", "work", "gone.vhd", "-o", "out.txt"},
-       "",
-       "gone.vhd: error: No such file or directory\n",
-       1,
-       {{"out.txt", kMissing}}},
-      {"error file is a design file",
-       plus(kComplete, {"-err", "other.vhd"}),
-       "",
-       sameFile("error file other.vhd is the same file as the design file other.vhd"),
-       1,
-       {{"other.vhd", kOther}, {"out.txt", kMissing}}},
-      {"error file is the output",
-       plus(kComplete, {"-err", "./out.txt"}),
-       "",
-       sameFile("error file ./out.txt is the same file as the output file out.txt"),
-       1,
-       {{"out.txt", kMissing}}},
-      {"--version wins over everything else",
-       {"-bogus", "--version", "--help"},
-       "pinforge " + projectVersion() + "\n",
-       "",
-       0},
+      {"template is a directory", "-template /" + kComplete, kFailed,
+       "FATAL ERROR: Unable to open template file /: Is a directory\n" + kUsage, 1, "out.txt"},
+      {"unopenable output", "-o no/dir/out.txt" + kComplete, kFailed, kMissingOutput + kUsage, 1},
+      {"--list of a missing file", "--list -lib work gone.vhd -o out.txt", "", missingDesign, 1,
+       "out.txt"},
+      {"error file is a design file", kComplete + " -err other.vhd", "",
+       sameFile("error file other.vhd is the same file as the design file other.vhd"), 1, "out.txt",
+       "other.vhd", kOther},
+      {"error file is the output", kComplete + " -err ./out.txt", "",
+       sameFile("error file ./out.txt is the same file as the output file out.txt"), 1, "out.txt"},
+      {"--version wins over everything else", "-bogus --version --help",
+       "pinforge " + projectVersion() + "\n", "", 0},
   };
   // Without -module the run stops before any design file is read, so the files need not exist.
   // 2 + 995 words are the most a run takes; one more is refused.
@@ -182,22 +136,21 @@ std::vector<Row> rows() {
   const std::string tooMany =
       "FATAL ERROR: The number of command line arguments exceeds the max allowed (997).\n" + kUsage;
   for (const auto& [files, out, err] :
-       {std::tuple{995u, kFailed, allButLib}, std::tuple{996u, std::string(), tooMany}}) {
-    Args args = {"-lib", "work"};
-    args.resize(2 + files, "f.vhd");
-    std::string words;
-    for (const std::string& arg : args) words += arg + "\n";
-    rows.push_back({std::to_string(files) + " files", args, out, err, 1});
-    rows.push_back({std::to_string(files) + " files in a response file",
-                    {"@run.rsp"},
-                    out,
-                    err,
-                    1,
-                    {},
-                    "",
-                    words});
+       {std::tuple{995, kFailed, allButLib}, std::tuple{996, std::string(), tooMany}}) {
+    std::string words = "-lib\nwork\n";
+    for (int file = 0; file < files; ++file) words += "f.vhd\n";
+    const std::string what = std::to_string(files) + " files";
+    rows.push_back({what, words, out, err, 1});
+    rows.push_back({what + " in a response file", "@run.rsp", out, err, 1, "", "", "", "", words});
   }
   return rows;
+}
+
+Args words(const std::string& text) {
+  std::istringstream stream(text);
+  Args result;
+  for (std::string word; stream >> word;) result.push_back(word);
+  return result;
 }
 
 TEST(CommandLine, OutputStatusAndFiles) {
@@ -208,15 +161,17 @@ TEST(CommandLine, OutputStatusAndFiles) {
     ASSERT_FALSE(dir.path().empty());
     // The main design holds a unit named "other" only, so asking for "top" ends at the lookup.
     ASSERT_TRUE(dir.write("other.vhd", kOther) && dir.write("tpl.txt", "%module%\n") &&
-                dir.write("top.vhd", "entity top is\n  port (a : in bit);\nend entity top;\n"));
+                dir.write("top.vhd", kTopDesign));
     ASSERT_TRUE(row.before.empty() || dir.write("out.txt", row.before));
     ASSERT_TRUE(row.rsp.empty() || dir.write("run.rsp", row.rsp));
-    const RunResult run = runPinforge(row.args, dir.path(), {{"PINFORGE_TEMPLATE_PATH", ""}});
+    const RunResult run =
+        runPinforge(words(row.args), dir.path(), {{"PINFORGE_TEMPLATE_PATH", ""}});
     ASSERT_TRUE(run.started);
     EXPECT_EQ(run.out, row.out);
     EXPECT_EQ(run.err, row.err);
     EXPECT_EQ(run.status, row.status);
-    for (const auto& [name, content] : row.files) EXPECT_EQ(dir.read(name), content) << name;
+    EXPECT_TRUE(row.absent.empty() || !dir.exists(row.absent)) << row.absent;
+    EXPECT_TRUE(row.name.empty() || dir.read(row.name) == row.text) << dir.read(row.name);
   }
 }
 
@@ -257,14 +212,13 @@ TEST(CommandLine, TemplatesAreFoundByName) {
   if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
   ScratchDir dir;
   ASSERT_TRUE(dir.makeDir("a") && dir.makeDir("b"));
-  for (const auto& [name, text] : std::vector<std::pair<std::string, std::string>>{
-           {"top.vhd", "entity top is\n  port (a : in bit);\nend entity top;\n"},
-           {"a/mine.tmpl", "a %module%\n"},
-           {"b/mine", "b\n"},
-           {"b/other.tmpl", "other %module%\n"},
-           {"b/pins.txt.tmpl", "own pins\n"},
-           {"b/both", "b both\n"},
-           {"both", "here both\n"}})
+  for (const auto& [name, text] : Layout{{"top.vhd", kTopDesign},
+                                         {"a/mine.tmpl", "a %module%\n"},
+                                         {"b/mine", "b\n"},
+                                         {"b/other.tmpl", "other %module%\n"},
+                                         {"b/pins.txt.tmpl", "own pins\n"},
+                                         {"b/both", "b both\n"},
+                                         {"both", "here both\n"}})
     ASSERT_TRUE(dir.write(name, text));
   const std::string path = dir.path() + "/a::" + dir.path() + "/b";
   const std::string bundled = sourceDir() + "/templates/port_table.tcl";
@@ -291,9 +245,9 @@ TEST(CommandLine, TemplatesAreFoundByName) {
     if (c.output.empty() && findOnPath("tclsh").empty()) continue;
     std::error_code error;
     std::filesystem::remove(dir.file("out.txt"), error);
-    const Args args = {"-lib", "work",      "top.vhd",      "-module", "top",    "-prj",
-                       "demo", "-template", c.templateName, "-o",      "out.txt"};
-    const RunResult run = runPinforge(args, dir.path(), {{"PINFORGE_TEMPLATE_PATH", path}});
+    const RunResult run = runPinforge(
+        words("-lib work top.vhd -module top -prj demo -o out.txt -template " + c.templateName),
+        dir.path(), {{"PINFORGE_TEMPLATE_PATH", path}});
     ASSERT_TRUE(run.started);
     EXPECT_EQ(run.status, c.status);
     EXPECT_EQ(run.err, c.err);
