@@ -40,18 +40,11 @@ std::string inScratch(std::string text, const ScratchDir& dir) {
 }
 
 constexpr const char* kTwoPorts =
-    "library ieee;\nuse ieee.std_logic_1164.all;\n"
-    "entity top is\n"
-    "  port (In0 : in std_logic;\n"
-    "        InBus : in std_logic_vector(2 downto 0));\n"
-    "end entity top;\n";
-
+    "library ieee;\nuse ieee.std_logic_1164.all;\nentity top is\n  port (In0 : in std_logic;\n"
+    "        InBus : in std_logic_vector(2 downto 0));\nend entity top;\n";
 constexpr const char* kTwoPortLists =
-    "set PortName [ list  \"In0\" \"InBus\" ]\n"
-    "set LeftRange [ list  -1 2 ]\n"
-    "set RightRange [ list  -1 0 ]\n"
-    "set PortDir [ list  \"I\" \"I\" ]\n"
-    "set TotalPorts 2\n";
+    "set PortName [ list  \"In0\" \"InBus\" ]\nset LeftRange [ list  -1 2 ]\n"
+    "set RightRange [ list  -1 0 ]\nset PortDir [ list  \"I\" \"I\" ]\nset TotalPorts 2\n";
 
 const std::string kSuccess = "forge(vhdl) completed successfully.\n";
 const std::string kFailure = "forge(vhdl) completed with errors.\n";
@@ -95,19 +88,13 @@ std::string expectedHead(const TclCase& c) {
 const TclCase kCases[] = {
     {.name = "TwoPorts", .templateText = "puts done\n"},
     {.name = "DirectionsAndIntegerRule",
-     .design = "library ieee;\nuse ieee.std_logic_1164.all;\n"
-               "entity top is\n"
-               "  port (a : in std_logic;\n"
-               "        b : out std_logic_vector(0 to 3);\n"
-               "        c : inout std_logic;\n"
-               "        d : buffer std_logic;\n"
-               "        n : in integer range 1000 downto 0);\n"
-               "end entity top;\n",
+     .design = "library ieee;\nuse ieee.std_logic_1164.all;\nentity top is\n"
+               "  port (a : in std_logic;\n        b : out std_logic_vector(0 to 3);\n"
+               "        c : inout std_logic;\n        d : buffer std_logic;\n"
+               "        n : in integer range 1000 downto 0);\nend entity top;\n",
      .portLines = "set PortName [ list  \"a\" \"b\" \"c\" \"d\" \"n\" ]\n"
-                  "set LeftRange [ list  -1 0 -1 -1 9 ]\n"
-                  "set RightRange [ list  -1 3 -1 -1 0 ]\n"
-                  "set PortDir [ list  \"I\" \"O\" \"B\" \"O\" \"I\" ]\n"
-                  "set TotalPorts 5\n",
+                  "set LeftRange [ list  -1 0 -1 -1 9 ]\nset RightRange [ list  -1 3 -1 -1 0 ]\n"
+                  "set PortDir [ list  \"I\" \"O\" \"B\" \"O\" \"I\" ]\nset TotalPorts 5\n",
      .out = "pinforge:WARNING: Module top(Line 8): INTEGER RANGE is only supported for schematic "
             "symbol generation.\n" +
             kSuccess},
