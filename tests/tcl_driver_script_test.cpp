@@ -7,7 +7,6 @@
 
 #include <memory>
 #include <optional>
-#include <ostream>
 #include <string>
 #include <vector>
 
@@ -104,21 +103,14 @@ const HeadCase kHeadCases[] = {
                 "set Language \"verilog\"\n"},
 };
 
-void PrintTo(const HeadCase& c, std::ostream* os) { *os << c.name; }
-
-class TclDriverHead : public testing::TestWithParam<HeadCase> {};
-
 // The names and port lines come first exactly as they always have (a bound that could not be
 // evaluated aside), and the new variables follow them.
-TEST_P(TclDriverHead, KeepsTheOldLinesAndAppendsTheDesignDetails) {
-  const HeadCase& c = GetParam();
-  EXPECT_EQ(tclDriverScriptHead(*contextFor(c.design)), kNames + c.ports + c.details);
+TEST(TclDriverHead, KeepsTheOldLinesAndAppendsTheDesignDetails) {
+  for (const HeadCase& c : kHeadCases) {
+    SCOPED_TRACE(c.name);
+    EXPECT_EQ(tclDriverScriptHead(*contextFor(c.design)), kNames + c.ports + c.details);
+  }
 }
-
-INSTANTIATE_TEST_SUITE_P(Designs, TclDriverHead, testing::ValuesIn(kHeadCases),
-                         [](const testing::TestParamInfo<HeadCase>& row) {
-                           return std::string(row.param.name);
-                         });
 
 /// Runs `script` with tclsh in `dir` (with a locale that reads the script byte by byte).
 RunResult runTcl(const ScratchDir& dir, const std::string& script) {
