@@ -145,27 +145,24 @@ TEST(FlowRun, FileSizeLimitFailsTheRun) {
 
 TEST(FlowRun, LinksCannotMakeAnInputTheOutput) {
   if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
-  const struct {
-    const char* output;
-    const char* message;
-  } cases[] = {
-      {"hard.txt", "The output file hard.txt is the same file as the template t.txt"},
-      {"sym.vhd", "The output file sym.vhd is the same file as the design file design.vhd"},
-      {"sub/../t.txt", "The output file sub/../t.txt is the same file as the template t.txt"},
-  };
-  for (const auto& c : cases) {
-    SCOPED_TRACE(c.output);
-    ScratchDir dir;
-    ASSERT_TRUE(dir.write("design.vhd", kDesign) && dir.write("t.txt", "%module%\n") &&
-                dir.makeDir("sub"));
-    ASSERT_EQ(link(dir.file("t.txt").c_str(), dir.file("hard.txt").c_str()), 0);
-    ASSERT_EQ(symlink("design.vhd", dir.file("sym.vhd").c_str()), 0);
+  ScratchDir dir;
+  ASSERT_TRUE(dir.write("design.vhd", kDesign) && dir.write("t.txt", "%module%\n") &&
+              dir.makeDir("sub"));
+  ASSERT_EQ(link(dir.file("t.txt").c_str(), dir.file("hard.txt").c_str()), 0);
+  ASSERT_EQ(symlink("design.vhd", dir.file("sym.vhd").c_str()), 0);
+  for (const auto& [output, message] :
+       {std::pair{"hard.txt", "The output file hard.txt is the same file as the template t.txt"},
+        std::pair{"sym.vhd",
+                  "The output file sym.vhd is the same file as the design file design.vhd"},
+        std::pair{"sub/../t.txt",
+                  "The output file sub/../t.txt is the same file as the template t.txt"}}) {
+    SCOPED_TRACE(output);
     std::vector<std::string> args = argsFor("top", "t.txt");
-    args.back() = c.output;
+    args.back() = output;
     const RunResult run = runPinforge(args, dir.path());
     EXPECT_EQ(run.status, 1);
     EXPECT_EQ(run.out, "");
-    EXPECT_EQ(run.err, std::string("FATAL ERROR: ") + c.message + "; nothing was written.\n");
+    EXPECT_EQ(run.err, std::string("FATAL ERROR: ") + message + "; nothing was written.\n");
     EXPECT_EQ(dir.read("t.txt"), "%module%\n");
     EXPECT_EQ(dir.read("design.vhd"), kDesign);
   }

@@ -125,12 +125,6 @@ inline std::string binaryPath() {
   return path != nullptr ? path : "";
 }
 
-/// A copy of the program under test at `path`, so that a script shell is looked up beside it.
-inline bool placeProgram(const std::string& path) {
-  std::error_code error;
-  return std::filesystem::copy_file(binaryPath(), path, error) && !error;
-}
-
 /// Files to lay out, as (path, text); a path ending in '/' is a folder.
 using Layout = std::vector<std::pair<std::string, std::string>>;
 
@@ -140,7 +134,8 @@ using Layout = std::vector<std::pair<std::string, std::string>>;
 inline std::string placeCopy(const ScratchDir& dir, const Layout& files) {
   std::error_code error;
   std::filesystem::create_directories(dir.file("bin"), error);
-  if (error || !placeProgram(dir.file("bin/pinforge"))) return "";
+  if (error || !std::filesystem::copy_file(binaryPath(), dir.file("bin/pinforge"), error))
+    return "";
   for (const auto& [name, text] : files) {
     const std::filesystem::path path = dir.file(name);
     std::filesystem::create_directories(path.parent_path(), error);
