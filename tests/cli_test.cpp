@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include <filesystem>
+#include <regex>
 #include <set>
 #include <sstream>
 #include <string>
@@ -187,12 +188,9 @@ TEST(CommandLine, HelpNamesEverySwitchExamplesAndTemplates) {
   const std::string help = run.out.substr(kUsage.size());
   // Every switch of the usage text, and those the parser does not declare, has its own line.
   std::vector<std::string> switches = {"--help", "--version", "-h, -help, -?", "@<file>"};
-  for (size_t at = kUsage.find(" -"); at != std::string::npos; at = kUsage.find(" -", at + 1))
-    switches.push_back(kUsage.substr(at + 1, kUsage.find_first_of(" ]}", at + 1) - at - 1));
-  for (size_t at = kUsage.find("[-"); at != std::string::npos; at = kUsage.find("[-", at + 1))
-    switches.push_back(kUsage.substr(at + 1, kUsage.find_first_of(" ]", at + 1) - at - 1));
-  for (size_t at = kUsage.find("{-"); at != std::string::npos; at = kUsage.find("{-", at + 1))
-    switches.push_back(kUsage.substr(at + 1, kUsage.find(' ', at + 1) - at - 1));
+  const std::regex declared("[\\[{](--?[A-Za-z]+)");
+  for (std::sregex_iterator it(kUsage.begin(), kUsage.end(), declared), end; it != end; ++it)
+    switches.push_back((*it)[1]);
   EXPECT_GE(switches.size(), 19u);
   for (const std::string& name : switches)
     EXPECT_NE(help.find("\n  " + name + " "), std::string::npos) << name;

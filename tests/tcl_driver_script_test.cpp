@@ -120,8 +120,10 @@ RunResult runTcl(const ScratchDir& dir, const std::string& script) {
 
 std::string hex(std::string_view bytes) {
   std::string text;
-  for (unsigned char byte : bytes)
+  for (const char c : bytes) {
+    const auto byte = static_cast<unsigned char>(c);
     text += {"0123456789abcdef"[byte >> 4], "0123456789abcdef"[byte & 15]};
+  }
   return text;
 }
 
