@@ -1,5 +1,5 @@
 // The Tcl path seen from outside: a copy of the program runs beside a stand-in runscr that
-// captures the driver script, so the whole script, the messages, the fate of the temporary
+// captures the driver script, so its head and template, the messages, the fate of the temporary
 // file, where runscr comes from and what happens on a signal can be checked.
 #include <gtest/gtest.h>
 #include <signal.h>
