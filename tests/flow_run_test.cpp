@@ -2,16 +2,14 @@
 // only in debug mode once the unit is found, an unwritable trace file does not break the run
 // and a symlink is never followed to write it, a file-size limit fails the run cleanly,
 // links cannot make an input the output, -deleteonerror on the Tcl path, an interrupted run
-// leaves the previous output and no temporary file, the script shell is
-// found beside tclsh, and the shipped demo keeps its reviewed outputs.
-#include <fcntl.h>
+// leaves the previous output and no temporary file, the script shell is found beside tclsh,
+// and the shipped demo keeps its reviewed outputs.
 #include <gtest/gtest.h>
 #include <signal.h>
 #include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
-#include <cerrno>
 #include <chrono>
 #include <cstdlib>
 #include <filesystem>
@@ -37,39 +35,49 @@ std::vector<std::string> argsFor(const std::string& module, const std::string& t
           "demo", "-template", templateName, "-o",      "out.txt"};
 }
 
-TEST(FlowRun, TraceFileOnlyWhenDebuggingAFoundUnit) {
+// The Tcl rows run a stand-in script shell beside a copy of the program.
+TEST(FlowRun, TraceFileAndTclFailures) {
   if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
+  const char* succeeds = "exit 0\n";
+  const char* fails = "echo partial > out.txt\nexit 1\n";
   const struct {
     const char* what;
     const char* module;
-    const char* templateName;  // ".tcl" takes the Tcl path (a stand-in runscr that succeeds)
-    bool debug;
-    bool traceIsDirectory;  // "forge.deb" already exists as a directory
+    const char* templateName;  // ".tcl" takes the Tcl path
+    std::vector<std::string> extra;
+    const char* runscr;
+    bool traceIsFolder;  // "forge.deb" exists as a folder, so it cannot be written
     int status;
     const char* output;
     bool traced;
   } cases[] = {
-      {"no debug", "top", "t.txt", false, false, 0, "top\n", false},
-      {"debug", "top", "t.txt", true, false, 0, "top\n", true},
-      {"debug, unit missing", "other", "t.txt", true, false, 1, "", false},
-      {"debug, Tcl path", "top", "t.tcl", true, false, 0, "", true},
-      {"unwritable trace", "top", "t.txt", true, true, 0, "top\n", true},
+      {"no debug", "top", "t.txt", {}, succeeds, false, 0, "top\n", false},
+      {"debug", "top", "t.txt", {"--a"}, succeeds, false, 0, "top\n", true},
+      {"debug, unit missing", "other", "t.txt", {"--a"}, succeeds, false, 1, "", false},
+      {"debug, Tcl path", "top", "t.tcl", {"--a"}, succeeds, false, 0, "", true},
+      {"unwritable trace", "top", "t.txt", {"--a"}, succeeds, true, 0, "top\n", true},
+      {"failed script keeps its output", "top", "t.tcl", {}, fails, false, 1, "partial\n", false},
+      {"failed script, delete on error",
+       "top",
+       "t.tcl",
+       {"-deleteonerror"},
+       fails,
+       false,
+       1,
+       "<missing>",
+       false},
   };
   for (const auto& c : cases) {
     SCOPED_TRACE(c.what);
     ScratchDir dir;
-    ASSERT_TRUE(dir.makeDir("bin") && dir.makeDir("work"));
-    ASSERT_TRUE(dir.write("bin/runscr", "#!/bin/sh\nexit 0\n", true));
-    ASSERT_TRUE(dir.write("work/design.vhd", kDesign));
-    ASSERT_TRUE(dir.write(std::string("work/") + c.templateName, "%module%\n"));
-    if (c.traceIsDirectory) {
-      ASSERT_TRUE(dir.makeDir("work/forge.deb"));
-    }
     std::vector<std::string> args = argsFor(c.module, c.templateName);
-    if (c.debug) args.push_back("--a");
-    // runscr is taken from beside the program first, so the program runs from bin/ too.
-    ASSERT_TRUE(placeProgram(dir.file("bin/pinforge")));
-    args.insert(args.begin(), dir.file("bin/pinforge"));
+    args.insert(args.end(), c.extra.begin(), c.extra.end());
+    Layout files = {{"bin/runscr", std::string("#!/bin/sh\n") + c.runscr},
+                    {"work/design.vhd", kDesign},
+                    {std::string("work/") + c.templateName, "%module%\n"}};
+    if (c.traceIsFolder) files.push_back({"work/forge.deb/", ""});
+    args.insert(args.begin(), placeCopy(dir, files));
+    ASSERT_FALSE(args.front().empty());
     const RunResult run = runProgram(args, dir.file("work"));
     ASSERT_TRUE(run.started);
     EXPECT_EQ(run.status, c.status) << run.out << run.err;
@@ -137,49 +145,26 @@ TEST(FlowRun, FileSizeLimitFailsTheRun) {
 
 TEST(FlowRun, LinksCannotMakeAnInputTheOutput) {
   if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
-  const struct {
-    const char* output;
-    const char* message;
-  } cases[] = {
-      {"hard.txt", "The output file hard.txt is the same file as the template t.txt"},
-      {"sym.vhd", "The output file sym.vhd is the same file as the design file design.vhd"},
-      {"sub/../t.txt", "The output file sub/../t.txt is the same file as the template t.txt"},
-  };
-  for (const auto& c : cases) {
-    SCOPED_TRACE(c.output);
-    ScratchDir dir;
-    ASSERT_TRUE(dir.write("design.vhd", kDesign) && dir.write("t.txt", "%module%\n") &&
-                dir.makeDir("sub"));
-    ASSERT_EQ(link(dir.file("t.txt").c_str(), dir.file("hard.txt").c_str()), 0);
-    ASSERT_EQ(symlink("design.vhd", dir.file("sym.vhd").c_str()), 0);
+  ScratchDir dir;
+  ASSERT_TRUE(dir.write("design.vhd", kDesign) && dir.write("t.txt", "%module%\n") &&
+              dir.makeDir("sub"));
+  ASSERT_EQ(link(dir.file("t.txt").c_str(), dir.file("hard.txt").c_str()), 0);
+  ASSERT_EQ(symlink("design.vhd", dir.file("sym.vhd").c_str()), 0);
+  for (const auto& [output, message] :
+       {std::pair{"hard.txt", "The output file hard.txt is the same file as the template t.txt"},
+        std::pair{"sym.vhd",
+                  "The output file sym.vhd is the same file as the design file design.vhd"},
+        std::pair{"sub/../t.txt",
+                  "The output file sub/../t.txt is the same file as the template t.txt"}}) {
+    SCOPED_TRACE(output);
     std::vector<std::string> args = argsFor("top", "t.txt");
-    args.back() = c.output;
+    args.back() = output;
     const RunResult run = runPinforge(args, dir.path());
     EXPECT_EQ(run.status, 1);
     EXPECT_EQ(run.out, "");
-    EXPECT_EQ(run.err, std::string("FATAL ERROR: ") + c.message + "; nothing was written.\n");
+    EXPECT_EQ(run.err, std::string("FATAL ERROR: ") + message + "; nothing was written.\n");
     EXPECT_EQ(dir.read("t.txt"), "%module%\n");
     EXPECT_EQ(dir.read("design.vhd"), kDesign);
-  }
-}
-
-TEST(FlowRun, DeleteOnErrorOnTheTclPathRemovesWhatTheScriptWrote) {
-  if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
-  for (bool deleteOnError : {false, true}) {
-    SCOPED_TRACE(deleteOnError);
-    ScratchDir dir;
-    ASSERT_TRUE(dir.makeDir("bin") && dir.makeDir("work"));
-    // A stand-in script shell that writes part of the output, then fails.
-    ASSERT_TRUE(dir.write("bin/runscr", "#!/bin/sh\necho partial > out.txt\nexit 1\n", true));
-    ASSERT_TRUE(dir.write("work/design.vhd", kDesign) && dir.write("work/t.tcl", "\n"));
-    std::vector<std::string> args = argsFor("top", "t.tcl");
-    if (deleteOnError) args.push_back("-deleteonerror");
-    // runscr is taken from beside the program first, so the program runs from bin/ too.
-    ASSERT_TRUE(placeProgram(dir.file("bin/pinforge")));
-    args.insert(args.begin(), dir.file("bin/pinforge"));
-    const RunResult run = runProgram(args, dir.file("work"));
-    EXPECT_EQ(run.status, 1) << run.out << run.err;
-    EXPECT_EQ(dir.read("work/out.txt"), deleteOnError ? "<missing>" : "partial\n");
   }
 }
 
@@ -195,20 +180,8 @@ TEST(FlowRun, InterruptedRunLeavesThePreviousOutput) {
     const std::set<std::string> before = dir.names();
     std::vector<std::string> args = argsFor("top", "t.txt");
     args.insert(args.begin(), binaryPath());
-    std::vector<char*> argv;
-    for (std::string& arg : args) argv.push_back(arg.data());
-    argv.push_back(nullptr);
-    const pid_t child = fork();
+    const pid_t child = startQuietly(args, dir.path());
     ASSERT_GE(child, 0);
-    if (child == 0) {
-      const int devNull = open("/dev/null", O_RDWR);
-      if (devNull < 0 || dup2(devNull, 1) < 0 || dup2(devNull, 2) < 0 ||
-          chdir(dir.path().c_str()) != 0)
-        _exit(127);
-      alarm(60);
-      execv(argv[0], argv.data());
-      _exit(127);
-    }
     int writer = -1;
     bool temporarySeen = false;
     for (auto deadline = std::chrono::steady_clock::now() + 20s;

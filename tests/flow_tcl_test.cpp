@@ -1,15 +1,11 @@
 // The Tcl path seen from outside: a copy of the program runs beside a stand-in runscr that
-// captures the driver script, so the whole script, the messages, the fate of the temporary
+// captures the driver script, so its head and template, the messages, the fate of the temporary
 // file, where runscr comes from and what happens on a signal can be checked.
-#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <signal.h>
 #include <sys/wait.h>
-#include <unistd.h>
 
 #include <chrono>
-#include <cstdlib>
-#include <cstring>
 #include <filesystem>
 #include <ostream>
 #include <string>
@@ -44,18 +40,11 @@ std::string inScratch(std::string text, const ScratchDir& dir) {
 }
 
 constexpr const char* kTwoPorts =
-    "library ieee;\nuse ieee.std_logic_1164.all;\n"
-    "entity top is\n"
-    "  port (In0 : in std_logic;\n"
-    "        InBus : in std_logic_vector(2 downto 0));\n"
-    "end entity top;\n";
-
+    "library ieee;\nuse ieee.std_logic_1164.all;\nentity top is\n  port (In0 : in std_logic;\n"
+    "        InBus : in std_logic_vector(2 downto 0));\nend entity top;\n";
 constexpr const char* kTwoPortLists =
-    "set PortName [ list  \"In0\" \"InBus\" ]\n"
-    "set LeftRange [ list  -1 2 ]\n"
-    "set RightRange [ list  -1 0 ]\n"
-    "set PortDir [ list  \"I\" \"I\" ]\n"
-    "set TotalPorts 2\n";
+    "set PortName [ list  \"In0\" \"InBus\" ]\nset LeftRange [ list  -1 2 ]\n"
+    "set RightRange [ list  -1 0 ]\nset PortDir [ list  \"I\" \"I\" ]\nset TotalPorts 2\n";
 
 const std::string kSuccess = "forge(vhdl) completed successfully.\n";
 const std::string kFailure = "forge(vhdl) completed with errors.\n";
@@ -86,66 +75,26 @@ struct TclCase {
 
 /// The script up to its port count: the text every earlier version wrote.
 std::string expectedHead(const TclCase& c) {
+  const std::string project = "set ProjectName \"" + c.projectLine + "\"\n";
   return "# This file drives input variables to the tcl template file\n"
-         "#   given below in the \"source\" command.\n"
-         "set ModuleName \"top\"\n"
-         "set ProjectName \"" +
-         c.projectLine +
-         "\"\n"
-         "set ProjectFile \"\"\n"
-         "set ProjectName \"" +
-         c.projectLine +
-         "\"\n"
-         "set OutputFileName \"out.txt\"\n"
-         "set InputFileName \"design.vhd\"\n"
-         "set TemplateFileName \"t.tcl\"\n"
-         "set ErrorFileName \"__UNDEFINED__\"\n"
-         "set LibLocation \"\"\n"
-         "\n"
-         "# Port Definitions\n" +
+         "#   given below in the \"source\" command.\nset ModuleName \"top\"\n" +
+         project + "set ProjectFile \"\"\n" + project +
+         "set OutputFileName \"out.txt\"\nset InputFileName \"design.vhd\"\n"
+         "set TemplateFileName \"t.tcl\"\nset ErrorFileName \"__UNDEFINED__\"\n"
+         "set LibLocation \"\"\n\n# Port Definitions\n" +
          c.portLines;
-}
-
-/// The lines between the port count and the template, line by line as their names: their
-/// values come from the readers and are checked with design data of the test's own making.
-bool hasDesignDetails(const std::string& details) {
-  const char* kLines[] = {"",
-                          "# Generic Definitions",
-                          "set GenericName [ list ",
-                          "set GenericType [ list ",
-                          "set GenericDefault [ list ",
-                          "set GenericValue [ list ",
-                          "set TotalGenerics ",
-                          "",
-                          "# Declared Types and Context",
-                          "set PortType [ list "};
-  size_t at = 0;
-  for (const char* line : kLines) {
-    const size_t end = details.find('\n', at);
-    if (end == std::string::npos || details.compare(at, std::strlen(line), line) != 0) return false;
-    at = end + 1;
-  }
-  // The context is one quoted value that may span lines.
-  const std::string_view rest = std::string_view(details).substr(at);
-  return rest.starts_with("set Context \"") && rest.ends_with("\"\nset Language \"vhdl\"\n");
 }
 
 const TclCase kCases[] = {
     {.name = "TwoPorts", .templateText = "puts done\n"},
     {.name = "DirectionsAndIntegerRule",
-     .design = "library ieee;\nuse ieee.std_logic_1164.all;\n"
-               "entity top is\n"
-               "  port (a : in std_logic;\n"
-               "        b : out std_logic_vector(0 to 3);\n"
-               "        c : inout std_logic;\n"
-               "        d : buffer std_logic;\n"
-               "        n : in integer range 1000 downto 0);\n"
-               "end entity top;\n",
+     .design = "library ieee;\nuse ieee.std_logic_1164.all;\nentity top is\n"
+               "  port (a : in std_logic;\n        b : out std_logic_vector(0 to 3);\n"
+               "        c : inout std_logic;\n        d : buffer std_logic;\n"
+               "        n : in integer range 1000 downto 0);\nend entity top;\n",
      .portLines = "set PortName [ list  \"a\" \"b\" \"c\" \"d\" \"n\" ]\n"
-                  "set LeftRange [ list  -1 0 -1 -1 9 ]\n"
-                  "set RightRange [ list  -1 3 -1 -1 0 ]\n"
-                  "set PortDir [ list  \"I\" \"O\" \"B\" \"O\" \"I\" ]\n"
-                  "set TotalPorts 5\n",
+                  "set LeftRange [ list  -1 0 -1 -1 9 ]\nset RightRange [ list  -1 3 -1 -1 0 ]\n"
+                  "set PortDir [ list  \"I\" \"O\" \"B\" \"O\" \"I\" ]\nset TotalPorts 5\n",
      .out = "pinforge:WARNING: Module top(Line 8): INTEGER RANGE is only supported for schematic "
             "symbol generation.\n" +
             kSuccess},
@@ -203,28 +152,16 @@ TEST_P(TclDriver, WritesScriptAndJudgesShell) {
   const TclCase& c = GetParam();
   if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
   ScratchDir dir;
-  ASSERT_FALSE(dir.path().empty());
-  for (const char* sub : {"bin", "pathbin", "work", "tmp"}) ASSERT_TRUE(dir.makeDir(sub));
-  ASSERT_TRUE(placeProgram(dir.file("bin/pinforge")));
-  ASSERT_TRUE(dir.write("pathbin/runscr", "#!/bin/sh\nexit 9\n", true));
-  if (!c.shellBeside.empty()) {
-    ASSERT_TRUE(dir.write(c.shellBeside + "/runscr", kStandInRunscr, true));
-  }
-  ASSERT_TRUE(dir.write("work/design.vhd", c.design));
-  ASSERT_TRUE(dir.write("work/t.tcl", c.templateText));
-
-  std::vector<std::string> args = {dir.file("bin/pinforge"),
-                                   "-lib",
-                                   "work",
-                                   "design.vhd",
-                                   "-module",
-                                   "top",
-                                   "-prj",
-                                   c.project,
-                                   "-template",
-                                   "t.tcl",
-                                   "-o",
-                                   "out.txt"};
+  Layout files = {{"pathbin/runscr", "#!/bin/sh\nexit 9\n"},
+                  {"work/design.vhd", c.design},
+                  {"work/t.tcl", c.templateText},
+                  {"tmp/", ""}};
+  if (!c.shellBeside.empty()) files.push_back({c.shellBeside + "/runscr", kStandInRunscr});
+  const std::string program = placeCopy(dir, files);
+  ASSERT_FALSE(program.empty());
+  std::vector<std::string> args = {program,     "-lib",  "work", "design.vhd",
+                                   "-module",   "top",   "-prj", c.project,
+                                   "-template", "t.tcl", "-o",   "out.txt"};
   args.insert(args.end(), c.extraArgs.begin(), c.extraArgs.end());
   const std::string capture = dir.file("captured.tcl");
   const RunResult run = runProgram(args, dir.file("work"),
@@ -241,12 +178,10 @@ TEST_P(TclDriver, WritesScriptAndJudgesShell) {
   std::string script;
   ASSERT_EQ(readFile(capture, script), !c.scriptFolder.empty()) << "whether the stand-in ran";
   if (c.scriptFolder.empty()) return;
+  // What lies between the port count and the template is pinned by tcl_driver_script_test.
   const std::string head = expectedHead(c);
   EXPECT_EQ(script.substr(0, head.size()), head);
-  ASSERT_TRUE(script.ends_with(c.templateText)) << script;
-  const std::string details =
-      script.substr(head.size(), script.size() - head.size() - c.templateText.size());
-  EXPECT_TRUE(hasDesignDetails(details)) << details;
+  EXPECT_TRUE(script.ends_with(c.templateText)) << script;
 
   const std::string scriptName = readFile(capture + ".name");
   EXPECT_TRUE(scriptName.starts_with(inScratch(c.scriptFolder, dir) + "/")) << scriptName;
@@ -259,27 +194,25 @@ TEST_P(TclDriver, WritesScriptAndJudgesShell) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Cases, TclDriver, testing::ValuesIn(kCases),
-                         [](const testing::TestParamInfo<TclCase>& info) {
-                           return std::string(info.param.name);
+                         [](const testing::TestParamInfo<TclCase>& row) {
+                           return std::string(row.param.name);
                          });
 
 TEST(TclShell, RealShellWithTempFolderLikeAnOption) {
   if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
   if (findOnPath("tclsh").empty()) GTEST_SKIP() << "tclsh is not installed";
   ScratchDir dir;
-  for (const char* sub : {"bin", "work", "work/-tmp"}) ASSERT_TRUE(dir.makeDir(sub));
-  ASSERT_TRUE(placeProgram(dir.file("bin/pinforge")));
-  const std::string runscr = dir.file("bin/runscr");
-  std::error_code error;
-  ASSERT_TRUE(std::filesystem::copy_file(sourceDir() + "/tools/runscr", runscr, error));
-  ASSERT_TRUE(dir.write("work/design.vhd", kTwoPorts));
-  ASSERT_TRUE(dir.write("work/t.tcl",
-                        "set f [open $OutputFileName w]\n"
-                        "puts $f \"$ModuleName [llength $PortName]\"\nclose $f\n"));
-  const RunResult run =
-      runProgram({dir.file("bin/pinforge"), "-lib", "work", "design.vhd", "-module", "top", "-prj",
-                  "p", "-template", "t.tcl", "-o", "out.txt"},
-                 dir.file("work"), {{"TMPDIR", "-tmp"}});
+  const std::string program =
+      placeCopy(dir, {{"bin/runscr", readFile(sourceDir() + "/tools/runscr")},
+                      {"work/-tmp/", ""},
+                      {"work/design.vhd", kTwoPorts},
+                      {"work/t.tcl",
+                       "set f [open $OutputFileName w]\n"
+                       "puts $f \"$ModuleName [llength $PortName]\"\nclose $f\n"}});
+  ASSERT_FALSE(program.empty());
+  const RunResult run = runProgram({program, "-lib", "work", "design.vhd", "-module", "top", "-prj",
+                                    "p", "-template", "t.tcl", "-o", "out.txt"},
+                                   dir.file("work"), {{"TMPDIR", "-tmp"}});
   EXPECT_EQ(run.out, kSuccess);
   EXPECT_EQ(run.err, "");
   EXPECT_EQ(run.status, 0);
@@ -287,7 +220,8 @@ TEST(TclShell, RealShellWithTempFolderLikeAnOption) {
 
   // runscr itself, given such a name by hand.
   ASSERT_TRUE(dir.write("work/-tmp/direct.tcl", "set f [open direct.txt w]; puts $f ok; close $f"));
-  const RunResult direct = runProgram({runscr, "-tmp/direct.tcl"}, dir.file("work"));
+  const RunResult direct =
+      runProgram({dir.file("bin/runscr"), "-tmp/direct.tcl"}, dir.file("work"));
   EXPECT_EQ(direct.status, 0) << direct.err;
   EXPECT_EQ(dir.read("work/direct.txt"), "ok\n");
 }
@@ -307,25 +241,17 @@ class TclInterrupt : public testing::TestWithParam<int> {};
 TEST_P(TclInterrupt, StopsShellRemovesScriptAndEndsWithTheSignal) {
   if (binaryPath().empty()) GTEST_SKIP() << "PINFORGE_BIN is not set";
   ScratchDir dir;
-  for (const char* sub : {"bin", "work", "tmp"}) ASSERT_TRUE(dir.makeDir(sub));
-  ASSERT_TRUE(placeProgram(dir.file("bin/pinforge")));
-  ASSERT_TRUE(dir.write("bin/runscr", kSlowRunscr, true));
-  ASSERT_TRUE(dir.write("work/design.vhd", kTwoPorts));
-  ASSERT_TRUE(dir.write("work/t.tcl", "puts done\n"));
+  const std::string program = placeCopy(dir, {{"bin/runscr", kSlowRunscr},
+                                              {"work/design.vhd", kTwoPorts},
+                                              {"work/t.tcl", "puts done\n"},
+                                              {"tmp/", ""}});
+  ASSERT_FALSE(program.empty());
   const std::string capture = dir.file("captured");
-  const std::string program = dir.file("bin/pinforge");
-  const pid_t child = ::fork();
+  const pid_t child =
+      startQuietly({program, "-lib", "work", "design.vhd", "-module", "top", "-prj", "p",
+                    "-template", "t.tcl", "-o", "out.txt"},
+                   dir.file("work"), {{"TMPDIR", dir.file("tmp")}, {"FAKE_CAPTURE", capture}});
   ASSERT_GE(child, 0);
-  if (child == 0) {
-    const int quiet = ::open("/dev/null", O_WRONLY);
-    if (quiet < 0 || ::dup2(quiet, 1) < 0 || ::dup2(quiet, 2) < 0 ||
-        ::chdir(dir.file("work").c_str()) != 0 || ::setenv("TMPDIR", dir.file("tmp").c_str(), 1) ||
-        ::setenv("FAKE_CAPTURE", capture.c_str(), 1))
-      ::_exit(127);
-    ::execl(program.c_str(), program.c_str(), "-lib", "work", "design.vhd", "-module", "top",
-            "-prj", "p", "-template", "t.tcl", "-o", "out.txt", static_cast<char*>(nullptr));
-    ::_exit(127);
-  }
   bool started = false;
   for (int wait = 0; wait < 200 && !started; ++wait) {
     std::this_thread::sleep_for(std::chrono::milliseconds(50));
@@ -345,8 +271,8 @@ TEST_P(TclInterrupt, StopsShellRemovesScriptAndEndsWithTheSignal) {
 }
 
 INSTANTIATE_TEST_SUITE_P(Signals, TclInterrupt, testing::Values(SIGINT, SIGTERM, SIGHUP),
-                         [](const testing::TestParamInfo<int>& info) {
-                           return std::string(sigabbrev_np(info.param));
+                         [](const testing::TestParamInfo<int>& row) {
+                           return std::string(sigabbrev_np(row.param));
                          });
 
 }  // namespace

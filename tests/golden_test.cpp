@@ -22,11 +22,10 @@ namespace fs = std::filesystem;
 using namespace pinforge_test;
 
 const std::string kMissing = "<missing>";
-
-std::string goldenRoot() { return sourceDir() + "/tests/golden"; }
-
 // Holds the designs several cases run on; it is not a case itself.
 const std::string kSharedDesigns = "designs";
+
+std::string goldenRoot() { return sourceDir() + "/tests/golden"; }
 
 std::vector<std::string> goldenCases() {
   std::vector<std::string> cases;
@@ -51,7 +50,6 @@ TEST_P(GoldenTest, MatchesExpectations) {
   ASSERT_FALSE(binaryPath().empty()) << "PINFORGE_BIN is not set";
   const fs::path caseDir = fs::path(goldenRoot()) / GetParam();
   const auto caseFile = [&](const char* name) { return readFile((caseDir / name).string()); };
-
   const std::string argsText = caseFile("args");
   ASSERT_NE(argsText, kMissing) << "case " << GetParam() << " has no args file";
   for (const std::string& tool : words(caseFile("requires")))
@@ -59,8 +57,9 @@ TEST_P(GoldenTest, MatchesExpectations) {
 
   // The shared designs the case names come first, so that its own files can replace them;
   // everything but the files that describe the case takes part in the run.
-  const std::set<std::string> control = {"args",          "requires",      "designs",      "expect",
-                                         "expect.stdout", "expect.stderr", "expect.status"};
+  const std::set<std::string> control = {"args",          "requires",      "designs",
+                                         "expect",        "expect.stdout", "expect.stderr",
+                                         "expect.status", "expect.absent"};
   ScratchDir work;
   std::error_code error;
   std::vector<fs::path> sources;
@@ -89,21 +88,22 @@ TEST_P(GoldenTest, MatchesExpectations) {
     const std::string expected = caseFile(name);
     EXPECT_EQ(*actual, expected == kMissing ? *actual : expected) << name;
   }
-
   const fs::path expectDir = caseDir / "expect";
   for (const fs::directory_entry& entry : fs::recursive_directory_iterator(expectDir, error)) {
     if (!entry.is_regular_file(error)) continue;
     const fs::path relative = fs::relative(entry.path(), expectDir, error);
     EXPECT_EQ(work.read(relative.string()), readFile(entry.path().string())) << relative;
   }
+  for (const std::string& name : words(caseFile("expect.absent")))
+    EXPECT_FALSE(work.exists(name)) << name << " was left behind";
 }
 
 }  // namespace
 
 GTEST_ALLOW_UNINSTANTIATED_PARAMETERIZED_TEST(GoldenTest);
 INSTANTIATE_TEST_SUITE_P(Cases, GoldenTest, testing::ValuesIn(goldenCases()),
-                         [](const testing::TestParamInfo<std::string>& info) {
-                           std::string name = info.param;
+                         [](const testing::TestParamInfo<std::string>& row) {
+                           std::string name = row.param;
                            for (char& c : name)
                              if (!std::isalnum(static_cast<unsigned char>(c))) c = '_';
                            return name;

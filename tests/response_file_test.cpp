@@ -35,9 +35,10 @@ TEST(ExpandResponseFile, WordsAndFailures) {
        {rsp, "-ignored"},
        "  -lib\twork \t a.vhd\n\n\n-module   top  \n",
        {"-lib", "work", "a.vhd", "-module", "top"}},
-      {"no final newline", {rsp}, "-o out.vhd", {"-o", "out.vhd"}},
-      {"CRLF line ends", {rsp}, "-lib work\r\na.vhd\r\n", {"-lib", "work", "a.vhd"}},
-      {"a carriage return inside a line stays", {rsp}, "a\rb\n", {"a\rb"}},
+      {"CRLF line ends, a carriage return inside a line stays, no final newline",
+       {rsp},
+       "-lib work\r\na\rb\r\n-o out.vhd",
+       {"-lib", "work", "a\rb", "-o", "out.vhd"}},
       {"empty file", {rsp}, "", {}},
       {"no quoting, comments or nesting",
        {rsp},
@@ -93,10 +94,7 @@ TEST(ExpandResponseFile, WordsAndFailures) {
       EXPECT_EQ(expanded[0], "pinforge");
       EXPECT_EQ(words, test.words);
     }
-    std::string message(200, '\0');
-    std::rewind(messages.get());
-    message.resize(std::fread(message.data(), 1, message.size(), messages.get()));
-    EXPECT_EQ(message, test.message);
+    EXPECT_EQ(pinforge_test::readBack(messages.get()), test.message);
   }
 }
 

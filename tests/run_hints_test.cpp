@@ -1,5 +1,6 @@
-// The advice a failed run gives: which names come closest to a unit that was not found, what a
-// -g could have meant, and which -lang a design file seems to need.
+// The advice a failed run gives: which names come closest to a unit that was not found, and
+// which -lang a design file seems to need. What a -g could have meant is told by the cli_generic_*
+// and cli_parameter_* golden cases.
 #include <gtest/gtest.h>
 
 #include <string>
@@ -44,7 +45,6 @@ TEST(RunHints, NotFoundHintCountsUnitsAndOffersOnlyUnitsWithPorts) {
     const char* hint;
   } cases[] = {
       {"nothing read", {}, ""},
-      {"one unit", {unit("entity", "tops")}, "1 design unit was read; the closest name is: tops."},
       {"no entity among them",
        {unit("package", "top_pkg"), unit("package body", "top_pkg")},
        "2 design units were read, none of them an entity or a module."},
@@ -58,17 +58,6 @@ TEST(RunHints, NotFoundHintCountsUnitsAndOffersOnlyUnitsWithPorts) {
     SCOPED_TRACE(c.what);
     EXPECT_EQ(unitNotFoundHint("top", c.units), c.hint);
   }
-}
-
-TEST(RunHints, UnknownGenericNamesTheUnitsGenerics) {
-  std::vector<ScanGeneric> generics(2);
-  generics[0].name = "WIDTH";
-  generics[1].name = "DEPTH";
-  EXPECT_EQ(unknownGenericMessage("top", "WIDTHX", generics, false),
-            "-g WIDTHX: top has no generic WIDTHX; its generics are WIDTH, DEPTH.");
-  EXPECT_EQ(unknownGenericMessage("m", "W", generics, true),
-            "-g W: m has no parameter W; its parameters are WIDTH, DEPTH.");
-  EXPECT_EQ(unknownGenericMessage("top", "W", {}, false), "-g W: top has no generics.");
 }
 
 TEST(RunHints, LanguageHintFromExtensionsAndEntityDeclarations) {

@@ -5,10 +5,8 @@
 
 #include <gtest/gtest.h>
 
-#include <cstdio>
 #include <memory>
 #include <optional>
-#include <ostream>
 #include <string>
 #include <vector>
 
@@ -61,18 +59,11 @@ std::unique_ptr<RunContext> contextFor(const Design& design) {
 
 constexpr const char* kNames =
     "# This file drives input variables to the tcl template file\n"
-    "#   given below in the \"source\" command.\n"
-    "set ModuleName \"top\"\n"
-    "set ProjectName \"demo\"\n"
-    "set ProjectFile \"\"\n"
-    "set ProjectName \"demo\"\n"
-    "set OutputFileName \"out.txt\"\n"
-    "set InputFileName \"design.vhd\"\n"
-    "set TemplateFileName \"t.tcl\"\n"
-    "set ErrorFileName \"__UNDEFINED__\"\n"
-    "set LibLocation \"\"\n"
-    "\n"
-    "# Port Definitions\n";
+    "#   given below in the \"source\" command.\nset ModuleName \"top\"\n"
+    "set ProjectName \"demo\"\nset ProjectFile \"\"\nset ProjectName \"demo\"\n"
+    "set OutputFileName \"out.txt\"\nset InputFileName \"design.vhd\"\n"
+    "set TemplateFileName \"t.tcl\"\nset ErrorFileName \"__UNDEFINED__\"\n"
+    "set LibLocation \"\"\n\n# Port Definitions\n";
 
 struct HeadCase {
   const char* name;
@@ -94,13 +85,10 @@ const HeadCase kHeadCases[] = {
               "set RightRange [ list  -1 0 \"\" -1 ]\n"
               "set PortDir [ list  \"I\" \"O\" \"B\" \"O\" ]\n"
               "set TotalPorts 4\n",
-     .details = "\n# Generic Definitions\n"
-                "set GenericName [ list  \"WIDTH\" \"N\" ]\n"
+     .details = "\n# Generic Definitions\nset GenericName [ list  \"WIDTH\" \"N\" ]\n"
                 "set GenericType [ list  \"natural\" \"positive\" ]\n"
-                "set GenericDefault [ list  \"8\" \"\" ]\n"
-                "set GenericValue [ list  \"16\" \"\" ]\n"
-                "set TotalGenerics 2\n"
-                "\n# Declared Types and Context\n"
+                "set GenericDefault [ list  \"8\" \"\" ]\nset GenericValue [ list  \"16\" \"\" ]\n"
+                "set TotalGenerics 2\n\n# Declared Types and Context\n"
                 "set PortType [ list  \"std_ulogic\" \"std_logic_vector(WIDTH-1 downto 0)\" "
                 "\"std_logic_vector(N-1 downto 0)\" \"state_t\" ]\n"
                 "set Context \"library ieee;\nuse ieee.std_logic_1164.all;\"\n"
@@ -109,33 +97,20 @@ const HeadCase kHeadCases[] = {
      .design = {.language = DesignLanguage::Verilog},
      .ports = "set PortName [ list  ]\nset LeftRange [ list  ]\nset RightRange [ list  ]\n"
               "set PortDir [ list  ]\nset TotalPorts 0\n",
-     .details = "\n# Generic Definitions\n"
-                "set GenericName [ list  ]\n"
-                "set GenericType [ list  ]\n"
-                "set GenericDefault [ list  ]\n"
-                "set GenericValue [ list  ]\n"
-                "set TotalGenerics 0\n"
-                "\n# Declared Types and Context\n"
-                "set PortType [ list  ]\n"
-                "set Context \"\"\n"
+     .details = "\n# Generic Definitions\nset GenericName [ list  ]\nset GenericType [ list  ]\n"
+                "set GenericDefault [ list  ]\nset GenericValue [ list  ]\nset TotalGenerics 0\n"
+                "\n# Declared Types and Context\nset PortType [ list  ]\nset Context \"\"\n"
                 "set Language \"verilog\"\n"},
 };
 
-void PrintTo(const HeadCase& c, std::ostream* os) { *os << c.name; }
-
-class TclDriverHead : public testing::TestWithParam<HeadCase> {};
-
 // The names and port lines come first exactly as they always have (a bound that could not be
 // evaluated aside), and the new variables follow them.
-TEST_P(TclDriverHead, KeepsTheOldLinesAndAppendsTheDesignDetails) {
-  const HeadCase& c = GetParam();
-  EXPECT_EQ(tclDriverScriptHead(*contextFor(c.design)), kNames + c.ports + c.details);
+TEST(TclDriverHead, KeepsTheOldLinesAndAppendsTheDesignDetails) {
+  for (const HeadCase& c : kHeadCases) {
+    SCOPED_TRACE(c.name);
+    EXPECT_EQ(tclDriverScriptHead(*contextFor(c.design)), kNames + c.ports + c.details);
+  }
 }
-
-INSTANTIATE_TEST_SUITE_P(Designs, TclDriverHead, testing::ValuesIn(kHeadCases),
-                         [](const testing::TestParamInfo<HeadCase>& info) {
-                           return std::string(info.param.name);
-                         });
 
 /// Runs `script` with tclsh in `dir` (with a locale that reads the script byte by byte).
 RunResult runTcl(const ScratchDir& dir, const std::string& script) {
@@ -145,10 +120,9 @@ RunResult runTcl(const ScratchDir& dir, const std::string& script) {
 
 std::string hex(std::string_view bytes) {
   std::string text;
-  char pair[3];
-  for (unsigned char byte : bytes) {
-    std::snprintf(pair, sizeof pair, "%02x", byte);
-    text += pair;
+  for (const char c : bytes) {
+    const auto byte = static_cast<unsigned char>(c);
+    text += {"0123456789abcdef"[byte >> 4], "0123456789abcdef"[byte & 15]};
   }
   return text;
 }

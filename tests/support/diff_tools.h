@@ -76,14 +76,11 @@ inline std::vector<std::string> fixtureFiles(const std::string& language,
                                              const std::vector<std::string>& extensions) {
   std::vector<std::string> files;
   std::error_code error;
-  std::filesystem::directory_iterator it(sourceDir() + "/tests/fixtures/" + language, error);
-  if (error) return files;
-  for (const std::filesystem::directory_entry& entry : it) {
-    const std::string extension = entry.path().extension().string();
+  const std::string dir = sourceDir() + "/tests/fixtures/" + language;
+  for (const auto& entry : std::filesystem::directory_iterator(dir, error))
     if (entry.is_regular_file(error) &&
-        std::find(extensions.begin(), extensions.end(), extension) != extensions.end())
+        std::count(extensions.begin(), extensions.end(), entry.path().extension().string()) != 0)
       files.push_back(std::filesystem::absolute(entry.path(), error).lexically_normal().string());
-  }
   std::sort(files.begin(), files.end());
   return files;
 }

@@ -1,6 +1,6 @@
 // Runs a program the way a user would, without a shell, and captures everything it tells:
 // standard output, standard error and the exit status. Also where the test run finds the
-// binary under test, the source tree and other programs.
+// binary under test, the source tree and other programs, and a copy of it with its own runscr.
 #pragma once
 
 #include <fcntl.h>
@@ -16,6 +16,8 @@
 #include <utility>
 #include <vector>
 
+#include "support/scratch_dir.h"
+
 extern char** environ;
 
 namespace pinforge_test {
@@ -30,14 +32,12 @@ struct RunResult {
 /// Variables a run replaces or adds to the environment, as (name, value).
 using EnvChanges = std::vector<std::pair<std::string, std::string>>;
 
-/// Runs `argv` (argv[0] a path; PATH is not searched) with standard input from /dev/null, in
-/// `workDir` unless that is empty. With `mergeErrors` standard error goes to `out`,
-/// interleaved. A child still running after `timeoutSeconds` is killed so it cannot stall the
-/// suite.
-inline RunResult runProgram(std::vector<std::string> argv, const std::string& workDir = "",
-                            const EnvChanges& env = {}, bool mergeErrors = false,
-                            unsigned timeoutSeconds = 120) {
-  RunResult result;
+/// Starts `argv` (argv[0] a path; PATH is not searched) in `workDir` unless that is empty, with
+/// standard input from /dev/null and output to `out` and `err`. A child still running after
+/// `timeoutSeconds` is killed so it cannot stall the suite. The child's id, or -1.
+inline pid_t spawn(std::vector<std::string> argv, const std::string& workDir, const EnvChanges& env,
+                   int out, int err, unsigned timeoutSeconds = 120) {
+  // Everything the child needs is made before the fork, where allocating is safe.
   std::vector<std::string> envTexts;
   for (char** entry = environ; *entry != nullptr; ++entry) {
     bool replaced = false;
@@ -46,33 +46,38 @@ inline RunResult runProgram(std::vector<std::string> argv, const std::string& wo
     if (!replaced) envTexts.emplace_back(*entry);
   }
   for (const auto& [name, value] : env) envTexts.push_back(name + "=" + value);
-  auto pointers = [](std::vector<std::string>& texts) {
-    std::vector<char*> list;
-    for (std::string& text : texts) list.push_back(text.data());
-    list.push_back(nullptr);
-    return list;
-  };
-  std::vector<char*> args = pointers(argv);
-  std::vector<char*> envp = pointers(envTexts);
+  std::vector<char*> args, envp;
+  for (std::string& text : argv) args.push_back(text.data());
+  for (std::string& text : envTexts) envp.push_back(text.data());
+  args.push_back(nullptr);
+  envp.push_back(nullptr);
+  if (argv.empty()) return -1;
+  const pid_t pid = fork();
+  if (pid != 0) return pid;
+  const int devNull = open("/dev/null", O_RDONLY);
+  if (devNull < 0 || dup2(devNull, 0) < 0 || dup2(out, 1) < 0 || dup2(err, 2) < 0 ||
+      (!workDir.empty() && chdir(workDir.c_str()) != 0))
+    _exit(127);
+  alarm(timeoutSeconds);
+  execve(args[0], args.data(), envp.data());
+  _exit(127);
+}
 
+/// Runs `argv` as `spawn` does and waits for it. With `mergeErrors` standard error goes to
+/// `out`, interleaved.
+inline RunResult runProgram(std::vector<std::string> argv, const std::string& workDir = "",
+                            const EnvChanges& env = {}, bool mergeErrors = false,
+                            unsigned timeoutSeconds = 120) {
+  RunResult result;
   int pipes[2][2];
-  if (argv.empty() || pipe2(pipes[0], O_CLOEXEC) != 0) return result;
+  if (pipe2(pipes[0], O_CLOEXEC) != 0) return result;
   if (pipe2(pipes[1], O_CLOEXEC) != 0) {
     close(pipes[0][0]);
     close(pipes[0][1]);
     return result;
   }
-  const pid_t pid = fork();
-  if (pid == 0) {
-    const int devNull = open("/dev/null", O_RDONLY);
-    if (devNull < 0 || dup2(devNull, 0) < 0 || dup2(pipes[0][1], 1) < 0 ||
-        dup2(pipes[mergeErrors ? 0 : 1][1], 2) < 0 ||
-        (!workDir.empty() && chdir(workDir.c_str()) != 0))
-      _exit(127);
-    alarm(timeoutSeconds);
-    execve(args[0], args.data(), envp.data());
-    _exit(127);
-  }
+  const pid_t pid = spawn(std::move(argv), workDir, env, pipes[0][1], pipes[mergeErrors ? 0 : 1][1],
+                          timeoutSeconds);
   close(pipes[0][1]);
   close(pipes[1][1]);
   // Both pipes are drained together so a child that fills one of them never blocks.
@@ -97,13 +102,21 @@ inline RunResult runProgram(std::vector<std::string> argv, const std::string& wo
   }
   close(pipes[0][0]);
   close(pipes[1][0]);
-  if (pid < 0) return result;
   int wstatus = 0;
-  while (waitpid(pid, &wstatus, 0) < 0)
+  while (pid > 0 && waitpid(pid, &wstatus, 0) < 0)
     if (errno != EINTR) return result;
-  result.started = true;
-  result.status = WIFEXITED(wstatus) ? WEXITSTATUS(wstatus) : -1;
+  result.started = pid > 0;
+  result.status = pid > 0 && WIFEXITED(wstatus) ? WEXITSTATUS(wstatus) : -1;
   return result;
+}
+
+/// Starts `argv` as `spawn` does with its output thrown away, and returns at once.
+inline pid_t startQuietly(const std::vector<std::string>& argv, const std::string& workDir,
+                          const EnvChanges& env = {}) {
+  const int devNull = open("/dev/null", O_WRONLY | O_CLOEXEC);
+  const pid_t pid = devNull < 0 ? -1 : spawn(argv, workDir, env, devNull, devNull, 60);
+  if (devNull >= 0) close(devNull);
+  return pid;
 }
 
 /// The pinforge binary under test ($PINFORGE_BIN), or empty when the variable is unset.
@@ -112,10 +125,24 @@ inline std::string binaryPath() {
   return path != nullptr ? path : "";
 }
 
-/// A copy of the program under test at `path`, so that a script shell is looked up beside it.
-inline bool placeProgram(const std::string& path) {
+/// Files to lay out, as (path, text); a path ending in '/' is a folder.
+using Layout = std::vector<std::pair<std::string, std::string>>;
+
+/// Fills `dir` with a copy of the program under test, bin/pinforge, so that a script shell in
+/// bin/ is found beside it, and with `files` (folders made on the way; a file named runscr is
+/// executable). The copy's path, or empty when something could not be made.
+inline std::string placeCopy(const ScratchDir& dir, const Layout& files) {
   std::error_code error;
-  return std::filesystem::copy_file(binaryPath(), path, error) && !error;
+  std::filesystem::create_directories(dir.file("bin"), error);
+  if (error || !std::filesystem::copy_file(binaryPath(), dir.file("bin/pinforge"), error))
+    return "";
+  for (const auto& [name, text] : files) {
+    const std::filesystem::path path = dir.file(name);
+    std::filesystem::create_directories(path.parent_path(), error);
+    if (error || (!name.ends_with("/") && !dir.write(name, text, path.filename() == "runscr")))
+      return "";
+  }
+  return dir.file("bin/pinforge");
 }
 
 /// Runs the pinforge binary under test with `args` in `workDir`.

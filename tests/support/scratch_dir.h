@@ -22,15 +22,20 @@ struct FileCloser {
 };
 using FilePtr = std::unique_ptr<std::FILE, FileCloser>;
 
+/// Everything left to read from `file`.
+inline std::string readRest(std::FILE* file) {
+  std::string text;
+  char buffer[8192];
+  for (size_t got; (got = std::fread(buffer, 1, sizeof buffer, file)) > 0;)
+    text.append(buffer, got);
+  return text;
+}
+
 /// The whole file into `content`; false when it cannot be read.
 inline bool readFile(const std::string& path, std::string& content) {
   FilePtr in(std::fopen(path.c_str(), "rb"));
-  if (!in) return false;
-  content.clear();
-  char buffer[8192];
-  size_t got;
-  while ((got = std::fread(buffer, 1, sizeof buffer, in.get())) > 0) content.append(buffer, got);
-  return std::ferror(in.get()) == 0;
+  if (in) content = readRest(in.get());
+  return in && std::ferror(in.get()) == 0;
 }
 
 /// The whole file, or "<missing>" when it cannot be read.
@@ -43,11 +48,7 @@ inline std::string readFile(const std::string& path) {
 inline std::string readBack(std::FILE* file) {
   std::fflush(file);
   std::rewind(file);
-  std::string text;
-  char buffer[8192];
-  for (size_t got; (got = std::fread(buffer, 1, sizeof buffer, file)) > 0;)
-    text.append(buffer, got);
-  return text;
+  return readRest(file);
 }
 
 /// The first line of every reader message in `text`; later lines of one start with two blanks.

@@ -1,0 +1,2 @@
+entity other is
+end entity other;

@@ -1,0 +1,2 @@
+module top(input a);
+endmodule

@@ -1,0 +1,3 @@
+entity top is
+  port (a : in bit);
+end entity top;

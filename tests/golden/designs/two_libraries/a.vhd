@@ -1,0 +1,5 @@
+entity alu is
+end entity alu;
+
+package pkg is
+end package pkg;

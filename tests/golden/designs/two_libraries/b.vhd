@@ -1,0 +1,2 @@
+entity top_tb is
+end entity top_tb;
