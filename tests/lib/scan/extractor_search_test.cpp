@@ -2,21 +2,13 @@
 // library in registration order; search mode 0 stays in the named library.
 #include <gtest/gtest.h>
 
-#include <cstdlib>
 #include <string>
 #include <vector>
 
+#include "lib/scan/vhdl/vhdl_test_support.h"
 #include "platform/scan.h"
 
 namespace {
-
-std::string fixture(const std::string& name) {
-  const char* root = std::getenv("PINFORGE_SOURCE_DIR");
-  std::string here = __FILE__;
-  std::string base =
-      root ? std::string(root) + "/tests" : here.substr(0, here.rfind("/tests/") + 6);
-  return base + "/fixtures/vhdl/" + name;
-}
 
 struct SearchCase {
   const char* label;
@@ -60,7 +52,7 @@ TEST_P(LibrarySearch, FindsTheRightUnit) {
   const SearchCase& c = GetParam();
   ScanExtractor extractor;
   for (const auto& [library, file] : c.files)
-    extractor.addDesignFile(library, fixture(file).c_str(), ScanExtractor::Vhdl);
+    extractor.addDesignFile(library, vhdl_test::fixture(file).c_str(), ScanExtractor::Vhdl);
   extractor.Parse(ScanExtractor::Vhdl);
   int result = extractor.findDesignUnit(c.library, "TWIN", c.search);
   ScanPortList* ports = extractor.getPorts();
@@ -76,10 +68,7 @@ TEST_P(LibrarySearch, FindsTheRightUnit) {
   EXPECT_EQ(ports->nextPort(ports->firstPort()), nullptr);
 }
 
-INSTANTIATE_TEST_SUITE_P(Scan, LibrarySearch, testing::ValuesIn(kCases),
-                         [](const testing::TestParamInfo<SearchCase>& info) {
-                           return std::string(info.param.label);
-                         });
+INSTANTIATE_TEST_SUITE_P(Scan, LibrarySearch, testing::ValuesIn(kCases), vhdl_test::ByLabel());
 
 TEST(Extractor, RegistersLibrariesInFirstUseOrder) {
   ScanExtractor extractor;

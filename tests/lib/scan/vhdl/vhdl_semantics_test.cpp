@@ -5,39 +5,9 @@
 #include <string>
 #include <vector>
 
-#include "scan/vhdl/vhdl_lexer.h"
 #include "vhdl_test_support.h"
 
 namespace {
-
-struct File {
-  const char* library;
-  const char* text;
-};
-
-// "name(left dir right)" or "name" per port, joined by blanks; "?" when the unit is missing.
-std::string portsOf(const std::vector<File>& files, const char* unit) {
-  std::vector<std::string> texts;
-  std::vector<std::string> libraries;
-  for (const File& file : files) {
-    texts.push_back(file.text);
-    libraries.push_back(file.library);
-  }
-  vhdl_test::Described d = vhdl_test::describe(texts, unit, {}, libraries);
-  if (!d.found) return "?";
-  std::string out;
-  for (const ScanPort& p : d.unit.ports) {
-    if (!out.empty()) out += ' ';
-    out += p.name();
-    if (!p.hasRange()) continue;
-    int32_t left = 0;
-    int32_t right = 0;
-    p.getBounds(left, right);
-    out += "(" + std::to_string(left) + (p.isAscending() ? " to " : " downto ") +
-           std::to_string(right) + ")";
-  }
-  return out;
-}
 
 const char* kPkg =
     "package pkg is\n"
@@ -76,9 +46,9 @@ const char* kPkg =
 
 struct SemanticsCase {
   const char* label;
-  std::vector<File> files;
+  vhdl_test::Files files;
   const char* unit;
-  const char* ports;
+  const char* ports;  ///< "name(range)" or "name" per port
 };
 
 const SemanticsCase kCases[] = {
@@ -245,45 +215,9 @@ const SemanticsCase kCases[] = {
 class Semantics : public testing::TestWithParam<SemanticsCase> {};
 
 TEST_P(Semantics, PortsFollowTheRules) {
-  EXPECT_EQ(portsOf(GetParam().files, GetParam().unit), GetParam().ports);
+  EXPECT_EQ(vhdl_test::read(GetParam().files, GetParam().unit).ranges(), GetParam().ports);
 }
 
-INSTANTIATE_TEST_SUITE_P(Vhdl, Semantics, testing::ValuesIn(kCases),
-                         [](const testing::TestParamInfo<SemanticsCase>& info) {
-                           return std::string(info.param.label);
-                         });
-
-struct StartCase {
-  const char* text;
-  const char* words;  ///< what the index pass's fast path stops at
-};
-
-const StartCase kStartCases[] = {
-    {"entity e is port (a : in bit); end;", "entity end"},
-    {"a; -- b;\n c; /* d; */ e", "a c e"},
-    {"x <= \"; y\"; z", "x z"},
-    {"x := '; '; y", "x y"},
-    {"f(a)';' b; c", "f c"},
-    {"when ';' => q; r", "when r"},
-    {"x := 8UX\";\"; y", "x y"},
-    {"\\ext\\; \\two words\\ is", "\\ext\\ \\two words\\"},
-    {"ENDING; End; a.end", "ENDING End a end"},
-};
-
-class StatementStarts : public testing::TestWithParam<StartCase> {};
-
-TEST_P(StatementStarts, AreFoundByTheFastPath) {
-  std::string text = GetParam().text;
-  scan::vhdl::Lexer lexer(text);
-  std::string words;
-  for (scan::vhdl::Token t = lexer.nextAtStatementStart(); t.kind != scan::vhdl::TokenKind::End;
-       t = lexer.nextAtStatementStart()) {
-    if (!words.empty()) words += ' ';
-    words += std::string(t.text);
-  }
-  EXPECT_EQ(words, GetParam().words);
-}
-
-INSTANTIATE_TEST_SUITE_P(Vhdl, StatementStarts, testing::ValuesIn(kStartCases));
+INSTANTIATE_TEST_SUITE_P(Vhdl, Semantics, testing::ValuesIn(kCases), vhdl_test::ByLabel());
 
 }  // namespace
