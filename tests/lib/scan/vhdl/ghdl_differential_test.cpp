@@ -10,7 +10,6 @@
 #include <memory>
 #include <regex>
 #include <set>
-#include <sstream>
 #include <string>
 #include <utility>
 #include <vector>
@@ -63,13 +62,10 @@ struct ProbedEntity {
   std::vector<Probe> probes;
 };
 
-// What a probe line reported for one port.
+// The fields of the probe line of one port; kind is 0 when none came.
 struct Report {
-  char kind = 0;  ///< 'A', 'S', 'E' or 'N' as the probe kinds above; 0 when nothing came
-  std::string left;
-  std::string right;
-  bool ascending = false;
-  long long length = 0;  ///< 'E' only
+  char kind = 0;  ///< 'A', 'S', 'E' or 'N' as the probe kinds above
+  std::string field[3];
 };
 
 const char* const kProbeArchitecture = "pinforge_probe";
@@ -101,42 +97,14 @@ bool isInteger(const std::string& image) {
 }
 
 std::vector<Report> parseReports(const std::string& output, size_t portCount) {
-  static const std::regex line(R"(\(report note\): P\|([0-9]{1,9})\|([ASEN])(.*))");
-  static const std::regex field(R"(\|([^|]*))");
+  static const std::regex line(
+      R"(\(report note\): P\|([0-9]{1,9})\|([ASEN])(?:\|([^|\n]*))?(?:\|([^|\n]*))?(?:\|([^|\n]*))?)");
   std::vector<Report> reports(portCount);
   for (std::sregex_iterator it(output.begin(), output.end(), line), end; it != end; ++it) {
     const size_t index = std::stoul((*it)[1]);
-    if (index >= portCount) continue;
-    std::vector<std::string> fields;
-    const std::string rest = (*it)[3];
-    for (std::sregex_iterator f(rest.begin(), rest.end(), field); f != end; ++f)
-      fields.push_back((*f)[1]);
-    fields.resize(3);
-    Report& r = reports[index];
-    r.kind = (*it)[2].str()[0];
-    r.left = r.kind == 'E' ? "" : fields[0];
-    r.right = r.kind == 'E' ? "" : fields[1];
-    r.ascending = fields[r.kind == 'E' ? 1 : 2] == "true";
-    if (r.kind == 'S' && isInteger(r.left) && isInteger(r.right))
-      r.ascending = std::stoll(r.left) <= std::stoll(r.right);
-    if (r.kind == 'E') r.length = std::stoll(fields[0]);
+    if (index < portCount) reports[index] = {(*it)[2].str()[0], {(*it)[3], (*it)[4], (*it)[5]}};
   }
   return reports;
-}
-
-// The probe file's line of each GHDL message about it; the last mention in a message line
-// wins, as a message may quote another location first.
-std::vector<int> probeErrorLines(const std::string& output) {
-  static const std::regex mention("pinforge_probe\\.vhd:([0-9]+):[0-9]+:");
-  std::vector<int> lines;
-  std::istringstream in(output);
-  for (std::string text; std::getline(in, text);) {
-    int last = 0;
-    for (std::sregex_iterator it(text.begin(), text.end(), mention), end; it != end; ++it)
-      last = std::stoi((*it)[1]);
-    if (last != 0) lines.push_back(last);
-  }
-  return lines;
 }
 
 std::string withoutComments(const std::string& text) {
@@ -183,9 +151,11 @@ std::string rangeText(const ScanPort& port) {
 
 std::string theirRange(const Report& r) {
   if (r.kind == 0) return "nothing reported";
-  if ((r.kind == 'A' || r.kind == 'S') && isInteger(r.left) && isInteger(r.right))
-    return r.left + (r.ascending ? " to " : " downto ") + r.right;
-  return "no range";
+  const std::string &left = r.field[0], &right = r.field[1];
+  if ((r.kind != 'A' && r.kind != 'S') || !isInteger(left) || !isInteger(right)) return "no range";
+  const bool ascending =
+      r.kind == 'A' ? r.field[2] == "true" : std::stoll(left) <= std::stoll(right);
+  return left + (ascending ? " to " : " downto ") + right;
 }
 
 // Whether our range says what GHDL's report does, in whatever form each can give.
@@ -193,19 +163,20 @@ bool rangeAgrees(const ScanPort& ours, const Report& r, bool constrained) {
   const std::string range = rangeText(ours);
   if (r.kind != 0 && range == theirRange(r)) return true;
   // An enumeration index has no integer bounds: positions of the right length and direction.
-  if (r.kind == 'E' && ours.hasRange()) {
+  if (r.kind == 'E' && ours.hasRange() && isInteger(r.field[0])) {
     int32_t left = 0;
     int32_t right = 0;
     ours.getBounds(left, right);
     const long long span = ours.isAscending() ? 1LL + right - left : 1LL + left - right;
-    return std::max(span, 0LL) == r.length && (ours.isAscending() != 0) == r.ascending;
+    return std::max(span, 0LL) == std::stoll(r.field[0]) &&
+           (ours.isAscending() != 0) == (r.field[1] == "true");
   }
   if (r.kind != 'S') return false;
   // A scalar type mark without a constraint of its own (integer, natural, a named integer
   // subtype) need not be reported as a range; and a scalar probe cannot tell "5 to 5" from
   // "5 downto 5".
-  return (!constrained && !ours.hasRange()) ||
-         (isInteger(r.left) && r.left == r.right && range == r.left + " downto " + r.right);
+  return (!constrained && !ours.hasRange()) || (isInteger(r.field[0]) && r.field[0] == r.field[1] &&
+                                                range == r.field[0] + " downto " + r.field[1]);
 }
 
 std::string lineText(const GhdlPort& port) {
@@ -323,10 +294,16 @@ class GhdlDifferential : public ::testing::TestWithParam<Design> {
       const ToolRun run = ghdl({"-a", workdir + "/pinforge_probe.vhd"}, workdir);
       if (run.status == 0) return true;
       bool changed = false;
-      std::set<int> handled;
-      for (const int line : probeErrorLines(run.output)) {
-        if (line >= static_cast<int>(atLine.size()) || !handled.insert(line).second) continue;
-        Probe* probe = atLine[static_cast<size_t>(line)];
+      std::set<size_t> handled;
+      // The last mention of the probe file in a message line names the line at fault; one
+      // step per line and round.
+      static const std::regex mention(
+          R"(pinforge_probe\.vhd:([0-9]{1,9}):[0-9]+:(?!.*pinforge_probe\.vhd:[0-9]+:[0-9]+:))");
+      for (std::sregex_iterator it(run.output.begin(), run.output.end(), mention), end; it != end;
+           ++it) {
+        const size_t line = std::stoul((*it)[1]);
+        if (line >= atLine.size() || !handled.insert(line).second) continue;
+        Probe* probe = atLine[line];
         if (probe != nullptr && *probe != Probe::Opaque) {
           *probe = static_cast<Probe>(static_cast<int>(*probe) + 1);
           changed = true;
