@@ -234,17 +234,14 @@ class GhdlDifferential : public ::testing::TestWithParam<Design> {
     }
     for (const std::string& library : libraries) {
       std::vector<std::string> pending = packageFiles;
-      for (bool progress = true; progress;) {
-        progress = false;
-        for (auto it = pending.begin(); it != pending.end();) {
-          if (ghdl({"-a", "--work=" + library, *it}, s_Root->file("shared")).status != 0) {
-            ++it;
-            continue;
-          }
-          if (library == "work") s_PackageFiles.push_back(*it);
-          it = pending.erase(it);
-          progress = true;
-        }
+      for (size_t before = 0; before != pending.size();) {
+        before = pending.size();
+        std::erase_if(pending, [&](const std::string& file) {
+          if (ghdl({"-a", "--work=" + library, file}, s_Root->file("shared")).status != 0)
+            return false;
+          if (library == "work") s_PackageFiles.push_back(file);
+          return true;
+        });
       }
     }
   }
