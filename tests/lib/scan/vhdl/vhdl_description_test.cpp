@@ -154,7 +154,7 @@ TEST(VhdlDescription, OverridesChangeValuesAndEveryWidthUsingThem) {
 }
 
 TEST(VhdlDescription, UnevaluableRangesAreUnknownWithTheFix) {
-  const char* kEntity =
+  const std::string kEntity =
       "library ieee; use ieee.std_logic_1164.all;\n"
       "entity e is generic (WIDTH : natural; N : natural := 2);\n"
       "  port (d : in std_logic_vector(WIDTH-1 downto 0); u : in std_logic_vector;\n"
@@ -162,80 +162,63 @@ TEST(VhdlDescription, UnevaluableRangesAreUnknownWithTheFix) {
       "end;\n";
   struct Case {
     const char* label;
-    vhdl_test::Files files;
-    Overrides overrides;
+    std::string text;
     const char* port;
     const char* range;
+    Overrides overrides = {};
   };
   const Case cases[] = {
-      {"generic_without_default",
-       {{"work", kEntity}},
-       {},
-       "d",
+      {"generic_without_default", kEntity, "d",
        "unknown: port 'd': cannot evaluate WIDTH-1 downto 0: generic 'WIDTH' has no value; "
        "give one with -g WIDTH=VALUE"},
-      {"unconstrained_and_scalar_ports_are_not_unknown", {{"work", kEntity}}, {}, "u", "-"},
+      {"unconstrained_and_scalar_ports_are_not_unknown", kEntity, "u", "-"},
       {"bad_override_never_falls_back_to_the_default",
-       {{"work", kEntity}},
-       {{"WIDTH", "nope"}},
+       kEntity,
        "d",
        "unknown: port 'd': cannot evaluate WIDTH-1 downto 0: -g WIDTH=nope cannot be "
-       "evaluated: 'nope' is not declared"},
+       "evaluated: 'nope' is not declared",
+       {{"WIDTH", "nope"}}},
       {"text_after_the_value",
-       {{"work", kEntity}},
-       {{"WIDTH", "3 4"}},
+       kEntity,
        "d",
        "unknown: port 'd': cannot evaluate WIDTH-1 downto 0: -g WIDTH=3 4 cannot be "
-       "evaluated: unexpected '4' after the value"},
+       "evaluated: unexpected '4' after the value",
+       {{"WIDTH", "3 4"}}},
       {"missing_package_of_a_use_clause",
-       {{"work",
-         "use work.absent_pkg.all;\n"
-         "entity e is port (d : in bit_vector(C_W - 1 downto 0)); end;\n"}},
-       {},
+       "use work.absent_pkg.all;\n"
+       "entity e is port (d : in bit_vector(C_W - 1 downto 0)); end;\n",
        "d",
        "unknown: port 'd': cannot evaluate C_W - 1 downto 0: package 'absent_pkg' is not in "
        "any design file; add the file that declares it"},
       {"missing_package_of_a_selected_name",
-       {{"work", "entity e is port (d : in bit_vector(other_pkg.W downto 0)); end;\n"}},
-       {},
-       "d",
+       "entity e is port (d : in bit_vector(other_pkg.W downto 0)); end;\n", "d",
        "unknown: port 'd': cannot evaluate other_pkg.W downto 0: package 'other_pkg' is not "
        "in any design file; add the file that declares it"},
       {"type_of_a_missing_package",
-       {{"work",
-         "library mylib; use mylib.types_pkg.all;\n"
-         "entity e is port (t : in bus_t); end;\n"}},
-       {},
+       "library mylib; use mylib.types_pkg.all;\n"
+       "entity e is port (t : in bus_t); end;\n",
        "t",
        "unknown: port 't': type 'bus_t' is not declared: package 'types_pkg' is not in any "
        "design file; add the file that declares it"},
-      {"undeclared_type",
-       {{"work", "entity e is port (t : in bus_t); end;\n"}},
-       {},
-       "t",
+      {"undeclared_type", "entity e is port (t : in bus_t); end;\n", "t",
        "unknown: port 't': type 'bus_t' is not declared: add the design file of the package "
        "that declares it"},
       {"unsupported_construct_keeps_the_reason",
-       {{"work",
-         "entity e is generic (S : string := \"ab\");\n"
-         "  port (d : in bit_vector(S'foo downto 0)); end;\n"}},
-       {},
+       "entity e is generic (S : string := \"ab\");\n"
+       "  port (d : in bit_vector(S'foo downto 0)); end;\n",
        "d",
        "unknown: port 'd': cannot evaluate S'foo downto 0: attribute 'S'foo' is not supported "
        "in bounds"},
       {"range_of_a_package_subtype",
-       {{"work",
-         "package p is constant C : natural := 8; subtype w_t is bit_vector(C/0 downto 0);\n"
-         "end;\n"},
-        {"work", "use work.p.all; entity e is port (w : in w_t); end;\n"}},
-       {},
+       "package p is constant C : natural := 8; subtype w_t is bit_vector(C/0 downto 0);\n"
+       "end;\nuse work.p.all; entity e is port (w : in w_t); end;\n",
        "w",
        "unknown: port 'w': cannot evaluate C/0 downto 0: arithmetic overflow or division by "
        "zero in 'C/0'"},
   };
   for (const Case& c : cases) {
     SCOPED_TRACE(c.label);
-    vhdl_test::Read d = read(c.files, "e", c.overrides);
+    const vhdl_test::Read d = read({{"work", c.text}}, "e", c.overrides);
     ASSERT_TRUE(d.found);
     const ScanPort* p = portNamed(d.unit, c.port);
     ASSERT_NE(p, nullptr);
