@@ -112,19 +112,15 @@ std::string withoutComments(const std::string& text) {
   return std::regex_replace(text, comment, "");
 }
 
-// Declares a package of its own (not a package body or instantiation): such files are
-// analysed ahead of every design so designs can use packages from other files.
-bool declaresPackage(const std::string& text) {
-  static const std::regex header(R"((^|[^.\w])package\s+\w+\s+is\s(?!\s*new\b))",
-                                 std::regex::icase);
-  return std::regex_search(withoutComments(text), header);
+// Whether the comment-free `text` has a match of `pattern`, letter case ignored.
+bool declares(const std::string& text, const char* pattern) {
+  return std::regex_search(withoutComments(text), std::regex(pattern, std::regex::icase));
 }
 
-bool declaresEntity(const std::string& text) {
-  static const std::regex header(R"((^|[^.\w])entity\s+(\w+|\\[^\\]+\\)\s+is\b)",
-                                 std::regex::icase);
-  return std::regex_search(withoutComments(text), header);
-}
+// A package of its own (not a package body or instantiation): files that declare one are
+// analysed ahead of every design so designs can use packages from other files.
+const char* const kPackageHeader = R"((^|[^.\w])package\s+\w+\s+is\s(?!\s*new\b))";
+const char* const kEntityHeader = R"((^|[^.\w])entity\s+(\w+|\\[^\\]+\\)\s+is\b)";
 
 // Adds the library names of the library clauses of `text` other than the predefined ones.
 void addNamedLibraries(const std::string& text, std::set<std::string>& libraries) {
@@ -229,7 +225,7 @@ class GhdlDifferential : public ::testing::TestWithParam<Design> {
     for (const std::string& file : fixtureFiles("vhdl", {".vhd", ".vhdl"})) {
       std::string text;
       if (!readFile(file, text)) continue;
-      if (declaresPackage(text)) packageFiles.push_back(file);
+      if (declares(text, kPackageHeader)) packageFiles.push_back(file);
       addNamedLibraries(text, libraries);
     }
     for (const std::string& library : libraries) {
@@ -346,7 +342,7 @@ TEST_P(GhdlDifferential, PortsMatchGhdl) {
   const std::string& file = design.file;
   std::string text;
   ASSERT_TRUE(readFile(file, text)) << file;
-  if (!declaresEntity(text)) GTEST_SKIP() << file << " declares no entity";
+  if (!declares(text, kEntityHeader)) GTEST_SKIP() << file << " declares no entity";
   const std::string workdir = copyOfShared(designName({design, 0}));
   const ToolRun analysis = ghdl({"-a", file}, workdir);
   if (analysis.status != 0)

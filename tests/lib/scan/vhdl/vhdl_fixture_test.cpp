@@ -19,9 +19,6 @@ struct FixtureCase {
   size_t errors = 0;
 };
 
-const vhdl_test::Files kPackageFiles = {
-    {"work", "cfg_pkg.vhd"}, {"mylib", "lib_pkg.vhd"}, {"work", "pkg_user.vhd"}};
-
 // The ports of entity basic in basic.vhd, wherever that file is registered.
 const std::vector<std::string> kBasicPorts = {"clk std_logic 1 12 -",
                                               "RST_n std_logic 1 12 -",
@@ -41,7 +38,7 @@ const FixtureCase kCases[] = {
     {"modes_generics_and_operators", {{"work", "basic.vhd"}}, "BASIC", kBasicPorts},
     {"entity_without_ports", {{"work", "basic.vhd"}}, "empty_ports", {}},
     {"packages_subtypes_attributes_and_functions",
-     kPackageFiles,
+     {{"work", "cfg_pkg.vhd"}, {"mylib", "lib_pkg.vhd"}, {"work", "pkg_user.vhd"}},
      "pkg_user",
      {"w word_t 1 10 15 downto 0",
       "w2 alias_t 2 11 15 downto 0",
