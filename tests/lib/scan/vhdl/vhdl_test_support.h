@@ -1,5 +1,5 @@
-// Reads VHDL for a test the way a run does, from fixture files or texts, and keeps what the
-// tests compare: the selected unit's description, every unit listed and each message.
+// Reads VHDL for a test through the VHDL reader, from fixture files or texts, and keeps what
+// the tests compare: the selected unit's description, every unit listed and each message.
 #pragma once
 
 #include <gtest/gtest.h>
