@@ -6,9 +6,9 @@
 
 #include <cstdint>
 #include <cstdio>
-#include <fstream>
 #include <limits>
 #include <string>
+#include <utility>
 
 #include "scan/common/diagnostics.h"
 #include "scan/common/source_buffer.h"
@@ -133,42 +133,33 @@ TEST(Diagnostics, CountsEverythingButPrintsUpToTheCap) {
             "pinforge: too many messages from the design files; the rest are not shown\n");
 }
 
-TEST(SourceBuffer, MappedFilesEndInASentinelEvenOnPageBoundaries) {
-  std::string path = ::testing::TempDir() + "/page_" + std::to_string(::getpid()) + ".vhd";
-  size_t page = static_cast<size_t>(::sysconf(_SC_PAGESIZE));
-  std::ofstream(path, std::ios::binary) << std::string(page, 'x');
-  std::string error;
-  auto buffer = scan::SourceBuffer::open(path, error);
-  ASSERT_NE(buffer, nullptr) << error;
-  EXPECT_EQ(buffer->text().size(), page);
-  EXPECT_EQ(buffer->begin()[page], '\0');
-  std::remove(path.c_str());
+TEST(SourceBuffer, FilesEndInASentinelEvenOnPageBoundaries) {
+  pinforge_test::ScratchDir dir;
+  const size_t page = static_cast<size_t>(::sysconf(_SC_PAGESIZE));
+  for (const size_t size : {size_t{0}, page}) {
+    ASSERT_TRUE(dir.write("f.vhd", std::string(size, 'x')));
+    std::string error;
+    auto buffer = scan::SourceBuffer::open(dir.file("f.vhd"), error);
+    ASSERT_NE(buffer, nullptr) << error;
+    EXPECT_EQ(buffer->text().size(), size);
+    EXPECT_EQ(buffer->begin()[size], '\0');
+  }
 }
 
-TEST(SourceBuffer, ReportsWhyAFileCannotBeRead) {
-  std::string error;
-  EXPECT_EQ(scan::SourceBuffer::open("/nonexistent/x.vhd", error), nullptr);
-  EXPECT_EQ(error, "No such file or directory");
-  EXPECT_EQ(scan::SourceBuffer::open(::testing::TempDir(), error), nullptr);
-  EXPECT_EQ(error, "is a directory");
-  std::string emptyPath = ::testing::TempDir() + "/empty_" + std::to_string(::getpid()) + ".vhd";
-  std::ofstream(emptyPath).close();
-  auto empty = scan::SourceBuffer::open(emptyPath, error);
-  ASSERT_NE(empty, nullptr);
-  EXPECT_EQ(empty->text().size(), 0u);
-  EXPECT_EQ(empty->begin()[0], '\0');
-  std::remove(emptyPath.c_str());
-}
-
-TEST(SourceBuffer, RefusesFifosAndDevicesWithoutBlocking) {
-  std::string fifo = ::testing::TempDir() + "/fifo_" + std::to_string(::getpid()) + ".v";
-  ASSERT_EQ(::mkfifo(fifo.c_str(), 0600), 0);
-  for (const std::string& path : {fifo, std::string("/dev/zero"), std::string("/dev/null")}) {
+TEST(SourceBuffer, SaysWhyAFileCannotBeReadWithoutBlocking) {
+  pinforge_test::ScratchDir dir;
+  ASSERT_EQ(::mkfifo(dir.file("fifo").c_str(), 0600), 0);
+  const std::pair<std::string, const char*> cases[] = {
+      {"/nonexistent/x.vhd", "No such file or directory"},
+      {dir.path(), "is a directory"},
+      {dir.file("fifo"), "not a regular file"},
+      {"/dev/zero", "not a regular file"},
+      {"/dev/null", "not a regular file"}};
+  for (const auto& [path, reason] : cases) {
     std::string error;
     EXPECT_EQ(scan::SourceBuffer::open(path, error), nullptr) << path;
-    EXPECT_EQ(error, "not a regular file") << path;
+    EXPECT_EQ(error, reason) << path;
   }
-  std::remove(fifo.c_str());
 }
 
 }  // namespace

@@ -3,6 +3,7 @@
 // and the listing of every unit read.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <string>
 #include <vector>
 
@@ -10,33 +11,10 @@
 
 namespace {
 
-using vhdl_test::describe;
-using vhdl_test::Described;
 using vhdl_test::Overrides;
+using vhdl_test::rangeOf;
+using vhdl_test::read;
 using Kind = ScanPort::Kind;
-
-// The fixture files, read as a run reads them.
-Described describeFixtures(const std::vector<std::string>& files, const char* unit,
-                           const Overrides& overrides = {}) {
-  std::vector<std::string> texts;
-  for (const std::string& file : files) {
-    std::string error;
-    std::unique_ptr<scan::SourceBuffer> source =
-        scan::SourceBuffer::open(vhdl_test::fixture(file), error);
-    texts.push_back(source ? std::string(source->text()) : "");
-  }
-  return describe(texts, unit, overrides);
-}
-
-// "left dir right", "unknown: problem" or "-".
-std::string rangeOf(const ScanPort& port) {
-  if (port.rangeUnknown()) return "unknown: " + port.rangeProblem();
-  if (!port.hasRange()) return "-";
-  int32_t left = 0;
-  int32_t right = 0;
-  port.getBounds(left, right);
-  return std::to_string(left) + (port.isAscending() ? " to " : " downto ") + std::to_string(right);
-}
 
 const ScanPort* portNamed(const scan::UnitDescription& unit, const std::string& name) {
   for (const ScanPort& p : unit.ports)
@@ -50,58 +28,45 @@ const ScanGeneric* genericNamed(const scan::UnitDescription& unit, const std::st
   return nullptr;
 }
 
-const std::vector<std::string> kTopFiles = {"describe_pkg.vhd", "describe_top.vhd"};
+const vhdl_test::Files kTopFiles = {{"work", "describe_pkg.vhd"}, {"work", "describe_top.vhd"}};
 
-struct GenericRow {
-  const char* name;
-  ScanGeneric::Kind kind;
-  const char* type;
-  const char* defaultText;
-  const char* value;  ///< null when there is none
-  int line;
-};
-
-void expectGenerics(const std::vector<ScanGeneric>& actual, const std::vector<GenericRow>& rows) {
-  ASSERT_EQ(actual.size(), rows.size());
-  for (size_t i = 0; i < rows.size(); ++i) {
-    SCOPED_TRACE(rows[i].name);
-    EXPECT_EQ(actual[i].name, rows[i].name);
-    EXPECT_EQ(actual[i].kind, rows[i].kind);
-    EXPECT_EQ(actual[i].typeText, rows[i].type);
-    EXPECT_EQ(actual[i].defaultText, rows[i].defaultText);
-    EXPECT_EQ(actual[i].value.value_or("<none>"), rows[i].value ? rows[i].value : "<none>");
-    EXPECT_EQ(actual[i].sourceLine, rows[i].line);
-  }
+// "name | kind | type | default | value | line" per generic; "-" for no value.
+std::vector<std::string> genericsOf(const vhdl_test::Read& d) {
+  static const char* const kKinds[] = {"constant", "type", "package", "subprogram"};
+  std::vector<std::string> out;
+  for (const ScanGeneric& g : d.unit.generics)
+    out.push_back(g.name + " | " + kKinds[static_cast<int>(g.kind)] + " | " + g.typeText + " | " +
+                  g.defaultText + " | " + g.value.value_or("-") + " | " +
+                  std::to_string(g.sourceLine));
+  return out;
 }
 
 TEST(VhdlDescription, GenericsOfEveryLiteralKindInDeclarationOrder) {
-  using K = ScanGeneric::Kind;
-  Described d = describeFixtures(kTopFiles, "describe_top");
+  vhdl_test::Read d = read(kTopFiles, "describe_top");
   ASSERT_TRUE(d.found);
-  expectGenerics(d.unit.generics,
-                 {{"XLEN", K::Constant, "positive", "32", "32", 10},
-                  {"HALF", K::Constant, "natural", "16", "16", 11},
-                  {"NAME", K::Constant, "string", "\"ab\"\"c\"", "\"ab\"\"c\"", 12},
-                  {"RATIO", K::Constant, "real", "3.5", "3.5", 13},
-                  {"SCALE", K::Constant, "real", "2.0e3", "2000.0", 14},
-                  {"ENABLE", K::Constant, "boolean", "true", "true", 15},
-                  {"INIT", K::Constant, "std_ulogic", "'1'", "'1'", 16},
-                  {"MODE", K::Constant, "state_t", "RUN", "RUN", 17},
-                  {"LEVEL", K::Constant, "level_t", "5", "5", 18},
-                  {"VREF", K::Constant, "volts_t", "1.5", "1.5", 19},
-                  {"MASK", K::Constant, "std_logic_vector(3 downto 0)", "\"1010\"", nullptr, 20}});
+  EXPECT_EQ(
+      genericsOf(d),
+      (std::vector<std::string>{
+          "XLEN | constant | positive | 32 | 32 | 10", "HALF | constant | natural | 16 | 16 | 11",
+          "NAME | constant | string | \"ab\"\"c\" | \"ab\"\"c\" | 12",
+          "RATIO | constant | real | 3.5 | 3.5 | 13",
+          "SCALE | constant | real | 2.0e3 | 2000.0 | 14",
+          "ENABLE | constant | boolean | true | true | 15",
+          "INIT | constant | std_ulogic | '1' | '1' | 16",
+          "MODE | constant | state_t | RUN | RUN | 17", "LEVEL | constant | level_t | 5 | 5 | 18",
+          "VREF | constant | volts_t | 1.5 | 1.5 | 19",
+          "MASK | constant | std_logic_vector(3 downto 0) | \"1010\" | - | 20"}));
 }
 
 TEST(VhdlDescription, Vhdl2008GenericTypesSubprogramsAndPackages) {
-  using K = ScanGeneric::Kind;
-  Described d = describeFixtures({"describe_2008.vhd"}, "describe_2008");
+  vhdl_test::Read d = read({{"work", "describe_2008.vhd"}}, "describe_2008");
   ASSERT_TRUE(d.found);
-  expectGenerics(
-      d.unit.generics,
-      {{"data_t", K::Type, "", "", nullptr, 7},
-       {"combine", K::Subprogram, "function combine (a, b : data_t) return data_t", "", nullptr, 8},
-       {"fixed", K::Package, "new ieee.fixed_generic_pkg generic map (<>)", "", nullptr, 9},
-       {"WIDTH", K::Constant, "natural", "8", "8", 10}});
+  EXPECT_EQ(genericsOf(d),
+            (std::vector<std::string>{
+                "data_t | type |  |  | - | 7",
+                "combine | subprogram | function combine (a, b : data_t) return data_t |  | - | 8",
+                "fixed | package | new ieee.fixed_generic_pkg generic map (<>) |  | - | 9",
+                "WIDTH | constant | natural | 8 | 8 | 10"}));
   EXPECT_EQ(d.unit.context, "library ieee;\ncontext ieee.ieee_std_context;");
   ASSERT_EQ(d.unit.ports.size(), 2u);
   EXPECT_EQ(d.unit.ports[0].declaredType(), "data_t");
@@ -110,39 +75,26 @@ TEST(VhdlDescription, Vhdl2008GenericTypesSubprogramsAndPackages) {
 }
 
 TEST(VhdlDescription, DeclaredTypesAndKindsOfPorts) {
-  struct Row {
-    const char* name;
-    const char* type;
-    Kind kind;
-    const char* range;
-  };
-  const Row rows[] = {
-      {"clk", "std_ulogic", Kind::Bit, "-"},
-      {"rst_n", "std_logic", Kind::Bit, "-"},
-      {"data", "std_ulogic_vector(XLEN-1 downto 0)", Kind::BitVector, "31 downto 0"},
-      {"wide", "std_ulogic_vector( XLEN - 1 downto 0)", Kind::BitVector, "31 downto 0"},
-      {"lower", "unsigned(HALF - 1 downto 0)", Kind::BitVector, "15 downto 0"},
-      {"trace", "trace_port_t", Kind::Record, "-"},
-      {"traces", "trace_array_t(0 to 1)", Kind::Array, "0 to 1"},
-      {"state", "state_t", Kind::Enum, "-"},
-      {"count", "integer range 0 to 15", Kind::Integer, "0 to 15"},
-      {"lvl", "level_t", Kind::Integer, "-"},
-      {"word", "word_t", Kind::BitVector, "15 downto 0"},
-      {"nib", "nibble_t", Kind::BitVector, "3 downto 0"},
-      {"sbit", "my_bit_t", Kind::Bit, "-"},
-      {"flag", "boolean", Kind::Enum, "-"},
-      {"bus_d", "std_logic_vector(BUS_W-1 downto 0)", Kind::BitVector, "11 downto 0"},
-  };
-  Described d = describeFixtures(kTopFiles, "describe_top");
-  ASSERT_EQ(d.unit.ports.size(), std::size(rows));
-  for (size_t i = 0; i < std::size(rows); ++i) {
-    const ScanPort& p = d.unit.ports[i];
-    SCOPED_TRACE(rows[i].name);
-    EXPECT_STREQ(p.name(), rows[i].name);
-    EXPECT_EQ(p.declaredType(), rows[i].type);
-    EXPECT_EQ(p.kind(), rows[i].kind);
-    EXPECT_EQ(rangeOf(p), rows[i].range);
-  }
+  static const char* const kKinds[] = {"Bit",   "BitVector", "Integer",   "Record",
+                                       "Array", "Enum",      "Interface", "Other"};
+  const vhdl_test::Read d = read(kTopFiles, "describe_top");
+  std::vector<std::string> ports;
+  for (const ScanPort& p : d.unit.ports)
+    ports.push_back(p.name() + (" | " + p.declaredType()) + " | " +
+                    kKinds[static_cast<int>(p.kind())] + " | " + rangeOf(p));
+  EXPECT_EQ(
+      ports,
+      (std::vector<std::string>{
+          "clk | std_ulogic | Bit | -", "rst_n | std_logic | Bit | -",
+          "data | std_ulogic_vector(XLEN-1 downto 0) | BitVector | 31 downto 0",
+          "wide | std_ulogic_vector( XLEN - 1 downto 0) | BitVector | 31 downto 0",
+          "lower | unsigned(HALF - 1 downto 0) | BitVector | 15 downto 0",
+          "trace | trace_port_t | Record | -", "traces | trace_array_t(0 to 1) | Array | 0 to 1",
+          "state | state_t | Enum | -", "count | integer range 0 to 15 | Integer | 0 to 15",
+          "lvl | level_t | Integer | -", "word | word_t | BitVector | 15 downto 0",
+          "nib | nibble_t | BitVector | 3 downto 0", "sbit | my_bit_t | Bit | -",
+          "flag | boolean | Enum | -",
+          "bus_d | std_logic_vector(BUS_W-1 downto 0) | BitVector | 11 downto 0"}));
   EXPECT_EQ(d.unit.context,
             "library ieee;\nuse ieee.std_logic_1164.all;\nuse ieee.numeric_std.all;\n"
             "library work;\nuse work.describe_pkg.all;");
@@ -153,25 +105,21 @@ TEST(VhdlDescription, OverridesChangeValuesAndEveryWidthUsingThem) {
     const char* label;
     const char* unit;
     Overrides overrides;
-    std::vector<std::pair<const char*, const char*>> values;  ///< generic, value
-    std::vector<std::pair<const char*, const char*>> ranges;  ///< port, range
+    std::vector<std::string> expected;  ///< "GENERIC=value" or "port: range"
   };
   const Case cases[] = {
       {"integer",
        "describe_top",
        {{"XLEN", "64"}},
-       {{"XLEN", "64"}},
-       {{"data", "63 downto 0"}, {"wide", "63 downto 0"}}},
+       {"XLEN=64", "data: 63 downto 0", "wide: 63 downto 0"}},
       {"names_ignore_case_and_values_are_expressions",
        "describe_top",
        {{"xlen", "BUS_W * 2"}, {"half", "4"}},
-       {{"XLEN", "24"}, {"HALF", "4"}},
-       {{"data", "23 downto 0"}, {"lower", "3 downto 0"}}},
+       {"XLEN=24", "HALF=4", "data: 23 downto 0", "lower: 3 downto 0"}},
       {"last_one_wins",
        "describe_top",
        {{"XLEN", "8"}, {"XLEN", "9"}},
-       {{"XLEN", "9"}},
-       {{"data", "8 downto 0"}}},
+       {"XLEN=9", "data: 8 downto 0"}},
       {"other_literal_kinds",
        "describe_top",
        {{"NAME", "\"xyz\""},
@@ -179,37 +127,34 @@ TEST(VhdlDescription, OverridesChangeValuesAndEveryWidthUsingThem) {
         {"ENABLE", "false"},
         {"INIT", "'0'"},
         {"RATIO", "1.25"}},
-       {{"NAME", "\"xyz\""},
-        {"MODE", "DONE"},
-        {"ENABLE", "false"},
-        {"INIT", "'0'"},
-        {"RATIO", "1.25"}},
-       {}},
+       {"NAME=\"xyz\"", "MODE=DONE", "ENABLE=false", "INIT='0'", "RATIO=1.25"}},
       {"generic_without_default",
        "describe_open",
        {{"WIDTH", "3"}},
-       {{"WIDTH", "3"}},
-       {{"d", "2 downto 0"}, {"q", "6 downto 0"}}},
+       {"WIDTH=3", "d: 2 downto 0", "q: 6 downto 0"}},
   };
   for (const Case& c : cases) {
     SCOPED_TRACE(c.label);
-    Described d = describeFixtures(kTopFiles, c.unit, c.overrides);
+    const vhdl_test::Read d = read(kTopFiles, c.unit, c.overrides);
     ASSERT_TRUE(d.found);
-    for (const auto& [name, value] : c.values) {
-      const ScanGeneric* g = genericNamed(d.unit, name);
-      ASSERT_NE(g, nullptr) << name;
-      EXPECT_EQ(g->value.value_or("<none>"), value) << name;
+    std::vector<std::string> actual;
+    for (const std::string& expected : c.expected) {
+      const size_t colon = expected.find(": ");
+      const std::string name = expected.substr(0, std::min(colon, expected.find('=')));
+      if (colon != std::string::npos) {
+        const ScanPort* p = portNamed(d.unit, name);
+        actual.push_back(name + ": " + (p ? rangeOf(*p) : "missing"));
+      } else {
+        const ScanGeneric* g = genericNamed(d.unit, name);
+        actual.push_back(name + "=" + (g ? g->value.value_or("<none>") : "missing"));
+      }
     }
-    for (const auto& [name, range] : c.ranges) {
-      const ScanPort* p = portNamed(d.unit, name);
-      ASSERT_NE(p, nullptr) << name;
-      EXPECT_EQ(rangeOf(*p), range) << name;
-    }
+    EXPECT_EQ(actual, c.expected);
   }
 }
 
 TEST(VhdlDescription, UnevaluableRangesAreUnknownWithTheFix) {
-  const char* kEntity =
+  const std::string kEntity =
       "library ieee; use ieee.std_logic_1164.all;\n"
       "entity e is generic (WIDTH : natural; N : natural := 2);\n"
       "  port (d : in std_logic_vector(WIDTH-1 downto 0); u : in std_logic_vector;\n"
@@ -217,76 +162,63 @@ TEST(VhdlDescription, UnevaluableRangesAreUnknownWithTheFix) {
       "end;\n";
   struct Case {
     const char* label;
-    std::vector<std::string> texts;
-    Overrides overrides;
+    std::string text;
     const char* port;
     const char* range;
+    Overrides overrides = {};
   };
   const Case cases[] = {
-      {"generic_without_default",
-       {kEntity},
-       {},
-       "d",
+      {"generic_without_default", kEntity, "d",
        "unknown: port 'd': cannot evaluate WIDTH-1 downto 0: generic 'WIDTH' has no value; "
        "give one with -g WIDTH=VALUE"},
-      {"unconstrained_and_scalar_ports_are_not_unknown", {kEntity}, {}, "u", "-"},
+      {"unconstrained_and_scalar_ports_are_not_unknown", kEntity, "u", "-"},
       {"bad_override_never_falls_back_to_the_default",
-       {kEntity},
-       {{"WIDTH", "nope"}},
+       kEntity,
        "d",
        "unknown: port 'd': cannot evaluate WIDTH-1 downto 0: -g WIDTH=nope cannot be "
-       "evaluated: 'nope' is not declared"},
+       "evaluated: 'nope' is not declared",
+       {{"WIDTH", "nope"}}},
       {"text_after_the_value",
-       {kEntity},
-       {{"WIDTH", "3 4"}},
+       kEntity,
        "d",
        "unknown: port 'd': cannot evaluate WIDTH-1 downto 0: -g WIDTH=3 4 cannot be "
-       "evaluated: unexpected '4' after the value"},
+       "evaluated: unexpected '4' after the value",
+       {{"WIDTH", "3 4"}}},
       {"missing_package_of_a_use_clause",
-       {"use work.absent_pkg.all;\n"
-        "entity e is port (d : in bit_vector(C_W - 1 downto 0)); end;\n"},
-       {},
+       "use work.absent_pkg.all;\n"
+       "entity e is port (d : in bit_vector(C_W - 1 downto 0)); end;\n",
        "d",
        "unknown: port 'd': cannot evaluate C_W - 1 downto 0: package 'absent_pkg' is not in "
        "any design file; add the file that declares it"},
       {"missing_package_of_a_selected_name",
-       {"entity e is port (d : in bit_vector(other_pkg.W downto 0)); end;\n"},
-       {},
-       "d",
+       "entity e is port (d : in bit_vector(other_pkg.W downto 0)); end;\n", "d",
        "unknown: port 'd': cannot evaluate other_pkg.W downto 0: package 'other_pkg' is not "
        "in any design file; add the file that declares it"},
       {"type_of_a_missing_package",
-       {"library mylib; use mylib.types_pkg.all;\n"
-        "entity e is port (t : in bus_t); end;\n"},
-       {},
+       "library mylib; use mylib.types_pkg.all;\n"
+       "entity e is port (t : in bus_t); end;\n",
        "t",
        "unknown: port 't': type 'bus_t' is not declared: package 'types_pkg' is not in any "
        "design file; add the file that declares it"},
-      {"undeclared_type",
-       {"entity e is port (t : in bus_t); end;\n"},
-       {},
-       "t",
+      {"undeclared_type", "entity e is port (t : in bus_t); end;\n", "t",
        "unknown: port 't': type 'bus_t' is not declared: add the design file of the package "
        "that declares it"},
       {"unsupported_construct_keeps_the_reason",
-       {"entity e is generic (S : string := \"ab\");\n"
-        "  port (d : in bit_vector(S'foo downto 0)); end;\n"},
-       {},
+       "entity e is generic (S : string := \"ab\");\n"
+       "  port (d : in bit_vector(S'foo downto 0)); end;\n",
        "d",
        "unknown: port 'd': cannot evaluate S'foo downto 0: attribute 'S'foo' is not supported "
        "in bounds"},
       {"range_of_a_package_subtype",
-       {"package p is constant C : natural := 8; subtype w_t is bit_vector(C/0 downto 0);\n"
-        "end;\n",
-        "use work.p.all; entity e is port (w : in w_t); end;\n"},
-       {},
+       "package p is constant C : natural := 8; subtype w_t is bit_vector(C/0 downto 0);\n"
+       "end;\nuse work.p.all; entity e is port (w : in w_t); end;\n",
        "w",
        "unknown: port 'w': cannot evaluate C/0 downto 0: arithmetic overflow or division by "
        "zero in 'C/0'"},
   };
   for (const Case& c : cases) {
     SCOPED_TRACE(c.label);
-    Described d = describe(c.texts, "e", c.overrides);
+    const vhdl_test::Read d = read({{"work", c.text}}, "e", c.overrides);
     ASSERT_TRUE(d.found);
     const ScanPort* p = portNamed(d.unit, c.port);
     ASSERT_NE(p, nullptr);
@@ -314,32 +246,32 @@ TEST(VhdlDescription, OverrideMistakesAreErrors) {
   };
   for (const Case& c : cases) {
     SCOPED_TRACE(c.message);
-    Described d = describe({kEntity}, "e", c.overrides);
+    vhdl_test::Read d = read({{"work", kEntity}}, "e", c.overrides);
     EXPECT_NE(d.messages.find(c.message), std::string::npos) << d.messages;
   }
-  EXPECT_EQ(describe({kEntity}, "e", {{"WIDTH", "2"}, {"OTHER", "1"}}).messages, "");
+  EXPECT_EQ(read({{"work", kEntity}}, "e", {{"WIDTH", "2"}, {"OTHER", "1"}}).messages, "");
 }
 
 TEST(VhdlDescription, InterfaceTextsAsWrittenWithBlanksNormalised) {
-  Described d = describe(
-      {"entity e is\n"
-       "  generic (constant A, B : integer\n"
-       "             range 0 to 7 := 3 + -- two\n"
-       "             4;\n"
-       "           function \"+\" (l, r : bit) return bit is <>;\n"
-       "           pure function f return natural is g);\n"
-       "  port (signal x, y : inout (resolved) std_ulogic_vector(1 downto 0) bus := \"00\";\n"
-       "        z : resolved std_ulogic; \\Odd  Name\\ : out bit;\n"
-       "        t : in bit"},  // cut off before its ';': never a port
-      "e");
+  vhdl_test::Read d =
+      read({{"work",
+             "entity e is\n"
+             "  generic (constant A, B : integer\n"
+             "             range 0 to 7 := 3 + -- two\n"
+             "             4;\n"
+             "           function \"+\" (l, r : bit) return bit is <>;\n"
+             "           pure function f return natural is g);\n"
+             "  port (signal x, y : inout (resolved) std_ulogic_vector(1 downto 0) bus := \"00\";\n"
+             "        z : resolved std_ulogic; \\Odd  Name\\ : out bit;\n"
+             "        t : in bit"}},  // cut off before its ';': never a port
+           "e");
   ASSERT_TRUE(d.found);
-  using K = ScanGeneric::Kind;
-  expectGenerics(
-      d.unit.generics,
-      {{"A", K::Constant, "integer range 0 to 7", "3 + 4", "7", 2},
-       {"B", K::Constant, "integer range 0 to 7", "3 + 4", "7", 2},
-       {"\"+\"", K::Subprogram, "function \"+\" (l, r : bit) return bit", "<>", nullptr, 5},
-       {"f", K::Subprogram, "pure function f return natural", "g", nullptr, 6}});
+  EXPECT_EQ(genericsOf(d),
+            (std::vector<std::string>{
+                "A | constant | integer range 0 to 7 | 3 + 4 | 7 | 2",
+                "B | constant | integer range 0 to 7 | 3 + 4 | 7 | 2",
+                "\"+\" | subprogram | function \"+\" (l, r : bit) return bit | <> | - | 5",
+                "f | subprogram | pure function f return natural | g | - | 6"}));
   std::vector<std::string> types;
   for (const ScanPort& p : d.unit.ports) types.push_back(p.name() + (": " + p.declaredType()));
   EXPECT_EQ(types, (std::vector<std::string>{"x: (resolved) std_ulogic_vector(1 downto 0)",
@@ -376,22 +308,23 @@ TEST(VhdlDescription, ContextClauseOfTheUnitOnly) {
   };
   for (const Case& c : cases) {
     SCOPED_TRACE(c.label);
-    Described d = describe({c.text}, "e");
+    vhdl_test::Read d = read({{"work", c.text}}, "e");
     ASSERT_TRUE(d.found);
     EXPECT_EQ(d.unit.context, c.context);
   }
 }
 
 TEST(VhdlDescription, ListsEveryUnitInFileOrder) {
-  Described d = describe({"context Ctx is library ieee; end context;\n"
-                          "package Pkg is end package;\n"
-                          "package body Pkg is end package body;\n"
-                          "package Inst is new work.gen generic map (N => 1);\n"
-                          "entity Top is end;\n"
-                          "architecture RTL of Top is begin end;\n"
-                          "configuration Cfg of Top is for RTL end for; end;\n",
-                          "entity top is end;\n"},
-                         "top");
+  vhdl_test::Read d = read({{"work",
+                             "context Ctx is library ieee; end context;\n"
+                             "package Pkg is end package;\n"
+                             "package body Pkg is end package body;\n"
+                             "package Inst is new work.gen generic map (N => 1);\n"
+                             "entity Top is end;\n"
+                             "architecture RTL of Top is begin end;\n"
+                             "configuration Cfg of Top is for RTL end for; end;\n"},
+                            {"work", "entity top is end;\n"}},
+                           "top");
   std::vector<std::string> lines;
   for (const ScanUnitInfo& u : d.units)
     lines.push_back(u.library + " " + u.kind + " " + u.name + " " + u.file + ":" +

@@ -5,80 +5,35 @@
 #include <string>
 #include <vector>
 
-#include "scan/vhdl/vhdl_lexer.h"
 #include "vhdl_test_support.h"
 
 namespace {
 
-struct File {
-  const char* library;
-  const char* text;
-};
-
-// "name(left dir right)" or "name" per port, joined by blanks; "?" when the unit is missing.
-std::string portsOf(const std::vector<File>& files, const char* unit) {
-  std::vector<std::string> texts;
-  std::vector<std::string> libraries;
-  for (const File& file : files) {
-    texts.push_back(file.text);
-    libraries.push_back(file.library);
-  }
-  vhdl_test::Described d = vhdl_test::describe(texts, unit, {}, libraries);
-  if (!d.found) return "?";
-  std::string out;
-  for (const ScanPort& p : d.unit.ports) {
-    if (!out.empty()) out += ' ';
-    out += p.name();
-    if (!p.hasRange()) continue;
-    int32_t left = 0;
-    int32_t right = 0;
-    p.getBounds(left, right);
-    out += "(" + std::to_string(left) + (p.isAscending() ? " to " : " downto ") +
-           std::to_string(right) + ")";
-  }
-  return out;
-}
-
 const char* kPkg =
-    "package pkg is\n"
-    "  constant W : natural := 8;\n"
-    "  constant DEFERRED : natural;\n"
-    "  function f(a : integer) return integer;\n"
-    "  function f(a, b : integer) return integer;\n"
+    "package pkg is constant W : natural := 8; constant DEFERRED : natural;\n"
+    "  function f(a : integer) return integer; function f(a, b : integer) return integer;\n"
     "  function g(a : integer; b : integer := 100) return integer;\n"
-    "  procedure p(x : inout integer);\n"
-    "  type prot is protected\n"
-    "    procedure inc;\n"
+    "  procedure p(x : inout integer); type prot is protected procedure inc;\n"
     "  end protected prot;\n"
     "end package;\n"
-    "package body pkg is\n"
-    "  constant DEFERRED : natural := W * 2;\n"
-    "  function helper(n : natural) return natural is\n"
-    "  begin\n"
-    "    return n + 1;\n"
-    "  end function;\n"
+    "package body pkg is constant DEFERRED : natural := W * 2;\n"
+    "  function helper(n : natural) return natural is begin return n + 1; end function;\n"
     "  function f(a : integer) return integer is begin return helper(a); end;\n"
     "  function f(a, b : integer) return integer is begin return a - b; end function f;\n"
     "  function g(a : integer; b : integer := 100) return integer is\n"
-    "    constant K : integer := 2;\n"
-    "    variable acc : integer;\n"
-    "  begin\n"
-    "    acc := 0;\n"
-    "    for i in a downto 1 loop acc := acc + K; end loop;\n"
-    "    return acc + b;\n"
-    "  end;\n"
+    "    constant K : integer := 2; variable acc : integer;\n"
+    "  begin acc := 0; for i in a downto 1 loop acc := acc + K; end loop; return acc + b; end;\n"
     "  procedure p(x : inout integer) is begin if x > 0 then x := x - 1; end if; end procedure;\n"
-    "  type prot is protected body\n"
-    "    variable n : integer := 0;\n"
+    "  type prot is protected body variable n : integer := 0;\n"
     "    procedure inc is begin n := n + 1; end procedure;\n"
     "  end protected body prot;\n"
     "end package body;\n";
 
 struct SemanticsCase {
   const char* label;
-  std::vector<File> files;
+  vhdl_test::Files files;
   const char* unit;
-  const char* ports;
+  const char* ports;  ///< "name(range)" or "name" per port
 };
 
 const SemanticsCase kCases[] = {
@@ -245,45 +200,9 @@ const SemanticsCase kCases[] = {
 class Semantics : public testing::TestWithParam<SemanticsCase> {};
 
 TEST_P(Semantics, PortsFollowTheRules) {
-  EXPECT_EQ(portsOf(GetParam().files, GetParam().unit), GetParam().ports);
+  EXPECT_EQ(vhdl_test::read(GetParam().files, GetParam().unit).ranges(), GetParam().ports);
 }
 
-INSTANTIATE_TEST_SUITE_P(Vhdl, Semantics, testing::ValuesIn(kCases),
-                         [](const testing::TestParamInfo<SemanticsCase>& info) {
-                           return std::string(info.param.label);
-                         });
-
-struct StartCase {
-  const char* text;
-  const char* words;  ///< what the index pass's fast path stops at
-};
-
-const StartCase kStartCases[] = {
-    {"entity e is port (a : in bit); end;", "entity end"},
-    {"a; -- b;\n c; /* d; */ e", "a c e"},
-    {"x <= \"; y\"; z", "x z"},
-    {"x := '; '; y", "x y"},
-    {"f(a)';' b; c", "f c"},
-    {"when ';' => q; r", "when r"},
-    {"x := 8UX\";\"; y", "x y"},
-    {"\\ext\\; \\two words\\ is", "\\ext\\ \\two words\\"},
-    {"ENDING; End; a.end", "ENDING End a end"},
-};
-
-class StatementStarts : public testing::TestWithParam<StartCase> {};
-
-TEST_P(StatementStarts, AreFoundByTheFastPath) {
-  std::string text = GetParam().text;
-  scan::vhdl::Lexer lexer(text);
-  std::string words;
-  for (scan::vhdl::Token t = lexer.nextAtStatementStart(); t.kind != scan::vhdl::TokenKind::End;
-       t = lexer.nextAtStatementStart()) {
-    if (!words.empty()) words += ' ';
-    words += std::string(t.text);
-  }
-  EXPECT_EQ(words, GetParam().words);
-}
-
-INSTANTIATE_TEST_SUITE_P(Vhdl, StatementStarts, testing::ValuesIn(kStartCases));
+INSTANTIATE_TEST_SUITE_P(Vhdl, Semantics, testing::ValuesIn(kCases), vhdl_test::ByLabel());
 
 }  // namespace

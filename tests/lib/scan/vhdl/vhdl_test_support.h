@@ -1,5 +1,5 @@
-// Runs the extractor over fixture files and flattens the reported ports for comparison, or
-// the VHDL reader over in-memory texts for the description of one unit.
+// Reads VHDL for a test through the VHDL reader, from fixture files or texts, and keeps what
+// the tests compare: the selected unit's description, every unit listed and each message.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -18,87 +18,37 @@
 
 namespace vhdl_test {
 
-/// tests/fixtures/vhdl/<name>, from the source tree.
-inline std::string fixture(const std::string& name) {
-  const char* root = std::getenv("PINFORGE_SOURCE_DIR");
-  std::string here = __FILE__;
-  std::string base =
-      root ? std::string(root) + "/tests" : here.substr(0, here.rfind("/tests/") + 6);
-  return base + "/fixtures/vhdl/" + name;
-}
-
-struct Port {
-  std::string name;
-  std::string type;
-  int direction = 0;
-  int line = 0;
-  bool hasRange = false;
-  int32_t left = 0;
-  int32_t right = 0;
-  bool ascending = false;
-
-  bool operator==(const Port& o) const {
-    return name == o.name && type == o.type && direction == o.direction && line == o.line &&
-           hasRange == o.hasRange &&
-           (!hasRange || (left == o.left && right == o.right && ascending == o.ascending));
-  }
-};
-
-inline std::ostream& operator<<(std::ostream& os, const Port& p) {
-  os << p.name << " : " << p.type << " dir " << p.direction << " line " << p.line;
-  if (p.hasRange) os << " (" << p.left << (p.ascending ? " to " : " downto ") << p.right << ")";
-  return os;
-}
-
-struct Run {
-  bool found = false;
-  std::vector<Port> ports;
-  std::string messages;  ///< everything written to standard error
-  int errors = 0;
-};
-
-/// Registers `files` (library, fixture name) in order, parses, looks `unit` up in "work"
-/// with search mode 1 and collects its ports.
-inline Run extract(const std::vector<std::pair<std::string, std::string>>& files,
-                   const std::string& unit, bool fixtures = true) {
-  Run run;
-  testing::internal::CaptureStderr();
-  {
-    ScanExtractor extractor;
-    for (const auto& [library, file] : files)
-      extractor.addDesignFile(library.c_str(), (fixtures ? fixture(file) : file).c_str(),
-                              ScanExtractor::Vhdl);
-    run.errors = extractor.Parse(ScanExtractor::Vhdl);
-    run.found =
-        extractor.findDesignUnit("work", unit.c_str(), ScanExtractor::SearchAllLibraries) == 0;
-    ScanPortList* list = extractor.getPorts();
-    for (const ScanPort* p = list->firstPort(); p != nullptr; p = list->nextPort(p)) {
-      Port port{p->name(), p->typeName(), p->direction(), p->sourceLine(), p->hasRange()};
-      if (p->hasRange()) {
-        p->getBounds(port.left, port.right);
-        port.ascending = p->isAscending() != 0;
-      }
-      run.ports.push_back(port);
-    }
-  }
-  run.messages = testing::internal::GetCapturedStderr();
-  return run;
-}
-
-/// A port without a range.
-inline Port scalar(const char* name, const char* type, int direction, int line) {
-  return Port{name, type, direction, line, false};
-}
-
-/// A port with a range.
-inline Port ranged(const char* name, const char* type, int direction, int line, int32_t left,
-                   const char* dir, int32_t right) {
-  return Port{name, type, direction, line, true, left, right, std::string(dir) == "to"};
-}
-
+/// Design files as (library, file).
+using Files = std::vector<std::pair<std::string, std::string>>;
 using Overrides = std::vector<std::pair<std::string, std::string>>;
 
-struct Described {
+/// tests/fixtures/vhdl/<name> in the source tree.
+inline std::string fixture(const std::string& name) {
+  const char* root = std::getenv("PINFORGE_SOURCE_DIR");
+  const std::string here = __FILE__;
+  return (root ? std::string(root) + "/tests" : here.substr(0, here.rfind("/tests/") + 6)) +
+         "/fixtures/vhdl/" + name;
+}
+
+/// Names a row of a parameterised table after its `label`.
+struct ByLabel {
+  template <class Row>
+  std::string operator()(const testing::TestParamInfo<Row>& row) const {
+    return row.param.label;
+  }
+};
+
+/// "left to right", "left downto right", "unknown: why" or "-".
+inline std::string rangeOf(const ScanPort& port) {
+  if (port.rangeUnknown()) return "unknown: " + port.rangeProblem();
+  if (!port.hasRange()) return "-";
+  int32_t left = 0;
+  int32_t right = 0;
+  port.getBounds(left, right);
+  return std::to_string(left) + (port.isAscending() ? " to " : " downto ") + std::to_string(right);
+}
+
+struct Read {
   bool found = false;
   bool headerSound = false;  ///< what readUnit returned
   scan::UnitDescription unit;
@@ -106,24 +56,40 @@ struct Described {
   std::string messages;
   size_t errors = 0;
   size_t warnings = 0;
+
+  /// "name(range)" per port, or "name" for one without a range, joined by blanks.
+  std::string ranges() const {
+    std::string out;
+    for (const ScanPort& p : unit.ports)
+      out += (out.empty() ? "" : " ") + std::string(p.name()) +
+             (p.hasRange() ? "(" + rangeOf(p) + ")" : "");
+    return out;
+  }
 };
 
-/// Reads `texts` (file i is "f<i>.vhd" in library `libraries[i]`, work when not given) and
-/// describes `unit` of work with `overrides` applied.
-inline Described describe(const std::vector<std::string>& texts, const char* unit,
-                          const Overrides& overrides = {},
-                          const std::vector<std::string>& libraries = {}) {
+/// Reads `files` in order; a file ending in ".vhd" is one of tests/fixtures/vhdl, anything
+/// else is the text of a file named "f<i>.vhd". Then selects `unit` in work or else in the
+/// first library that has it, in first-use order, and describes it with `overrides`.
+inline Read read(const Files& files, const std::string& unit, const Overrides& overrides = {}) {
   pinforge_test::FilePtr log(std::tmpfile());
-  Described out;
+  Read out;
   {
     scan::Diagnostics diagnostics(log.get());
     ScanSettings settings;
     settings.genericOverrides = overrides;
     scan::vhdl::VhdlReader reader(diagnostics, settings);
-    for (size_t i = 0; i < texts.size(); ++i)
-      reader.indexSource(scan::SourceBuffer::fromText("f" + std::to_string(i) + ".vhd", texts[i]),
-                         i < libraries.size() ? libraries[i] : std::string("work"));
-    out.found = reader.selectUnit("work", unit);
+    std::vector<std::string> libraries{"work"};
+    for (size_t i = 0; i < files.size(); ++i) {
+      const auto& [library, file] = files[i];
+      if (file.ends_with(".vhd"))
+        reader.indexFiles({{library, fixture(file)}});
+      else
+        reader.indexSource(scan::SourceBuffer::fromText("f" + std::to_string(i) + ".vhd", file),
+                           library);
+      libraries.push_back(library);
+    }
+    for (const std::string& library : libraries)
+      if (!out.found) out.found = reader.selectUnit(library, unit);
     if (out.found) out.headerSound = reader.readUnit(out.unit);
     out.units = reader.listUnits();
     out.errors = diagnostics.errorCount();
