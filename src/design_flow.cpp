@@ -56,8 +56,8 @@ void reportLanguageHint(RunContext& context) {
 /// Looks the module up; when it is missing, says so with the closest names and the language
 /// hint. True when found.
 bool findModule(RunContext& context) {
-  if (context.m_Extractor.findDesignUnit("work", context.m_ModuleName.c_str(),
-                                         ScanExtractor::SearchAllLibraries) == 0)
+  if (context.m_Extractor.selectDesignUnit("work", context.m_ModuleName.c_str(),
+                                           ScanExtractor::SearchAllLibraries))
     return true;
   std::string text = "Declaration (Module ";
   text += context.m_ModuleName.view();

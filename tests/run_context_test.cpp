@@ -174,7 +174,7 @@ std::unique_ptr<StbDataList> unitData(const ScratchDir& dir, const char* file, c
   context.registerDesignFile(dir.file(file).c_str());
   context.m_Extractor.configure(context.m_ScanSettings);
   context.m_Extractor.Parse(context.m_Language);
-  if (context.m_Extractor.findDesignUnit("work", "top", ScanExtractor::SearchAllLibraries) != 0 ||
+  if (!context.m_Extractor.selectDesignUnit("work", "top", ScanExtractor::SearchAllLibraries) ||
       !checkUnitHeader(context) || !prepareRun(context) || !buildPortList(context))
     return nullptr;
   buildUnitData(context);

@@ -62,15 +62,15 @@ TEST_P(LibrarySearch, FindsTheRightUnit) {
   for (const auto& [library, file] : c.files)
     extractor.addDesignFile(library, fixture(file).c_str(), ScanExtractor::Vhdl);
   extractor.Parse(ScanExtractor::Vhdl);
-  int result = extractor.findDesignUnit(c.library, "TWIN", c.search);
+  const bool found = extractor.selectDesignUnit(c.library, "TWIN", c.search);
   ScanPortList* ports = extractor.getPorts();
   ASSERT_NE(ports, nullptr);
   if (c.firstPort == nullptr) {
-    EXPECT_NE(result, 0);
+    EXPECT_FALSE(found);
     EXPECT_EQ(ports->firstPort(), nullptr);
     return;
   }
-  ASSERT_EQ(result, 0);
+  ASSERT_TRUE(found);
   ASSERT_NE(ports->firstPort(), nullptr);
   EXPECT_STREQ(ports->firstPort()->name(), c.firstPort);
   EXPECT_EQ(ports->nextPort(ports->firstPort()), nullptr);
@@ -94,7 +94,7 @@ TEST(Extractor, RegistersLibrariesInFirstUseOrder) {
 TEST(Extractor, GetPortsBeforeAnyLookupIsEmpty) {
   ScanExtractor extractor;
   EXPECT_EQ(extractor.getPorts()->size(), 0u);
-  EXPECT_NE(extractor.findDesignUnit("work", "x", ScanExtractor::SearchAllLibraries), 0);
+  EXPECT_FALSE(extractor.selectDesignUnit("work", "x", ScanExtractor::SearchAllLibraries));
 }
 
 }  // namespace

@@ -643,8 +643,8 @@ TEST_P(GhdlDifferential, PortsMatchGhdl) {
       continue;
     }
     ++compared;
-    if (extractor.findDesignUnit("work", entity.name.c_str(), ScanExtractor::SearchAllLibraries) !=
-        0) {
+    if (!extractor.selectDesignUnit("work", entity.name.c_str(),
+                                    ScanExtractor::SearchAllLibraries)) {
       ADD_FAILURE() << file << ": entity " << entity.name << " (line " << entity.line
                     << "): not found by ours";
       continue;

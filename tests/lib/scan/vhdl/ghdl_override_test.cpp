@@ -45,8 +45,7 @@ std::vector<std::string> ourBounds(const Case& c) {
     extractor.addDesignFile("work", vhdl_test::fixture(file).c_str(), ScanExtractor::Vhdl);
   extractor.Parse(ScanExtractor::Vhdl);
   std::vector<std::string> bounds;
-  if (extractor.findDesignUnit("work", c.unit, ScanExtractor::SearchAllLibraries) != 0)
-    return bounds;
+  if (!extractor.selectDesignUnit("work", c.unit, ScanExtractor::SearchAllLibraries)) return bounds;
   ScanPortList* list = extractor.getPorts();
   for (const std::string& name : c.ports)
     for (const ScanPort* p = list->firstPort(); p != nullptr; p = list->nextPort(p)) {

@@ -116,7 +116,7 @@ TEST_P(HeaderErrors, ArePrintedOnceAndBreakTheHeader) {
     ScanExtractor extractor;
     extractor.addDesignFile("work", path.c_str(), ScanExtractor::Vhdl);
     extractor.Parse(ScanExtractor::Vhdl);
-    ASSERT_EQ(extractor.findDesignUnit("work", "e", ScanExtractor::SearchAllLibraries), 0);
+    ASSERT_TRUE(extractor.selectDesignUnit("work", "e", ScanExtractor::SearchAllLibraries));
     extractor.getPorts();
     broken = extractor.unitHasErrors();
   }

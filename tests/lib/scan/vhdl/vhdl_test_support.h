@@ -69,8 +69,7 @@ inline Run extract(const std::vector<std::pair<std::string, std::string>>& files
       extractor.addDesignFile(library.c_str(), (fixtures ? fixture(file) : file).c_str(),
                               ScanExtractor::Vhdl);
     run.errors = extractor.Parse(ScanExtractor::Vhdl);
-    run.found =
-        extractor.findDesignUnit("work", unit.c_str(), ScanExtractor::SearchAllLibraries) == 0;
+    run.found = extractor.selectDesignUnit("work", unit.c_str(), ScanExtractor::SearchAllLibraries);
     ScanPortList* list = extractor.getPorts();
     for (const ScanPort* p = list->firstPort(); p != nullptr; p = list->nextPort(p)) {
       Port port{p->name(), p->typeName(), p->direction(), p->sourceLine(), p->hasRange()};
