@@ -81,6 +81,19 @@ bool checkGenericOverrides(RunContext& context) {
   return !context.hasErrors();
 }
 
+/// Opens the trace file. One that cannot be created only means the expansion runs without a
+/// trace, with a warning.
+void startTrace(RunContext& context) {
+  std::string error;
+  if (context.openTraceFile(error)) return;
+  std::string text = "WARNING: Unable to open trace file ";
+  text += kTraceFileName;
+  text += ": ";
+  text += error;
+  text += "; the run goes on without it.";
+  context.reportMessage(text, RunContext::Severity::Warning);
+}
+
 /// Expands a non-Tcl template with the template processor.
 bool runTemplateEngine(RunContext& context) {
   Forge forge(context.outputStream(), context.templateStream(), context.debugStream(),
@@ -108,8 +121,9 @@ bool runStages(RunContext& context) {
     reportLanguageHint(context);
     return false;
   }
-  if (!checkGenericOverrides(context) || !prepareRun(context) || !buildPortList(context))
-    return false;
+  if (!checkGenericOverrides(context)) return false;
+  if (context.m_Debug) startTrace(context);
+  if (!createDesignData(context) || !buildPortList(context)) return false;
   buildUnitData(context);
   if (Host::FileName(context.m_TemplateFileName.view()).GetExtension().Compare(".tcl", 0) != 0)
     return runTemplateEngine(context);
@@ -135,17 +149,7 @@ bool checkUnitHeader(RunContext& context) {
   return false;
 }
 
-bool prepareRun(RunContext& context) {
-  // A trace file that cannot be created only means the expansion runs without a trace.
-  if (std::string error; context.m_Debug && !context.openTraceFile(error)) {
-    std::string text = "WARNING: Unable to open trace file ";
-    text += kTraceFileName;
-    text += ": ";
-    text += error;
-    text += "; the run goes on without it.";
-    context.reportMessage(text, RunContext::Severity::Warning);
-  }
-
+bool createDesignData(RunContext& context) {
   const std::string title = titleOf(context.m_OutputFileName);
   context.m_Date = Host::StringBase(currentDate());
 

@@ -10,8 +10,9 @@ bool runDesignFlow(RunContext& context);
 /// Reads the found unit's header; an error in it fails the run rather than giving a port list
 /// that cannot be trusted. True when the header was read cleanly.
 bool checkUnitHeader(RunContext& context);
-/// Opens the trace file in debug mode and creates the design data with its header values.
-bool prepareRun(RunContext& context);
+/// Creates the design data with its header values (project, module, output, title, date);
+/// true when the run's error count is still 0.
+bool createDesignData(RunContext& context);
 /// Appends one port record per extracted port to the design data, with its declared type,
 /// kind, mode and, for a range that could not be evaluated, the reader's problem text.
 bool buildPortList(RunContext& context);

@@ -175,7 +175,7 @@ std::unique_ptr<StbDataList> unitData(const ScratchDir& dir, const char* file, c
   context.m_Extractor.configure(context.m_ScanSettings);
   context.m_Extractor.Parse(context.m_Language);
   if (!context.m_Extractor.selectDesignUnit("work", "top", ScanExtractor::SearchAllLibraries) ||
-      !checkUnitHeader(context) || !prepareRun(context) || !buildPortList(context))
+      !checkUnitHeader(context) || !createDesignData(context) || !buildPortList(context))
     return nullptr;
   buildUnitData(context);
   return std::move(context.m_DesignData);
