@@ -1,5 +1,4 @@
-// Every line the program prints outside the run's reporter goes through here, so no text is
-// ever taken for a printf format and a NUL byte in it is printed rather than ending it.
+// Each line goes out in one write, so a line on an unbuffered standard error is never split.
 #include "message_lines.h"
 
 #include <string>

@@ -1,6 +1,6 @@
-// The front end's own lines on its message stream (standard error, or the "-err" file): the
-// usage, the missing switches and the fatal errors that stop a run before the design flow.
-// Run messages go through RunContext::reportMessage, the readers' through their diagnostics.
+// How the program prints its own lines: byte for byte, never through a printf format. The front
+// end's usage and FATAL ERROR lines go to its message stream (standard error, or the "-err"
+// file) from here; run messages are RunContext::reportMessage's, which prints through here too.
 #pragma once
 
 #include <cstdio>
@@ -10,5 +10,5 @@
 void writeText(std::FILE* stream, std::string_view text);
 /// `text` and a newline.
 void writeLine(std::FILE* stream, std::string_view text);
-/// "FATAL ERROR: <text>" and a newline.
+/// "FATAL ERROR: <text>" and a newline: a failure that ends the run before the design flow.
 void writeFatalError(std::FILE* stream, std::string_view text);
