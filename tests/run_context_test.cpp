@@ -1,5 +1,5 @@
-// The run context's file opens, design-file registration and message reporting, the reading
-// of -g, -D and -I, and what the design data receives from the readers.
+// The run context's output extension and message reporting, the reading of -g, -D and -I, and
+// what the design data receives from the readers.
 #include "run_context.h"
 
 #include <gtest/gtest.h>
@@ -60,21 +60,6 @@ TEST_F(RunContextFiles, OutputExtensionIsEverythingAfterTheFirstDotOfTheWholeNam
     EXPECT_EQ(context.m_OutputFileName.str(), test.name);
     EXPECT_EQ(context.outputStream() != nullptr, test.opens);
   }
-}
-
-TEST_F(RunContextFiles, FilesThatDoNotOpenKeepTheirNamesAndLeaveNoStream) {
-  RunContext context;
-  std::string why;
-  EXPECT_FALSE(context.openTemplateFile("none.tpl", why));
-  EXPECT_EQ(context.templateStream(), nullptr);
-  EXPECT_EQ(context.m_TemplateFileName.str(), "none.tpl");
-  EXPECT_EQ(context.openErrorFile("no/such/dir.log", why), nullptr);
-  EXPECT_EQ(context.errorStream(), nullptr);
-  EXPECT_EQ(context.m_ErrorFileName.str(), "no/such/dir.log");
-  // A design file that cannot be read stays registered so the lookup can tell about it.
-  EXPECT_FALSE(context.registerDesignFile("absent.vhd"));
-  ASSERT_EQ(context.m_Extractor.files().size(), 1u);
-  EXPECT_EQ(context.m_InputFileName.str(), "absent.vhd");
 }
 
 TEST(RunContextReport, EveryMessageIsPrintedCountedAndKept) {
