@@ -108,6 +108,7 @@ void applyIntegerRule(RunContext& context, const ScanPort& port, Bounds& bounds)
   context.reportMessage(text, RunContext::Severity::Warning);
 }
 
+/// The bounds the port's record gets; an integer range gives the bits it needs instead.
 Bounds boundsOf(RunContext& context, const ScanPort& port) {
   Bounds bounds;
   if (port.hasRange()) {
