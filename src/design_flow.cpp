@@ -35,43 +35,7 @@ std::string currentDate() {
   return std::string(buffer, length);
 }
 
-}  // namespace
-
-bool runDesignFlow(RunContext& context) {
-  const bool done = runStages(context);
-  context.closeTraceFile();
-  return done && !context.hasErrors();
-}
-
-bool runStages(RunContext& context) {
-  context.m_Extractor.configure(context.m_ScanSettings);
-  context.m_Extractor.Parse(context.m_Language);
-  if (!reportUnreadableFiles(context)) return false;
-  if (context.m_Extractor.findDesignUnit("work", context.m_ModuleName.c_str(),
-                                         ScanExtractor::SearchAllLibraries) != 0) {
-    std::string text = "Declaration (Module ";
-    text += context.m_ModuleName.view();
-    text += ") not found.";
-    context.reportMessage(text, RunContext::Severity::Error);
-    const std::string hint =
-        unitNotFoundHint(context.m_ModuleName.view(), context.m_Extractor.listUnits());
-    if (!hint.empty()) context.reportMessage(hint, RunContext::Severity::Warning);
-    reportLanguageHint(context);
-    return false;
-  }
-  if (!checkUnitHeader(context)) {
-    reportLanguageHint(context);
-    return false;
-  }
-  if (!checkGenericOverrides(context)) return false;
-  if (!prepareRun(context)) return false;
-  if (!buildPortList(context)) return false;
-  buildUnitData(context);
-  if (Host::FileName(context.m_TemplateFileName.view()).GetExtension().Compare(".tcl", 0) == 0)
-    return handOverOutput(context) && context.runTclGenerator();
-  return runTemplateEngine(context);
-}
-
+/// Reports each design file that could not be read as an error; true when there was none.
 bool reportUnreadableFiles(RunContext& context) {
   const std::vector<std::string>& unreadable = context.m_Extractor.unreadableFiles();
   for (const std::string& file : unreadable) {
@@ -83,19 +47,96 @@ bool reportUnreadableFiles(RunContext& context) {
   return unreadable.empty();
 }
 
+/// Reports, as a warning, the -lang the design files seem to need, if any.
 void reportLanguageHint(RunContext& context) {
-  const std::string hint =
-      languageHint(context.m_Extractor.files(), context.m_Language == ScanExtractor::Verilog);
+  const std::string hint = languageHint(context.m_Extractor.files(), context.isVerilog());
   if (!hint.empty()) context.reportMessage(hint, RunContext::Severity::Warning);
 }
 
+/// Looks the module up; when it is missing, says so with the closest names and the language
+/// hint. True when found.
+bool findModule(RunContext& context) {
+  if (context.m_Extractor.selectDesignUnit("work", context.m_ModuleName.c_str(),
+                                           ScanExtractor::SearchAllLibraries))
+    return true;
+  std::string text = "Declaration (Module ";
+  text += context.m_ModuleName.view();
+  text += ") not found.";
+  context.reportMessage(text, RunContext::Severity::Error);
+  const std::string hint =
+      unitNotFoundHint(context.m_ModuleName.view(), context.m_Extractor.listUnits());
+  if (!hint.empty()) context.reportMessage(hint, RunContext::Severity::Warning);
+  reportLanguageHint(context);
+  return false;
+}
+
+/// Reports each -g that names no generic of the found unit as an error, listing the unit's
+/// generics; true when every -g names one. Valid after checkUnitHeader.
 bool checkGenericOverrides(RunContext& context) {
   for (const std::string& name : context.m_Extractor.unknownOverrides())
     context.reportMessage(
         unknownGenericMessage(context.m_ModuleName.view(), name, context.m_Extractor.getGenerics(),
-                              context.m_Verilog != 0),
+                              context.isVerilog()),
         RunContext::Severity::Error);
   return !context.hasErrors();
+}
+
+/// Opens the trace file. One that cannot be created only means the expansion runs without a
+/// trace, with a warning.
+void startTrace(RunContext& context) {
+  std::string error;
+  if (context.openTraceFile(error)) return;
+  std::string text = "WARNING: Unable to open trace file ";
+  text += kTraceFileName;
+  text += ": ";
+  text += error;
+  text += "; the run goes on without it.";
+  context.reportMessage(text, RunContext::Severity::Warning);
+}
+
+/// Expands a non-Tcl template with the template processor.
+bool runTemplateEngine(RunContext& context) {
+  Forge forge(context.outputStream(), context.templateStream(), context.debugStream(),
+              context.m_DesignData.get());
+  forge.setTemplateName(context.m_TemplateFileName.view());
+  forge.processTemplate();
+  for (const std::string& warning : forge.warnings())
+    context.reportMessage("WARNING: " + warning, RunContext::Severity::Warning);
+  std::string message;
+  if (forge.getResult(message) != 0) {
+    std::string text = "FATAL: ";
+    text += message;
+    text += '\n';
+    context.reportMessage(text, RunContext::Severity::Error);
+  }
+  return !context.hasErrors();
+}
+
+/// The flow's stages in order, stopping at the first that fails.
+bool runStages(RunContext& context) {
+  context.m_Extractor.configure(context.m_ScanSettings);
+  context.m_Extractor.Parse(context.m_Language);
+  if (!reportUnreadableFiles(context) || !findModule(context)) return false;
+  if (!checkUnitHeader(context)) {
+    reportLanguageHint(context);
+    return false;
+  }
+  if (!checkGenericOverrides(context)) return false;
+  if (context.m_Debug) startTrace(context);
+  if (!createDesignData(context) || !buildPortList(context)) return false;
+  buildUnitData(context);
+  if (Host::FileName(context.m_TemplateFileName.view()).GetExtension().Compare(".tcl", 0) != 0)
+    return runTemplateEngine(context);
+  // The Tcl script writes the output by name, so the output is put in place first.
+  return context.closeOutput() && context.commitOutput() && context.runTclGenerator();
+}
+
+}  // namespace
+
+bool runDesignFlow(RunContext& context) {
+  const bool done = runStages(context);
+  context.closeTraceFile();
+  return done && !context.hasErrors();
 }
 
 bool checkUnitHeader(RunContext& context) {
@@ -108,40 +149,7 @@ bool checkUnitHeader(RunContext& context) {
   return false;
 }
 
-bool handOverOutput(RunContext& context) {
-  std::string error;
-  if (!context.closeOutput(error)) {
-    reportOutputFailure(context, "write", error);
-    return false;
-  }
-  if (!context.m_Output.commit(error)) {
-    reportOutputFailure(context, "replace", error);
-    return false;
-  }
-  return true;
-}
-
-void reportOutputFailure(RunContext& context, std::string_view action, std::string_view why) {
-  std::string text = "Unable to ";
-  text += action;
-  text += " output file ";
-  text += context.m_OutputFileName.view();
-  text += ": ";
-  text += why;
-  context.reportMessage(text, RunContext::Severity::Error);
-}
-
-bool prepareRun(RunContext& context) {
-  // A trace file that cannot be created only means the expansion runs without a trace.
-  if (std::string error; context.m_Debug && !context.openTraceFile(error)) {
-    std::string text = "WARNING: Unable to open trace file ";
-    text += kTraceFileName;
-    text += ": ";
-    text += error;
-    text += "; the run goes on without it.";
-    context.reportMessage(text, RunContext::Severity::Warning);
-  }
-
+bool createDesignData(RunContext& context) {
   const std::string title = titleOf(context.m_OutputFileName);
   context.m_Date = Host::StringBase(currentDate());
 
@@ -151,26 +159,5 @@ bool prepareRun(RunContext& context) {
   if (!context.m_DesignData)
     context.reportMessage("FATAL: Unable to allocate enough memory for Forge.\n",
                           RunContext::Severity::Error);
-  return !context.hasErrors();
-}
-
-bool runTemplateEngine(RunContext& context) {
-  {
-    Forge forge(context.m_OutputStream, context.m_TemplateStream, context.m_DebugStream,
-                context.m_DesignData.get());
-    forge.setTemplateName(context.m_TemplateFileName.view());
-    forge.processTemplate();
-    for (const std::string& warning : forge.warnings())
-      context.reportMessage("WARNING: " + warning, RunContext::Severity::Warning);
-    std::string message;
-    if (forge.getResult(message) != 0) {
-      std::string text = "FATAL: ";
-      text += message;
-      text += '\n';
-      context.reportMessage(text, RunContext::Severity::Error);
-    }
-    // The processor only borrows the design data; it is released before the processor goes.
-    context.m_DesignData.reset();
-  }
   return !context.hasErrors();
 }

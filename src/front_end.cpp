@@ -11,6 +11,7 @@
 
 #include "design_flow.h"
 #include "help_text.h"
+#include "message_lines.h"
 #include "response_file.h"
 #include "run_context.h"
 #include "run_hints.h"
@@ -19,7 +20,7 @@
 namespace {
 
 void writeUsage(std::FILE* messageStream) {
-  std::fprintf(messageStream, "Usage: %s\n", kUsageText);
+  writeLine(messageStream, std::string("Usage: ") + kUsageText);
 }
 
 /// Argument 0 of the first occurrence of `name`, or null when the switch was not given. Later
@@ -29,20 +30,17 @@ const char* firstArgument(const UT_CMDARGS& parser, const char* name) {
   return occurrence != nullptr ? occurrence->getargtxt(0) : nullptr;
 }
 
-void selectVerilog(RunContext& context) {
-  context.m_Verilog = 1;
-  context.m_Language = ScanExtractor::Verilog;
-}
-
 /// The -lang value decides the reader; an unknown value is read as VHDL, with a warning.
 void selectLanguage(RunContext& context, const UT_CMDARGS& parser) {
-  context.m_Verilog = 0;
   context.m_Language = ScanExtractor::Vhdl;
   const char* language = firstArgument(parser, "-lang");
   if (language == nullptr) return;
   const Host::StringBase value(language);
   for (std::string_view name : {"verilog", "systemverilog", "sv"})
-    if (value.Compare(name, 1) == 0) return selectVerilog(context);
+    if (value.Compare(name, 1) == 0) {
+      context.m_Language = ScanExtractor::Verilog;
+      return;
+    }
   if (value.Compare("vhdl", 1) == 0) return;
   std::string text = "WARNING: -lang ";
   text += language;
@@ -58,7 +56,7 @@ void detectLanguage(RunContext& context, const UT_CMDARGS& parser) {
   if (parser.findsw("-lang") || files.empty()) return;
   for (const ScanExtractor::RegisteredFile& file : files)
     if (!hasVerilogExtension(file.path)) return;
-  selectVerilog(context);
+  context.m_Language = ScanExtractor::Verilog;
 }
 
 /// What -template reads: the file the template search finds, else the name as given so that
@@ -123,22 +121,20 @@ std::string overlappingFiles(const UT_CMDARGS& parser) {
 bool checkDistinctFiles(const UT_CMDARGS& parser, std::FILE* messageStream) {
   const std::string overlap = overlappingFiles(parser);
   if (overlap.empty()) return true;
-  const std::string line = "FATAL ERROR: " + overlap + "; nothing was written.\n";
-  std::fwrite(line.data(), 1, line.size(), messageStream);
+  writeFatalError(messageStream, overlap + "; nothing was written.");
   return false;
 }
 
 /// "FATAL ERROR: Unable to open <what> <name>: <why>" on the message stream.
 void writeOpenFailure(std::FILE* messageStream, std::string_view what, const char* name,
                       std::string_view why) {
-  std::string line = "FATAL ERROR: Unable to open ";
-  line += what;
-  line += ' ';
-  line += name;
-  line += ": ";
-  line += why;
-  line += '\n';
-  std::fwrite(line.data(), 1, line.size(), messageStream);
+  std::string text = "Unable to open ";
+  text += what;
+  text += ' ';
+  text += name;
+  text += ": ";
+  text += why;
+  writeFatalError(messageStream, text);
 }
 
 /// The line after a -template that is neither a file nor a template name.
@@ -151,8 +147,49 @@ void writeAvailableTemplates(std::FILE* messageStream, std::string_view name) {
     line += i == 0 ? "; the templates are: " : ", ";
     line += names[i];
   }
-  line += ".\n";
-  std::fwrite(line.data(), 1, line.size(), messageStream);
+  line += '.';
+  writeLine(messageStream, line);
+}
+
+/// The declaration of switch `name` in the usage text without its enclosing brackets
+/// ("-prj <project>", "-lib <libname> {<vhdfile>}"); empty for an undeclared switch.
+std::string_view usageOf(std::string_view name) {
+  const std::string_view usage = kUsageText;
+  for (size_t at = usage.find(name); at != std::string_view::npos; at = usage.find(name, at + 1)) {
+    const size_t after = at + name.size();
+    if (at == 0 || (usage[at - 1] != '[' && usage[at - 1] != '{') || after >= usage.size() ||
+        (usage[after] != ' ' && usage[after] != ']' && usage[after] != '}'))
+      continue;
+    int depth = 1;
+    for (size_t end = at; end < usage.size(); ++end) {
+      if (usage[end] == '[' || usage[end] == '{') ++depth;
+      if ((usage[end] == ']' || usage[end] == '}') && --depth == 0)
+        return usage.substr(at, end - at);
+    }
+  }
+  return std::string_view();
+}
+
+/// Registers the design files of every "-lib" occurrence, each under the library name of its
+/// own occurrence, in command-line order; the context's library name ends as the last one.
+void registerLibraries(RunContext& context, const UT_CMDARGS& parser) {
+  for (uint16_t index = 0;; ++index) {
+    const UT_CMDSWINFO* occurrence = parser.getsw("-lib", index);
+    if (occurrence == nullptr) return;
+    if (const char* library = occurrence->getargtxt(0))
+      context.m_LibraryName = std::string_view(library);
+    for (uint16_t file = 1; const char* name = occurrence->getargtxt(file); ++file)
+      context.registerDesignFile(name);
+  }
+}
+
+/// True when the module, project and input file names were given and the output and template
+/// streams are open.
+bool checkRequiredInputs(const RunContext& context) {
+  return context.m_ModuleName.Compare(kUndefinedName, 0) != 0 &&
+         context.m_ProjectName.Compare(kUndefinedName, 0) != 0 &&
+         context.m_InputFileName.Compare(kUndefinedName, 0) != 0 &&
+         context.outputStream() != nullptr && context.templateStream() != nullptr;
 }
 
 /// Records the names and flags and opens the template and output files. A file that cannot be
@@ -160,7 +197,6 @@ void writeAvailableTemplates(std::FILE* messageStream, std::string_view name) {
 /// the design flow will not run. Returns false in that case.
 bool readRunOptions(RunContext& context, const UT_CMDARGS& parser, std::FILE* messageStream) {
   bool opened = true;
-  context.m_NoList = parser.findsw("-nodelist");
   if (const char* module = firstArgument(parser, "-module"))
     context.m_ModuleName = std::string_view(module);
   context.m_Debug = parser.findsw("-a");
@@ -186,18 +222,10 @@ bool readRunOptions(RunContext& context, const UT_CMDARGS& parser, std::FILE* me
 /// already put in place (the Tcl path's) is removed if it is still the file this run wrote.
 /// An early failure never touches a previous output. True when nothing went wrong here.
 bool settleOutput(RunContext& context, bool flowRan, bool failed, bool deleteOnError) {
-  std::string why;
-  bool settled = true;
-  if (!context.closeOutput(why)) {
-    reportOutputFailure(context, "write", why);
-    settled = false;
-  }
+  bool settled = context.closeOutput();
   failed = failed || !settled;
   if (flowRan && !(failed && deleteOnError)) {
-    if (!context.m_Output.commit(why)) {
-      reportOutputFailure(context, "replace", why);
-      settled = false;
-    }
+    settled = context.commitOutput() && settled;
   } else {
     context.m_Output.discard();
   }
@@ -205,29 +233,14 @@ bool settleOutput(RunContext& context, bool flowRan, bool failed, bool deleteOnE
   return settled;
 }
 
-/// Closes the "-err" file, reporting a failed write to it; true when it was written in full.
-bool closeErrorFile(RunContext& context) {
-  if (context.m_ErrorStream == nullptr) return true;
-  context.m_ErrorStream = nullptr;
-  std::string why;
-  if (context.m_ErrorFile.close(why)) return true;
-  std::string text = "Unable to write error file ";
-  text += context.m_ErrorFileName.view();
-  text += ": ";
-  text += why;
-  context.reportMessage(text, RunContext::Severity::Error);
-  return false;
-}
-
 /// Settles the run's files and prints the completion line; true when the run failed.
 bool finishRun(RunContext& context, const UT_CMDARGS& parser, bool flowRan, bool failed) {
-  const char* languageName = context.m_Verilog != 0 ? "verilog" : "vhdl";
   failed = !settleOutput(context, flowRan, failed, parser.findsw("-deleteonerror")) || failed;
-  failed = !closeErrorFile(context) || failed;
-  if (failed)
-    std::printf("forge(%s) completed with errors.\n", languageName);
-  else
-    std::printf("forge(%s) completed successfully.\n", languageName);
+  failed = !context.closeErrorFile() || failed;
+  std::string line = "forge(";
+  line += context.isVerilog() ? "verilog" : "vhdl";
+  line += failed ? ") completed with errors." : ") completed successfully.";
+  writeLine(stdout, line);
   return failed;
 }
 
@@ -245,7 +258,7 @@ void writeMissingSwitches(const RunContext& context, const UT_CMDARGS& parser,
   if (context.m_InputFileName.Compare(kUndefinedName, 0) == 0) missing("-lib");
   for (const char* name : {"-module", "-prj", "-template", "-o"})
     if (!parser.findsw(name)) missing(name);
-  std::fwrite(text.data(), 1, text.size(), messageStream);
+  writeText(messageStream, text);
 }
 
 /// `--help` or `--version` anywhere on the (expanded) command line answers at once, whatever
@@ -261,7 +274,7 @@ std::optional<int> answerInformationRequest(const ArgumentVector& arguments) {
       text = versionText();
     else
       continue;
-    std::fwrite(text.data(), 1, text.size(), stdout);
+    writeText(stdout, text);
     return std::fflush(stdout) == 0 && !std::ferror(stdout) ? 0 : 1;
   }
   return std::nullopt;
@@ -273,8 +286,7 @@ int listDesignUnits(RunContext& context, const UT_CMDARGS& parser) {
   if (context.m_InputFileName.Compare(kUndefinedName, 0) == 0) {
     std::string text = "pinforge: missing ";
     text += usageOf("-lib");
-    text += '\n';
-    std::fwrite(text.data(), 1, text.size(), stderr);
+    writeLine(stderr, text);
     writeUsage(stderr);
     return 1;
   }
@@ -287,28 +299,11 @@ int listDesignUnits(RunContext& context, const UT_CMDARGS& parser) {
     listing += std::to_string(unit.line);
     listing += '\n';
   }
-  std::fwrite(listing.data(), 1, listing.size(), stdout);
+  writeText(stdout, listing);
   return context.m_Extractor.unreadableFiles().empty() ? 0 : 1;
 }
 
 }  // namespace
-
-std::string_view usageOf(std::string_view name) {
-  const std::string_view usage = kUsageText;
-  for (size_t at = usage.find(name); at != std::string_view::npos; at = usage.find(name, at + 1)) {
-    const size_t after = at + name.size();
-    if (at == 0 || (usage[at - 1] != '[' && usage[at - 1] != '{') || after >= usage.size() ||
-        (usage[after] != ' ' && usage[after] != ']' && usage[after] != '}'))
-      continue;
-    int depth = 1;
-    for (size_t end = at; end < usage.size(); ++end) {
-      if (usage[end] == '[' || usage[end] == '{') ++depth;
-      if ((usage[end] == ']' || usage[end] == '}') && --depth == 0)
-        return usage.substr(at, end - at);
-    }
-  }
-  return std::string_view();
-}
 
 bool readScanSettings(RunContext& context, const UT_CMDARGS& parser) {
   bool wellFormed = true;
@@ -345,24 +340,6 @@ bool readScanSettings(RunContext& context, const UT_CMDARGS& parser) {
   return wellFormed;
 }
 
-void registerLibraries(RunContext& context, const UT_CMDARGS& parser) {
-  for (uint16_t index = 0;; ++index) {
-    const UT_CMDSWINFO* occurrence = parser.getsw("-lib", index);
-    if (occurrence == nullptr) return;
-    if (const char* library = occurrence->getargtxt(0))
-      context.m_LibraryName = std::string_view(library);
-    for (uint16_t file = 1; const char* name = occurrence->getargtxt(file); ++file)
-      context.registerDesignFile(name);
-  }
-}
-
-bool checkRequiredInputs(const RunContext& context) {
-  return context.m_ModuleName.Compare(kUndefinedName, 0) != 0 &&
-         context.m_ProjectName.Compare(kUndefinedName, 0) != 0 &&
-         context.m_InputFileName.Compare(kUndefinedName, 0) != 0 &&
-         context.m_OutputStream != nullptr && context.m_TemplateStream != nullptr;
-}
-
 int runFrontEnd(int argc, char** argv) {
   Host::Interrupt::install();
   std::FILE* messageStream = stderr;
@@ -393,9 +370,8 @@ int runFrontEnd(int argc, char** argv) {
     std::string why;
     messageStream = context.openErrorFile(name, why);
     if (messageStream == nullptr) {
-      const std::string line = "FATAL ERROR: Unable to open log file " + std::string(name) +
-                               " in write mode: " + why + "\n";
-      std::fwrite(line.data(), 1, line.size(), stdout);
+      writeFatalError(stdout,
+                      "Unable to open log file " + std::string(name) + " in write mode: " + why);
       return 1;
     }
   }

@@ -19,18 +19,6 @@ inline constexpr const char* kUsageText =
 /// file, so it is meant to be called once, from main.
 int runFrontEnd(int argc, char** argv);
 
-/// Registers the design files of every "-lib" occurrence, each under the library name of its
-/// own occurrence, in command-line order; the context's library name ends as the last one.
-void registerLibraries(RunContext& context, const UT_CMDARGS& parser);
-
-/// True when the module, project and input file names were given and the output and template
-/// streams are open.
-bool checkRequiredInputs(const RunContext& context);
-
-/// The declaration of switch `name` in the usage text without its enclosing brackets
-/// ("-prj <project>", "-lib <libname> {<vhdfile>}"); empty for an undeclared switch.
-std::string_view usageOf(std::string_view name);
-
 /// Reads every -g, -D and -I into the context's reader settings, reporting each malformed one
 /// as an error; true when all were well formed.
 bool readScanSettings(RunContext& context, const UT_CMDARGS& parser);

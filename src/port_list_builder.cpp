@@ -12,22 +12,20 @@
 #include <utility>
 
 #include "design_flow.h"
+#include "message_lines.h"
 #include "run_context.h"
 
 namespace {
 
-constexpr int32_t kRangeNone = 0;
-constexpr int32_t kRangeTo = 1;
-constexpr int32_t kRangeDownto = 2;
+/// How a port's range runs, as the debug line shows it.
+enum class RangeKind { None, To, Downto };
 
-void resetScratch(RunContext& context) {
-  context.m_CurrentPortName.Empty();
-  context.m_CurrentPortType.Empty();
-  context.m_CurrentPortDir = -1;
-  context.m_CurrentLeft = -1;
-  context.m_CurrentRangeKind = kRangeNone;
-  context.m_CurrentRight = -1;
-}
+/// The bounds of one port as its record and the debug line show them: -1 when it has none.
+struct Bounds {
+  int32_t left = -1;
+  int32_t right = -1;
+  RangeKind kind = RangeKind::None;
+};
 
 char directionLetter(int code) {
   switch (code) {
@@ -94,13 +92,13 @@ int32_t floorLog2(int32_t value) {
   return static_cast<int32_t>(std::bit_width(static_cast<uint32_t>(value))) - 1;
 }
 
-/// Replaces the scratch bounds of an integer range by the bits its largest value needs,
-/// written from the high bit down to 0 when the range falls.
-void applyIntegerRule(RunContext& context, const ScanPort& port) {
-  const int32_t largest = std::max(context.m_CurrentLeft, context.m_CurrentRight);
-  context.m_CurrentLeft = 0;
-  context.m_CurrentRight = largest > 0 ? floorLog2(largest) : 0;
-  if (port.isAscending() == 0) std::swap(context.m_CurrentLeft, context.m_CurrentRight);
+/// Replaces the bounds of an integer range by the bits its largest value needs, written from
+/// the high bit down to 0 when the range falls.
+void applyIntegerRule(RunContext& context, const ScanPort& port, Bounds& bounds) {
+  const int32_t largest = std::max(bounds.left, bounds.right);
+  bounds.left = 0;
+  bounds.right = largest > 0 ? floorLog2(largest) : 0;
+  if (port.isAscending() == 0) std::swap(bounds.left, bounds.right);
 
   std::string text = "WARNING: Module ";
   text += context.m_ModuleName.view();
@@ -108,6 +106,19 @@ void applyIntegerRule(RunContext& context, const ScanPort& port) {
   text += std::to_string(port.sourceLine());
   text += "): INTEGER RANGE is only supported for schematic symbol generation.";
   context.reportMessage(text, RunContext::Severity::Warning);
+}
+
+/// The bounds the port's record gets; an integer range gives the bits it needs instead.
+Bounds boundsOf(RunContext& context, const ScanPort& port) {
+  Bounds bounds;
+  if (port.hasRange()) {
+    port.getBounds(bounds.left, bounds.right);
+    if (isIntegerType(port.typeName())) applyIntegerRule(context, port, bounds);
+    bounds.kind = port.isAscending() != 0 ? RangeKind::To : RangeKind::Downto;
+  }
+  // A range the reader could not evaluate has no bounds; the record carries its problem.
+  if (port.rangeUnknown()) bounds.left = bounds.right = -1;
+  return bounds;
 }
 
 /// The direction as the design's language writes it.
@@ -132,55 +143,43 @@ std::string_view directionWord(int code, bool verilog) {
   }
 }
 
-void printDebugLine(const RunContext& context, int direction) {
-  std::string line = context.m_CurrentPortName.str();
+void printDebugLine(const ScanPort& port, const Bounds& bounds, bool verilog) {
+  std::string line = port.name();
   line += ": ";
-  line += directionWord(direction, context.m_Verilog != 0);
+  line += directionWord(port.direction(), verilog);
   line += ' ';
-  line += context.m_CurrentPortType.view();
-  if (context.m_CurrentRangeKind != kRangeNone) {
-    line += " (" + std::to_string(context.m_CurrentLeft);
-    line += context.m_CurrentRangeKind == kRangeTo ? " TO " : " DOWNTO ";
-    line += std::to_string(context.m_CurrentRight) + ")";
+  line += port.typeName();
+  if (bounds.kind != RangeKind::None) {
+    line += " (" + std::to_string(bounds.left);
+    line += bounds.kind == RangeKind::To ? " TO " : " DOWNTO ";
+    line += std::to_string(bounds.right) + ")";
   }
-  line += ";\n";
-  std::fwrite(line.data(), 1, line.size(), stdout);
+  line += ';';
+  writeLine(stdout, line);
 }
 
 }  // namespace
 
 bool buildPortList(RunContext& context) {
-  resetScratch(context);
   const ScanPortList* ports = context.m_Extractor.getPorts();
   for (const ScanPort* port = ports != nullptr ? ports->firstPort() : nullptr; port != nullptr;
        port = ports->nextPort(port)) {
-    context.m_CurrentPortName = std::string_view(port->name());
-    context.m_CurrentPortType = std::string_view(port->typeName());
-    const char letter = directionLetter(port->direction());
-    context.m_CurrentPortDir = letter;
-    if (port->hasRange()) {
-      port->getBounds(context.m_CurrentLeft, context.m_CurrentRight);
-      if (isIntegerType(context.m_CurrentPortType)) applyIntegerRule(context, *port);
-      context.m_CurrentRangeKind = port->isAscending() != 0 ? kRangeTo : kRangeDownto;
-    }
-    // A range the reader could not evaluate has no bounds; the record carries its problem.
-    if (port->rangeUnknown()) context.m_CurrentLeft = context.m_CurrentRight = -1;
-    auto record = std::make_unique<PortRecord>(
-        context.m_CurrentPortName.view(), context.m_CurrentLeft, context.m_CurrentRight, letter);
+    const Bounds bounds = boundsOf(context, *port);
+    auto record = std::make_unique<PortRecord>(port->name(), bounds.left, bounds.right,
+                                               directionLetter(port->direction()));
     record->m_DeclaredType = port->declaredType();
     record->m_Kind = kindOf(*port);
     record->m_Mode = modeOf(port->direction());
     if (port->rangeUnknown()) record->setRangeUnknown(port->rangeProblem());
     context.m_DesignData->appendOwned(record.release());
-    if (context.m_Debug) printDebugLine(context, port->direction());
-    resetScratch(context);
+    if (context.m_Debug) printDebugLine(*port, bounds, context.isVerilog());
   }
   return !context.hasErrors();
 }
 
 void buildUnitData(RunContext& context) {
   StbDataList& data = *context.m_DesignData;
-  const bool verilog = context.m_Verilog != 0;
+  const bool verilog = context.isVerilog();
   data.m_Language = verilog ? DesignLanguage::Verilog : DesignLanguage::Vhdl;
   data.m_Context = context.m_Extractor.getContext();
   data.m_Generics.clear();

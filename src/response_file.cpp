@@ -1,27 +1,25 @@
 // Builds the run's argument vector from the command line or from a response file.
 #include "response_file.h"
 
-#include <memory>
+#include <string>
 
+#include "message_lines.h"
+#include "owned_stream.h"
 #include "platform/hostkit.h"
 
 namespace {
 
-struct FileCloser {
-  void operator()(std::FILE* file) const { std::fclose(file); }
-};
-
 /// Opens a response file for reading, or writes why it cannot be one. A FIFO or a device such
 /// as /dev/zero is refused instead of read forever.
-std::unique_ptr<std::FILE, FileCloser> openResponseFile(std::FILE* messageStream,
-                                                        const char* name) {
+OwnedStream openResponseFile(std::FILE* messageStream, const char* name) {
   bool notRegular = false;
-  std::unique_ptr<std::FILE, FileCloser> file(Host::File::openRegular(name, notRegular));
+  OwnedStream file(Host::File::openRegular(name, notRegular));
   if (file) return file;
   if (notRegular)
-    std::fprintf(messageStream, "FATAL ERROR: Response file %s is not a regular file.\n", name);
+    writeFatalError(messageStream,
+                    "Response file " + std::string(name) + " is not a regular file.");
   else
-    std::fprintf(messageStream, "FATAL ERROR: Unable to open response file %s...\n", name);
+    writeFatalError(messageStream, "Unable to open response file " + std::string(name) + "...");
   return nullptr;
 }
 
@@ -85,14 +83,15 @@ Expansion expandResponseFile(std::FILE* messageStream, int argc, char** argv,
   size_t given = 0;
   if (argc > 1 && argv[1][0] == '@') {
     const char* name = argv[1] + 1;
-    std::unique_ptr<std::FILE, FileCloser> file = openResponseFile(messageStream, name);
+    OwnedStream file = openResponseFile(messageStream, name);
     if (!file) return Expansion::Refused;
     WordSplitter splitter(expanded);
     size_t line = 0;
     if (!splitter.read(file.get(), line)) {
-      std::fprintf(messageStream,
-                   "FATAL ERROR: Response file %s, line %zu: a word is longer than %zu MB.\n", name,
-                   line, ArgumentVector::kMaxWordBytes >> 20);
+      writeFatalError(messageStream, "Response file " + std::string(name) + ", line " +
+                                         std::to_string(line) + ": a word is longer than " +
+                                         std::to_string(ArgumentVector::kMaxWordBytes >> 20) +
+                                         " MB.");
       return Expansion::Refused;
     }
     given = splitter.total();
@@ -102,10 +101,9 @@ Expansion expandResponseFile(std::FILE* messageStream, int argc, char** argv,
       expanded.append(argv[index]);
   }
   if (given > ArgumentVector::kMaxArguments) {
-    std::fprintf(messageStream,
-                 "FATAL ERROR: The number of command line arguments exceeds the max allowed "
-                 "(%zu).\n",
-                 ArgumentVector::kMaxArguments);
+    writeFatalError(messageStream,
+                    "The number of command line arguments exceeds the max allowed (" +
+                        std::to_string(ArgumentVector::kMaxArguments) + ").");
     return Expansion::Refused;
   }
   return Expansion::Ready;

@@ -1,5 +1,5 @@
-// The run context's own operations: opening the run's files, registering design files,
-// reporting messages in the program's one format and the diagnostic dump.
+// The run context's own operations: opening and closing the run's files, registering design
+// files, reporting messages in the program's one format and the diagnostic dump.
 #include "run_context.h"
 
 #include <cerrno>
@@ -8,21 +8,14 @@
 #include <string>
 #include <system_error>
 
+#include "message_lines.h"
+
 namespace {
 
-void closeIfOpen(std::FILE*& stream) {
-  if (stream != nullptr) std::fclose(stream);
-  stream = nullptr;
-}
-
-void writeText(std::FILE* stream, std::string_view text) {
-  std::fwrite(text.data(), 1, text.size(), stream);
-}
-
 void dumpLine(std::string_view label, std::string_view value) {
-  writeText(stdout, label);
-  writeText(stdout, value);
-  writeText(stdout, "\n");
+  std::string line(label);
+  line += value;
+  writeLine(stdout, line);
   std::fflush(stdout);
 }
 
@@ -34,22 +27,17 @@ std::string_view openState(const std::FILE* stream) {
 
 RunContext::RunContext() = default;
 
-RunContext::~RunContext() {
-  closeIfOpen(m_InputStream);
-  closeIfOpen(m_TemplateStream);
-}
+RunContext::~RunContext() = default;
 
 std::FILE* RunContext::openErrorFile(const char* name, std::string& error) {
   m_ErrorFileName = std::string_view(name);
-  m_ErrorStream = nullptr;
-  if (m_ErrorFile.open(name, Host::OutputFile::Placement::InPlace, error))
-    m_ErrorStream = m_ErrorFile.stream();
-  return m_ErrorStream;
+  m_ErrorFile.open(name, Host::OutputFile::Placement::InPlace, error);
+  return errorStream();
 }
 
 bool RunContext::openTemplateFile(const char* name, std::string& error) {
   m_TemplateFileName = std::string_view(name);
-  closeIfOpen(m_TemplateStream);
+  m_TemplateStream.reset();
   // Some systems open a directory for reading; it can never be read as a template.
   std::error_code status;
   if (std::filesystem::is_directory(name, status)) {
@@ -57,8 +45,8 @@ bool RunContext::openTemplateFile(const char* name, std::string& error) {
     return false;
   }
   // "e": the Tcl shell the run may start must not inherit the template.
-  m_TemplateStream = std::fopen(name, "re");
-  if (m_TemplateStream == nullptr) error = std::strerror(errno);
+  m_TemplateStream.reset(std::fopen(name, "re"));
+  if (!m_TemplateStream) error = std::strerror(errno);
   return m_TemplateStream != nullptr;
 }
 
@@ -68,35 +56,51 @@ bool RunContext::openOutput(const char* name, std::string& error) {
   const std::string_view whole(name);
   const size_t dot = whole.find('.');
   m_OutputExt = dot == std::string_view::npos ? std::string_view() : whole.substr(dot + 1);
-  m_OutputStream = nullptr;
-  if (m_Output.open(name, Host::OutputFile::Placement::Replace, error))
-    m_OutputStream = m_Output.stream();
-  return m_OutputStream != nullptr;
+  return m_Output.open(name, Host::OutputFile::Placement::Replace, error);
 }
 
 bool RunContext::openTraceFile(std::string& error) {
-  m_DebugStream = nullptr;
-  if (m_TraceFile.open(kTraceFileName, Host::OutputFile::Placement::InPlaceNoFollow, error))
-    m_DebugStream = m_TraceFile.stream();
-  return m_DebugStream != nullptr;
+  return m_TraceFile.open(kTraceFileName, Host::OutputFile::Placement::InPlaceNoFollow, error);
 }
 
-bool RunContext::closeOutput(std::string& error) {
-  m_OutputStream = nullptr;
-  return m_Output.close(error);
+bool RunContext::closeOutput() {
+  std::string error;
+  if (m_Output.close(error)) return true;
+  reportFileFailure("write", "output file", m_OutputFileName.view(), error);
+  return false;
+}
+
+bool RunContext::commitOutput() {
+  std::string error;
+  if (m_Output.commit(error)) return true;
+  reportFileFailure("replace", "output file", m_OutputFileName.view(), error);
+  return false;
+}
+
+bool RunContext::closeErrorFile() {
+  std::string error;
+  if (errorStream() == nullptr || m_ErrorFile.close(error)) return true;
+  reportFileFailure("write", "error file", m_ErrorFileName.view(), error);
+  return false;
 }
 
 void RunContext::closeTraceFile() {
-  if (m_DebugStream == nullptr) return;
-  m_DebugStream = nullptr;
   std::string error;
-  if (!m_TraceFile.close(error)) {
-    std::string text = "Unable to write trace file ";
-    text += kTraceFileName;
-    text += ": ";
-    text += error;
-    reportMessage(text, Severity::Error);
-  }
+  if (debugStream() == nullptr || m_TraceFile.close(error)) return;
+  reportFileFailure("write", "trace file", kTraceFileName, error);
+}
+
+void RunContext::reportFileFailure(std::string_view action, std::string_view what,
+                                   std::string_view name, std::string_view why) {
+  std::string text = "Unable to ";
+  text += action;
+  text += ' ';
+  text += what;
+  text += ' ';
+  text += name;
+  text += ": ";
+  text += why;
+  reportMessage(text, Severity::Error);
 }
 
 bool RunContext::registerDesignFile(const char* name) {
@@ -118,11 +122,11 @@ void RunContext::reportMessage(std::string_view text, Severity severity) {
 }
 
 void RunContext::dumpContext() const {
-  dumpLine("FpErr         ", openState(m_ErrorStream));
-  dumpLine("FpStb         ", openState(m_OutputStream));
-  dumpLine("FpTemplate    ", openState(m_TemplateStream));
-  dumpLine("FpInput       ", openState(m_InputStream));
-  dumpLine("FpDebug       ", openState(m_DebugStream));
+  dumpLine("FpErr         ", openState(errorStream()));
+  dumpLine("FpStb         ", openState(outputStream()));
+  dumpLine("FpTemplate    ", openState(templateStream()));
+  dumpLine("FpInput       ", openState(m_InputStream.get()));
+  dumpLine("FpDebug       ", openState(debugStream()));
   dumpLine("Module        ", m_ModuleName.view());
   dumpLine("Project       ", m_ProjectName.view());
   dumpLine("Output Ext    ", m_OutputExt.view());

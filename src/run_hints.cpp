@@ -5,8 +5,9 @@
 #include <algorithm>
 #include <cctype>
 #include <cstdio>
-#include <memory>
 #include <numeric>
+
+#include "owned_stream.h"
 
 namespace {
 
@@ -48,8 +49,7 @@ bool isIdentifierChar(char c) {
 /// The name of the first "entity NAME is" that begins a line in the file's first 64 KiB;
 /// empty when there is none or the file cannot be read.
 std::string declaredEntity(const std::string& path) {
-  std::unique_ptr<std::FILE, int (*)(std::FILE*)> file(std::fopen(path.c_str(), "rb"),
-                                                       &std::fclose);
+  const OwnedStream file(std::fopen(path.c_str(), "rb"));
   if (!file) return std::string();
   std::string text(64 * 1024, '\0');
   text.resize(std::fread(text.data(), 1, text.size(), file.get()));

@@ -10,6 +10,8 @@
 #include <string_view>
 #include <system_error>
 
+#include "message_lines.h"
+#include "owned_stream.h"
 #include "run_context.h"
 #include "tcl_driver_script.h"
 
@@ -119,13 +121,16 @@ bool writeAll(std::FILE* stream, std::string_view text) {
   return std::fwrite(text.data(), 1, text.size(), stream) == text.size();
 }
 
-/// Copies the whole template, byte for byte, behind the head.
-bool copyStream(std::FILE* from, std::FILE* to) {
+/// Copies the whole Tcl template, byte for byte, behind the script's head; false when it
+/// cannot be read or the script cannot be written.
+bool appendTemplate(const char* name, std::FILE* script) {
+  const OwnedStream from(std::fopen(name, "re"));
+  if (!from) return false;
   char buffer[8192];
   size_t got;
-  while ((got = std::fread(buffer, 1, sizeof buffer, from)) > 0)
-    if (std::fwrite(buffer, 1, got, to) != got) return false;
-  return std::ferror(from) == 0;
+  while ((got = std::fread(buffer, 1, sizeof buffer, from.get())) > 0)
+    if (std::fwrite(buffer, 1, got, script) != got) return false;
+  return std::ferror(from.get()) == 0;
 }
 
 /// The script's path in a form no program can read as an option: a relative $TMPDIR such as
@@ -188,8 +193,8 @@ bool RunContext::runTclGenerator() {
   // A signal from here on removes the script and stops the script shell.
   Host::Interrupt::install();
   std::string scriptName;
-  std::FILE* script = Host::File::createTemporary(".tcl", scriptName);
-  if (script == nullptr) {
+  OwnedStream script(Host::File::createTemporary(".tcl", scriptName));
+  if (!script) {
     const int error = errno;
     reportMessage("ERROR: ProjectMgmt(pinforge) - Unable to create the temporary tcl script in " +
                       Host::File::temporaryDirectory() + ": " + std::strerror(error),
@@ -198,9 +203,9 @@ bool RunContext::runTclGenerator() {
   }
   scriptName = unambiguousPath(scriptName);
   Host::Interrupt::removeOnSignal(scriptName);
-  if (!writeAll(script, tclDriverScriptHead(*this))) {
+  if (!writeAll(script.get(), tclDriverScriptHead(*this))) {
     const int error = errno;
-    std::fclose(script);
+    script.reset();
     discardScript(scriptName);
     reportMessage("ERROR: ProjectMgmt(pinforge) - Unable to write the temporary tcl script " +
                       scriptName + ": " + std::strerror(error),
@@ -208,10 +213,8 @@ bool RunContext::runTclGenerator() {
     return false;
   }
 
-  std::FILE* tclTemplate = std::fopen(m_TemplateFileName.c_str(), "re");
-  const bool copied = tclTemplate != nullptr && copyStream(tclTemplate, script);
-  if (tclTemplate != nullptr) std::fclose(tclTemplate);
-  if (std::fclose(script) != 0 || !copied) {
+  const bool copied = appendTemplate(m_TemplateFileName.c_str(), script.get());
+  if (std::fclose(script.release()) != 0 || !copied) {
     discardScript(scriptName);
     reportMessage("ERROR: ProjectMgmt(pinforge) - Unable to open/read tcl template file\n",
                   Severity::Error);
@@ -232,9 +235,9 @@ bool RunContext::runTclGenerator() {
           "pinforge nor in a folder on PATH",
           Severity::Error);
     if (receiver.dropped() != 0)
-      std::fprintf(stderr, "[... %zu earlier bytes of the script's output not shown ...]\n",
-                   receiver.dropped());
-    std::fwrite(tail.data(), 1, tail.size(), stderr);
+      writeLine(stderr, "[... " + std::to_string(receiver.dropped()) +
+                            " earlier bytes of the script's output not shown ...]");
+    writeText(stderr, tail);
     reportMessage("ERROR: ProjectMgmt(pinforge)  Unable to invoke tcl file generator\n",
                   Severity::Error);
     return false;
@@ -244,6 +247,5 @@ bool RunContext::runTclGenerator() {
     Host::Interrupt::forget(scriptName);
   else
     discardScript(scriptName);
-  m_DesignData.reset();
   return !hasErrors();
 }

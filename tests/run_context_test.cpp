@@ -1,6 +1,5 @@
-// The run context's file opens, design-file registration, message reporting,
-// the registration of every "-lib" occurrence, the reading of -g, -D and -I, and what the
-// design data receives from the readers.
+// The run context's output extension and message reporting, the reading of -g, -D and -I, and
+// what the design data receives from the readers.
 #include "run_context.h"
 
 #include <gtest/gtest.h>
@@ -59,36 +58,8 @@ TEST_F(RunContextFiles, OutputExtensionIsEverythingAfterTheFirstDotOfTheWholeNam
     EXPECT_EQ(why.empty(), test.opens);
     EXPECT_EQ(context.m_OutputExt.str(), test.extension);
     EXPECT_EQ(context.m_OutputFileName.str(), test.name);
-    EXPECT_EQ(context.m_OutputStream != nullptr, test.opens);
+    EXPECT_EQ(context.outputStream() != nullptr, test.opens);
   }
-}
-
-TEST_F(RunContextFiles, OpensAndRegistrationsRecordTheNameWhetherOrNotTheFileOpens) {
-  ASSERT_TRUE(m_Dir.write("t.tpl", "text"));
-  ASSERT_TRUE(m_Dir.write("a.vhd", ""));
-  RunContext context;
-  std::string why;
-  EXPECT_TRUE(context.openTemplateFile("t.tpl", why));
-  EXPECT_NE(context.m_TemplateStream, nullptr);
-  std::FILE* log = context.openErrorFile("run.log", why);
-  EXPECT_NE(log, nullptr);
-  EXPECT_EQ(log, context.m_ErrorStream);
-  EXPECT_EQ(context.m_ErrorFileName.str(), "run.log");
-  EXPECT_TRUE(context.registerDesignFile("a.vhd"));
-
-  RunContext missing;
-  EXPECT_FALSE(missing.openTemplateFile("none.tpl", why));
-  EXPECT_EQ(missing.m_TemplateStream, nullptr);
-  EXPECT_EQ(missing.m_TemplateFileName.str(), "none.tpl");
-  EXPECT_EQ(missing.openErrorFile("no/such/dir.log", why), nullptr);
-  EXPECT_EQ(missing.m_ErrorFileName.str(), "no/such/dir.log");
-  // A design file that cannot be read stays registered so the lookup can tell about it.
-  missing.m_LibraryName = std::string_view("lib2");
-  EXPECT_FALSE(missing.registerDesignFile("absent.vhd"));
-  ASSERT_EQ(missing.m_Extractor.files().size(), 1u);
-  EXPECT_EQ(missing.m_Extractor.files()[0].library, "lib2");
-  EXPECT_EQ(missing.m_Extractor.files()[0].path, "absent.vhd");
-  EXPECT_EQ(missing.m_InputFileName.str(), "absent.vhd");
 }
 
 TEST(RunContextReport, EveryMessageIsPrintedCountedAndKept) {
@@ -136,37 +107,6 @@ struct ParsedLine {
   std::unique_ptr<UT_CMDARGS> parser;
 };
 
-TEST(RegisterLibraries, EachFileGoesToTheLibraryOfItsOwnOccurrence) {
-  const struct {
-    std::vector<std::string> args;
-    std::vector<std::pair<std::string, std::string>> files;
-    const char* library;
-    const char* input;
-  } cases[] = {
-      {{"-lib", "work", "a.vhd", "b.vhd", "-lib", "lib2", "c.vhd"},
-       {{"work", "a.vhd"}, {"work", "b.vhd"}, {"lib2", "c.vhd"}},
-       "lib2",
-       "c.vhd"},
-      {{"-lib", "mine", "x.v", "-module", "top", "-lib", "empty"},
-       {{"mine", "x.v"}},
-       "empty",
-       "x.v"},
-      {{"-module", "top"}, {}, "work", kUndefinedName},
-  };
-  for (const auto& test : cases) {
-    const ParsedLine line(test.args);
-    ASSERT_FALSE(line.parser->iserror());
-    RunContext context;
-    registerLibraries(context, *line.parser);
-    std::vector<std::pair<std::string, std::string>> files;
-    for (const auto& file : context.m_Extractor.files())
-      files.emplace_back(file.library, file.path);
-    EXPECT_EQ(files, test.files);
-    EXPECT_EQ(context.m_LibraryName.str(), test.library);
-    EXPECT_EQ(context.m_InputFileName.str(), test.input);
-  }
-}
-
 TEST(ReadScanSettings, EveryOccurrenceInOrderAndMalformedOnesReported) {
   using Overrides = std::vector<std::pair<std::string, std::string>>;
   using Macros = std::vector<std::pair<std::string, std::optional<std::string>>>;
@@ -212,7 +152,6 @@ std::unique_ptr<StbDataList> unitData(const ScratchDir& dir, const char* file, c
                                       bool verilog, ScanSettings settings) {
   if (!dir.write(file, design)) return nullptr;
   RunContext context;
-  context.m_Verilog = verilog ? 1 : 0;
   context.m_Language = verilog ? ScanExtractor::Verilog : ScanExtractor::Vhdl;
   context.m_ModuleName = "top";
   context.m_ProjectName = "demo";
@@ -220,8 +159,8 @@ std::unique_ptr<StbDataList> unitData(const ScratchDir& dir, const char* file, c
   context.registerDesignFile(dir.file(file).c_str());
   context.m_Extractor.configure(context.m_ScanSettings);
   context.m_Extractor.Parse(context.m_Language);
-  if (context.m_Extractor.findDesignUnit("work", "top", ScanExtractor::SearchAllLibraries) != 0 ||
-      !checkUnitHeader(context) || !prepareRun(context) || !buildPortList(context))
+  if (!context.m_Extractor.selectDesignUnit("work", "top", ScanExtractor::SearchAllLibraries) ||
+      !checkUnitHeader(context) || !createDesignData(context) || !buildPortList(context))
     return nullptr;
   buildUnitData(context);
   return std::move(context.m_DesignData);

@@ -6,13 +6,11 @@
 
 #include "platform/hostkit.h"
 
-std::unique_ptr<Host_MsgManData> Host_MsgManData::createObject(const char* module,
+std::unique_ptr<Host_MsgManData> Host_MsgManData::createObject(const char* /*module*/,
                                                                const char* /*sourceFile*/,
                                                                int /*line*/,
                                                                const char* /*revision*/) {
-  std::unique_ptr<Host_MsgManData> manager(new Host_MsgManData());
-  manager->m_Module = module != nullptr ? module : "";
-  return manager;
+  return std::unique_ptr<Host_MsgManData>(new Host_MsgManData());
 }
 
 void Host_MsgManData::issueError(const char* text) {

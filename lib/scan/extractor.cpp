@@ -32,13 +32,14 @@ const std::vector<std::string>& ScanExtractor::unreadableFiles() const {
   return m_Diagnostics->unreadableFiles();
 }
 
-int ScanExtractor::findDesignUnit(const char* library, const char* unit, DesignUnitSearch search) {
+bool ScanExtractor::selectDesignUnit(const char* library, const char* unit,
+                                     DesignUnitSearch search) {
   m_UnitFound = false;
   m_UnitErrors = false;
   m_Ports.reset();
   m_Generics.clear();
   m_Context.clear();
-  if (!m_Reader || unit == nullptr) return 1;
+  if (!m_Reader || unit == nullptr) return false;
   std::string wanted = library ? library : "work";
   std::vector<std::string> order{wanted};
   if (search == SearchAllLibraries)
@@ -47,10 +48,10 @@ int ScanExtractor::findDesignUnit(const char* library, const char* unit, DesignU
   for (const std::string& lib : order) {
     if (m_Reader->selectUnit(lib, unit)) {
       m_UnitFound = true;
-      return 0;
+      return true;
     }
   }
-  return 1;
+  return false;
 }
 
 ScanPortList* ScanExtractor::getPorts() {

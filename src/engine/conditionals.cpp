@@ -144,7 +144,7 @@ std::optional<bool> Forge::hasMatchingPort(int kind, std::string_view pattern) {
   for (const List_element* e = m_DataList->m_Head; e != nullptr && !found; e = e->m_Next) {
     const auto* port =
         static_cast<const PortRecord*>(static_cast<const Object_element*>(e)->m_Object);
-    if (port == nullptr || compareSignalName(port->m_Name, pattern) != 0) continue;
+    if (port == nullptr || !signalNameMatches(port->m_Name, pattern)) continue;
     if (widthUnknown(selection, *port)) return std::nullopt;
     found = selection.selects(port->m_Dir, port->isBus());
   }
@@ -158,7 +158,7 @@ bool Forge::hasMatchingGeneric(std::string_view pattern) {
     return known->second;
   bool found = false;
   for (const GenericRecord& generic : m_DataList->m_Generics)
-    if (compareSignalName(generic.m_Name, pattern) == 0) found = true;
+    if (signalNameMatches(generic.m_Name, pattern)) found = true;
   m_MatchResults.emplace(key, found);
   return found;
 }
@@ -302,12 +302,12 @@ bool Forge::doEndIf() {
   return false;
 }
 
-int Forge::compareSignalName(std::string_view name, std::string_view pattern) const {
-  if (pattern == "*") return 0;
+bool Forge::signalNameMatches(std::string_view name, std::string_view pattern) const {
+  if (pattern == "*") return true;
   std::string resolved(pattern);
   const size_t common = name.size() < resolved.size() ? name.size() : resolved.size();
   for (size_t i = 0; i < common; ++i) {
     if (resolved[i] == '?') resolved[i] = name[i];
   }
-  return compareBytes(name, resolved, !m_CaseSensitiveIf);
+  return compareBytes(name, resolved, !m_CaseSensitiveIf) == 0;
 }

@@ -114,7 +114,10 @@ class Forge {
   bool addCondition(uint32_t value, int index);
   /// After a template that ran to its end: the warning about a block still open, if any.
   void warnAboutOpenBlock();
-  int compareSignalName(std::string_view name, std::string_view pattern) const;
+  /// Whether `name` matches `pattern`: "*" alone matches any name; any other pattern matches a
+  /// name of its length equal to it where each "?" stands for any one character. Letter case
+  /// counts unless m_CaseSensitiveIf is off.
+  bool signalNameMatches(std::string_view name, std::string_view pattern) const;
   /// Whether a port selected by port-list keyword `kind` has a name matching `pattern` (the
   /// @IFHAS rules); null (after reporting) when deciding needs a range that is unknown.
   std::optional<bool> hasMatchingPort(int kind, std::string_view pattern);

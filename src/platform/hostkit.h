@@ -228,6 +228,8 @@ class UT_TIME {
 /// The message manager: texts go to standard error.
 class Host_MsgManData {
  public:
+  /// A manager for messages from `module`, raised in `sourceFile` at `line` of `revision`.
+  /// Texts go out as they are given, so none of the four is kept.
   static std::unique_ptr<Host_MsgManData> createObject(const char* module, const char* sourceFile,
                                                        int line, const char* revision);
   /// Writes `text` to standard error.
@@ -237,7 +239,6 @@ class Host_MsgManData {
 
  private:
   Host_MsgManData() = default;
-  std::string m_Module;
 };
 
 /// One occurrence of a switch on the command line, with its arguments.

@@ -166,9 +166,9 @@ class ScanExtractor {
   /// command-line order; their reasons went to standard error. Valid after Parse.
   const std::vector<std::string>& unreadableFiles() const;
 
-  /// Looks `unit` up. Returns 0 when found (it becomes the unit getPorts reports), nonzero
-  /// otherwise.
-  int findDesignUnit(const char* library, const char* unit, DesignUnitSearch search);
+  /// Looks `unit` up in `library`, then, with SearchAllLibraries, in the others in the order
+  /// of their registration. True when found: it becomes the unit getPorts reports.
+  bool selectDesignUnit(const char* library, const char* unit, DesignUnitSearch search);
 
   /// The ports of the unit found last; an empty list when none was found. The list stays
   /// owned by the extractor.

@@ -136,7 +136,7 @@ TEST(SignalName, PatternsAndCase) {
   Forge forge(nullptr, nullptr, nullptr, &data);
   for (const NameRow& row : rows) {
     forge.m_CaseSensitiveIf = row.caseSensitive;
-    EXPECT_EQ(forge.compareSignalName(row.name, row.pattern) == 0, row.matches)
+    EXPECT_EQ(forge.signalNameMatches(row.name, row.pattern), row.matches)
         << row.name << " vs " << row.pattern;
   }
 }

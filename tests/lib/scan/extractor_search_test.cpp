@@ -55,7 +55,7 @@ TEST_P(LibrarySearch, FindsTheRightUnit) {
     extractor.addDesignFile(library, vhdl_test::fixture(file).c_str(), ScanExtractor::Vhdl);
   extractor.Parse(ScanExtractor::Vhdl);
   std::string outcome =
-      extractor.findDesignUnit(c.library, "TWIN", c.search) == 0 ? "found:" : "none:";
+      extractor.selectDesignUnit(c.library, "TWIN", c.search) ? "found:" : "none:";
   const ScanPortList* ports = extractor.getPorts();
   for (const ScanPort* p = ports->firstPort(); p != nullptr; p = ports->nextPort(p))
     outcome += std::string(" ") + p->name();
@@ -67,7 +67,7 @@ INSTANTIATE_TEST_SUITE_P(Scan, LibrarySearch, testing::ValuesIn(kCases), vhdl_te
 TEST(Extractor, GetPortsBeforeAnyLookupIsEmpty) {
   ScanExtractor extractor;
   EXPECT_EQ(extractor.getPorts()->size(), 0u);
-  EXPECT_NE(extractor.findDesignUnit("work", "x", ScanExtractor::SearchAllLibraries), 0);
+  EXPECT_FALSE(extractor.selectDesignUnit("work", "x", ScanExtractor::SearchAllLibraries));
 }
 
 }  // namespace

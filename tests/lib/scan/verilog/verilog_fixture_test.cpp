@@ -149,7 +149,7 @@ TEST_P(VerilogFixtureTest, ReportsEveryPort) {
   for (const char* file : c.files)
     extractor.addDesignFile("work", fixture(file).c_str(), ScanExtractor::Verilog);
   extractor.Parse(ScanExtractor::Verilog);
-  ASSERT_EQ(extractor.findDesignUnit("work", c.unit, ScanExtractor::SearchAllLibraries), 0);
+  ASSERT_TRUE(extractor.selectDesignUnit("work", c.unit, ScanExtractor::SearchAllLibraries));
   ScanPortList* ports = extractor.getPorts();
   ASSERT_EQ(ports->size(), c.ports.size());
   const ScanPort* port = ports->firstPort();
@@ -181,8 +181,8 @@ TEST(VerilogLookupTest, UnknownUnitsAndPackagesAreNotFound) {
   ScanExtractor extractor;
   extractor.addDesignFile("work", fixture("packages.sv").c_str(), ScanExtractor::Verilog);
   extractor.Parse(ScanExtractor::Verilog);
-  EXPECT_NE(extractor.findDesignUnit("work", "bus_pkg", ScanExtractor::SearchAllLibraries), 0);
-  EXPECT_NE(extractor.findDesignUnit("work", "PKG_USER", ScanExtractor::SearchAllLibraries), 0);
+  EXPECT_FALSE(extractor.selectDesignUnit("work", "bus_pkg", ScanExtractor::SearchAllLibraries));
+  EXPECT_FALSE(extractor.selectDesignUnit("work", "PKG_USER", ScanExtractor::SearchAllLibraries));
   EXPECT_EQ(extractor.getPorts()->size(), 0u);
 }
 
@@ -191,10 +191,10 @@ TEST(VerilogLookupTest, LibrariesAreSearchedInOrder) {
   extractor.addDesignFile("lib_a", fixture("nonansi_basic.v").c_str(), ScanExtractor::Verilog);
   extractor.addDesignFile("work", fixture("ansi_basic.v").c_str(), ScanExtractor::Verilog);
   extractor.Parse(ScanExtractor::Verilog);
-  EXPECT_NE(
-      extractor.findDesignUnit("work", "nonansi_basic", ScanExtractor::SearchNamedLibraryOnly), 0);
-  EXPECT_EQ(extractor.findDesignUnit("work", "nonansi_basic", ScanExtractor::SearchAllLibraries),
-            0);
+  EXPECT_FALSE(
+      extractor.selectDesignUnit("work", "nonansi_basic", ScanExtractor::SearchNamedLibraryOnly));
+  EXPECT_TRUE(
+      extractor.selectDesignUnit("work", "nonansi_basic", ScanExtractor::SearchAllLibraries));
   EXPECT_EQ(extractor.getPorts()->size(), 5u);
 }
 

@@ -308,7 +308,7 @@ TEST_P(YosysDifferential, PortsMatchYosys) {
   extractor.Parse(ScanExtractor::Verilog);
   for (const auto& [name, module] : elaborated) {
     const std::string where = file + ": module " + name;
-    if (extractor.findDesignUnit("work", name.c_str(), ScanExtractor::SearchAllLibraries) != 0) {
+    if (!extractor.selectDesignUnit("work", name.c_str(), ScanExtractor::SearchAllLibraries)) {
       ADD_FAILURE() << where << ": not found by ours";
       continue;
     }

@@ -144,8 +144,7 @@ std::map<std::string, std::string> readOurs(const std::string& file, const char*
   extractor.configure(std::move(settings));
   extractor.addDesignFile("work", file.c_str(), ScanExtractor::Verilog);
   extractor.Parse(ScanExtractor::Verilog);
-  if (extractor.findDesignUnit("work", module, ScanExtractor::SearchAllLibraries) != 0)
-    return ranges;
+  if (!extractor.selectDesignUnit("work", module, ScanExtractor::SearchAllLibraries)) return ranges;
   const ScanPortList& ports = *extractor.getPorts();
   for (const ScanPort* port = ports.firstPort(); port != nullptr; port = ports.nextPort(port)) {
     std::string range = oursRange(*port);

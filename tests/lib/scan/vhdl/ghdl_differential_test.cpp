@@ -392,8 +392,8 @@ TEST_P(GhdlDifferential, PortsMatchGhdl) {
       continue;
     }
     ++compared;
-    const bool found = extractor.findDesignUnit("work", entity.name.c_str(),
-                                                ScanExtractor::SearchAllLibraries) == 0;
+    const bool found =
+        extractor.selectDesignUnit("work", entity.name.c_str(), ScanExtractor::SearchAllLibraries);
     compareEntity(file + ": entity " + entity.name + " (line " + std::to_string(entity.line) +
                       (found ? ")" : "), not found by ours"),
                   entity, parseReports(run.output, entity.ports.size()), *extractor.getPorts());

@@ -345,8 +345,8 @@ TEST(VhdlDescription, ReachesTheExtractorWithItsSettings) {
                           ScanExtractor::Vhdl);
   testing::internal::CaptureStderr();
   extractor.Parse(ScanExtractor::Vhdl);
-  ASSERT_EQ(extractor.findDesignUnit("work", "DESCRIBE_OPEN", ScanExtractor::SearchAllLibraries),
-            0);
+  ASSERT_TRUE(
+      extractor.selectDesignUnit("work", "DESCRIBE_OPEN", ScanExtractor::SearchAllLibraries));
   ScanPortList* ports = extractor.getPorts();
   testing::internal::GetCapturedStderr();
   ASSERT_EQ(ports->size(), 3u);
