@@ -11,39 +11,30 @@
 
 namespace {
 
+using handlers_test::Design;
 using handlers_test::errorAt;
-using handlers_test::PortSpec;
-using Ports = std::vector<PortSpec>;
-
-struct Row {
-  const char* name;
-  Ports ports;
-  std::string templateText;
-  std::string output;
-  std::string message;  // empty: the run finishes without error
-};
-
-class TemplateTest : public ::testing::TestWithParam<Row> {};
+using handlers_test::Row;
+using handlers_test::rowName;
+using handlers_test::TemplateTest;
 
 TEST_P(TemplateTest, WritesWholeOutputAndResult) {
   const Row& row = GetParam();
-  const handlers_test::Run run = handlers_test::runTemplate(row.templateText, row.ports);
+  const handlers_test::Run run = handlers_test::runOn(row.templateText, row.design);
   EXPECT_EQ(run.output, row.output);
   const bool ok = row.message.empty();
   EXPECT_EQ(run.completed, ok);
   EXPECT_EQ(run.status, ok ? 0u : 2u);
   EXPECT_EQ(run.message, ok ? handlers_test::kNoError : row.message);
-  EXPECT_TRUE(run.warnings.empty()) << run.warnings.front();
+  EXPECT_EQ(run.warnings, row.warning.empty() ? std::vector<std::string>{}
+                                              : std::vector<std::string>{row.warning});
 }
 
-std::string rowName(const ::testing::TestParamInfo<Row>& info) { return info.param.name; }
-
-const Ports kNone;
-const Ports kAbc = {{"a", -1, -1, 'I'}, {"b", -1, -1, 'I'}, {"c", -1, -1, 'I'}};
-const Ports kAbcd = {
-    {"a", -1, -1, 'I'}, {"b", -1, -1, 'I'}, {"c", -1, -1, 'I'}, {"d", -1, -1, 'I'}};
-const Ports kDesign = {{"clk", -1, -1, 'I'}, {"data", 7, 0, 'I'}, {"q", -1, -1, 'O'}};
-const Ports kSmallBus = {{"d", 1, 0, 'I'}, {"q", -1, -1, 'O'}};
+const Design kNone;
+const Design kAbc{{{"a", -1, -1, 'I'}, {"b", -1, -1, 'I'}, {"c", -1, -1, 'I'}}};
+const Design kAbcd{
+    {{"a", -1, -1, 'I'}, {"b", -1, -1, 'I'}, {"c", -1, -1, 'I'}, {"d", -1, -1, 'I'}}};
+const Design kDesign{{{"clk", -1, -1, 'I'}, {"data", 7, 0, 'I'}, {"q", -1, -1, 'O'}}};
+const Design kSmallBus{{{"d", 1, 0, 'I'}, {"q", -1, -1, 'O'}}};
 
 std::string unknown(const std::string& token) {
   return errorAt(1, "Keyword: " + token + " is not a valid Variable or Directive name.");
@@ -52,8 +43,8 @@ std::string unknown(const std::string& token) {
 INSTANTIATE_TEST_SUITE_P(
     Tokens, TemplateTest,
     ::testing::Values(
-        Row{"CommentsVanish", kNone, "a@comment x = y@b@COMMENTARY@c@comment open", "abc", ""},
-        Row{"CaseLeavesFixedTextAlone", kNone, "@UPCASE@%ext%@CR@x@AT@", "VHD\nx@", ""},
+        Row{"CommentsVanish", kNone, "a@comment x = y@b@COMMENTARY@c@comment open", "abc"},
+        Row{"CaseLeavesFixedTextAlone", kNone, "@UPCASE@%ext%@CR@x@AT@", "VHD\nx@"},
         Row{"UnknownVariable", kNone, "ok %foo% never", "ok ", unknown("%foo%")},
         Row{"ClosedByOtherMark", kNone, "%date@x", "", unknown("%date@")},
         Row{"DoublePercent", kNone, "50%% off", "50", unknown("%%")},
@@ -87,30 +78,29 @@ const std::string kWidth = errorAt(1, kSet + "OUTLINEWIDTH must be assigned an i
 INSTANTIATE_TEST_SUITE_P(
     Set, TemplateTest,
     ::testing::Values(
-        Row{"DelimiterKeepsBlanks", kAbc, "@SET sigdelim=; @%iport%", "a; b; c", ""},
-        Row{"ValueMayHoldEquals", kAbc, "@set SIGDELIM==+@%iport%", "a=+b=+c", ""},
-        Row{"EmptyValue", kAbc, "@SET sigdelim=@%iport%", "abc", ""},
-        Row{"TabAfterWord", kAbc, "@SET\tsigdelim=;@%iport%", "a;b;c", ""},
-        Row{"NewlineThenBlank", kAbc, "@SET\n sigdelim=;@%iport%", "a;b;c", ""},
+        Row{"DelimiterKeepsBlanks", kAbc, "@SET sigdelim=; @%iport%", "a; b; c"},
+        Row{"ValueMayHoldEquals", kAbc, "@set SIGDELIM==+@%iport%", "a=+b=+c"},
+        Row{"EmptyValue", kAbc, "@SET sigdelim=@%iport%", "abc"},
+        Row{"TabAfterWord", kAbc, "@SET\tsigdelim=;@%iport%", "a;b;c"},
+        Row{"NewlineThenBlank", kAbc, "@SET\n sigdelim=;@%iport%", "a;b;c"},
         Row{"NulInValue", kAbc, std::string("@SET sigdelim=\0;\0@%iport%", 25),
-            std::string("a\0;\0b\0;\0c", 9), ""},
-        Row{"WidthSkipsBlanksAndSign", kAbc, "@SET outlinewidth=\n +3 @%iport%", "a, b, \nc", ""},
-        Row{"WidthClampsHigh", kAbc, "@SET outlinewidth=2147483648@%iport%", "a, b, c", ""},
+            std::string("a\0;\0b\0;\0c", 9)},
+        Row{"WidthSkipsBlanksAndSign", kAbc, "@SET outlinewidth=\n +3 @%iport%", "a, b, \nc"},
+        Row{"WidthClampsHigh", kAbc, "@SET outlinewidth=2147483648@%iport%", "a, b, c"},
         Row{"WidthClampsLow", kAbc, "@SET outlinewidth=-4294967295@@SET sigdelim=,\n@%iport%",
-            "a,\n\nb,\n\nc", ""},
+            "a,\n\nb,\n\nc"},
         Row{"ExpandBusSwitch", kSmallBus,
-            "@SET expandbus=ON@%ibusport%|@SET EXPANDBUS=off@%ibusport%", "d_1_, d_0_|d", ""},
+            "@SET expandbus=ON@%ibusport%|@SET EXPANDBUS=off@%ibusport%", "d_1_, d_0_|d"},
         Row{"ShowRangeValues", kSmallBus,
             "@SET showrange=on@%ibusport%|@SET showrange=aspostfix@@SET showrange=off@%ibusport%|"
             "@SET showrange=on@%ibusport%|@SET showrange=ASPREFIX@%ibusport%",
-            "[1:0] d|d|d[1:0]|[1:0] d", ""},
+            "[1:0] d|d|d[1:0]|[1:0] d"},
         Row{"MapSwitch", kSmallBus, "@MAPSIGNAL q TO r@@SET map=on@%oport%@SET Map=OFF@%oport%",
-            "rq", ""},
+            "rq"},
         Row{"CaseValues",
-            {{"Data", -1, -1, 'I'}},
+            {{{"Data", -1, -1, 'I'}}},
             "@SET case=invcase@%port%|@SET CASE=LOWCASE@%port%|@UPCASE@@SET case=samecase@%port%",
-            "dATA|data|Data",
-            ""},
+            "dATA|data|Data"},
         Row{"NoBlankAfterWord", kNone, "x@SETsigdelim=;@", "x", errorAt(1, kSetForm)},
         Row{"NewlineAfterWord", kNone, "@SET\nsigdelim=;@", "", errorAt(2, kSetForm)},
         Row{"BlankThenEnd", kNone, "@SET ", "", errorAt(1, kSetForm)},
@@ -131,17 +121,16 @@ INSTANTIATE_TEST_SUITE_P(
 // width.
 INSTANTIATE_TEST_SUITE_P(
     Wrapping, TemplateTest,
-    ::testing::Values(Row{"BreaksAfterDelimiter", kAbcd, "@SET outlinewidth=5@%iport%",
-                          "a, b, \nc, d", ""},
-                      Row{"HeaderValueEqualToDelimiter", kNone,
-                          "@SET sigdelim=vhd@@SET outlinewidth=3@ab%ext%c", "abvhd\nc", ""},
-                      Row{"OnlyWholeDelimiterCounts", kNone,
-                          "@SET outlinewidth=0@, x@SET sigdelim=VHD@%ext%", ", xvhd", ""},
-                      Row{"SuppressedDelimiterStillBreaks", kNone,
-                          "@SUPPRESNEWLINE@@SET outlinewidth=0@@SET sigdelim=\n@%ext%\n%ext%\tx\n",
-                          "vhd\nvhdx", ""},
-                      Row{"EmptyDelimiterMatchesEmptyWrites", kAbc,
-                          "@SET outlinewidth=-1@@SET sigdelim=@%iport%", "a\nb\nc\n", ""}),
+    ::testing::Values(
+        Row{"BreaksAfterDelimiter", kAbcd, "@SET outlinewidth=5@%iport%", "a, b, \nc, d"},
+        Row{"HeaderValueEqualToDelimiter", kNone, "@SET sigdelim=vhd@@SET outlinewidth=3@ab%ext%c",
+            "abvhd\nc"},
+        Row{"OnlyWholeDelimiterCounts", kNone, "@SET outlinewidth=0@, x@SET sigdelim=VHD@%ext%",
+            ", xvhd"},
+        Row{"SuppressedDelimiterStillBreaks", kNone,
+            "@SUPPRESNEWLINE@@SET outlinewidth=0@@SET sigdelim=\n@%ext%\n%ext%\tx\n", "vhd\nvhdx"},
+        Row{"EmptyDelimiterMatchesEmptyWrites", kAbc, "@SET outlinewidth=-1@@SET sigdelim=@%iport%",
+            "a\nb\nc\n"}),
     rowName);
 
 const std::string kIfForm =
@@ -172,27 +161,27 @@ INSTANTIATE_TEST_SUITE_P(
         Row{"HasAndHasNot", kDesign,
             "@IFHAS IPORT=clk@1@ENDIF@@IFNHAS IPORT=clk@2@ENDIF@@IFHAS OPORT=clk@3@ENDIF@"
             "@IFNHAS OPORT=clk@4@ENDIF@",
-            "14", ""},
+            "14"},
         Row{"Kinds", kDesign,
             "@IFHAS PORT=*@1@ENDIF@@IFHAS NODE=*@2@ENDIF@@IFHAS BUSPORT=*@3@ENDIF@"
             "@IFHAS OBUSPORT=*@4@ENDIF@@IFHAS\tiport=clk@5@ENDIF@@ifnhas SignaL=zz@6@endif@",
-            "1356", ""},
+            "1356"},
         Row{"Wildcards", kDesign,
             "@IFHAS IPORT=d?ta@1@ENDIF@@IFHAS IPORT=????@2@ENDIF@@IFHAS IPORT=dat??@3@ENDIF@"
             "@IFHAS IPORT=d*@4@ENDIF@@IFHAS OPORT=q?@5@ENDIF@",
-            "12", ""},
-        Row{"BlankBeforeClosingIsPartOfName", kDesign, "@IFHAS IPORT=clk @y@ENDIF@", "", ""},
+            "12"},
+        Row{"BlankBeforeClosingIsPartOfName", kDesign, "@IFHAS IPORT=clk @y@ENDIF@", ""},
         Row{"Nesting", kDesign,
             "A@IFHAS IPORT=x@B@IFHAS IPORT=clk@C@ENDIF@D@ENDIF@E"
             "@IFHAS IPORT=clk@F@IFHAS IPORT=y@G@ENDIF@H@ENDIF@",
-            "AEFH", ""},
+            "AEFH"},
         Row{"MalformedIfInFailedBlockStillNests", kDesign,
-            "<@IFHAS IPORT=zz@@IFHAS@@IFNHAS FOO@@ENDIF@@ENDIF@x@ENDIF@>", "<>", ""},
+            "<@IFHAS IPORT=zz@@IFHAS@@IFNHAS FOO@@ENDIF@@ENDIF@x@ENDIF@>", "<>"},
         Row{"BusFoundByNameWhenExpanding", kDesign,
             "@IFHAS IPORT=data@a@ENDIF@@EXPANDBUS@@IFHAS IPORT=data@b@ENDIF@"
             "@IFHAS IPORT=data_7_@c@ENDIF@",
-            "ab", ""},
-        Row{"NineLevels", kDesign, nested("@IFHAS PORT=*@", 9), "x", ""},
+            "ab"},
+        Row{"NineLevels", kDesign, nested("@IFHAS PORT=*@", 9), "x"},
         Row{"TenthLevel", kDesign, nested("@IFHAS PORT=*@", 10), "", kDepth},
         Row{"TenthLevelInFailedBlock", kDesign, nested("@IFHAS PORT=zz@", 10), "", kDepth},
         Row{"EndIfOutside", kDesign, "a\n@ENDIF@b", "a\n", errorAt(2, kEndIf)},
@@ -210,29 +199,27 @@ INSTANTIATE_TEST_SUITE_P(
     Mapping, TemplateTest,
     ::testing::Values(
         Row{"MapSwitches", kDesign,
-            "@MAPSIGNAL clk TO s@%iscalarport%@MAP@%iscalarport%@NOMAP@%iscalarport%", "clksclk",
-            ""},
-        Row{"MapBeforeMapping", kDesign, "@MAP@@MAPSIGNAL clk TO s@%iscalarport%", "s", ""},
+            "@MAPSIGNAL clk TO s@%iscalarport%@MAP@%iscalarport%@NOMAP@%iscalarport%", "clksclk"},
+        Row{"MapBeforeMapping", kDesign, "@MAP@@MAPSIGNAL clk TO s@%iscalarport%", "s"},
         Row{"AnyWordAndSeparators", kDesign,
-            "@MAPSIGNAL   clk   AS a@@MAPSIGNAL\tq\tTO\tb@@MAP@%iscalarport%%oport%", "ab", ""},
-        Row{"NewNameKeepsBlank", kDesign, "@MAPSIGNAL clk TO  s@@MAP@[%iscalarport%]", "[ s]", ""},
+            "@MAPSIGNAL   clk   AS a@@MAPSIGNAL\tq\tTO\tb@@MAP@%iscalarport%%oport%", "ab"},
+        Row{"NewNameKeepsBlank", kDesign, "@MAPSIGNAL clk TO  s@@MAP@[%iscalarport%]", "[ s]"},
         Row{"NameComparedWithCase", kDesign,
-            "@SET CASESENSITIVEIF=OFF@@MAPSIGNAL CLK TO s@@MAP@%iscalarport%", "clk", ""},
+            "@SET CASESENSITIVEIF=OFF@@MAPSIGNAL CLK TO s@@MAP@%iscalarport%", "clk"},
         Row{"LastWinsOnlyDeclaredNamesSearched", kDesign,
             "@MAPSIGNAL clk TO a@@MAPSIGNAL clk TO b@@MAPSIGNAL b TO c@@MAPSIGNAL zz TO d@"
             "@MAP@%signal%",
-            "b, data, q", ""},
+            "b, data, q"},
         Row{"ConditionalUsesDeclaredName", kDesign,
-            "@MAPSIGNAL clk TO s@@MAP@@IFHAS IPORT=clk@1@ENDIF@@IFHAS IPORT=s@2@ENDIF@", "1", ""},
+            "@MAPSIGNAL clk TO s@@MAP@@IFHAS IPORT=clk@1@ENDIF@@IFHAS IPORT=s@2@ENDIF@", "1"},
         Row{"BusMappingReachesBits", kDesign,
             "@MAPSIGNAL data TO b@@MAP@%ibusport%|@EXPANDBUS@@UPCASE@%ibusport%",
-            "b|B_7_, B_6_, B_5_, B_4_, B_3_, B_2_, B_1_, B_0_", ""},
+            "b|B_7_, B_6_, B_5_, B_4_, B_3_, B_2_, B_1_, B_0_"},
         Row{"MappedWhileExpanding", kDesign,
             "@EXPANDBUS@@MAPSIGNAL data TO b@@MAP@%ibusport%|@NOEXPANDBUS@%ibusport%",
-            "b_7_, b_6_, b_5_, b_4_, b_3_, b_2_, b_1_, b_0_|b", ""},
+            "b_7_, b_6_, b_5_, b_4_, b_3_, b_2_, b_1_, b_0_|b"},
         Row{"MappingInFailedBlockDropped", kDesign,
-            "@IFHAS PORT=zz@@MAPSIGNAL clk@@MAPSIGNAL clk TO a@@ENDIF@@MAP@%iscalarport%", "clk",
-            ""},
+            "@IFHAS PORT=zz@@MAPSIGNAL clk@@MAPSIGNAL clk TO a@@ENDIF@@MAP@%iscalarport%", "clk"},
         Row{"NoConnectingWord", kDesign, "@MAPSIGNAL clk s@", "", errorAt(1, kMapForm)},
         Row{"NoArguments", kDesign, "a\n\n@MAPSIGNAL@", "a\n\n", errorAt(3, kMapForm)},
         Row{"EmptyNewName", kDesign, "@MAPSIGNAL clk TO @", "", errorAt(1, kMapForm)}),
@@ -241,46 +228,39 @@ INSTANTIATE_TEST_SUITE_P(
 INSTANTIATE_TEST_SUITE_P(
     PortLists, TemplateTest,
     ::testing::Values(
-        Row{"OnePortOrNone", {{"a", -1, -1, 'I'}}, "[%iport%][%oport%]", "[a][]", ""},
+        Row{"OnePortOrNone", {{{"a", -1, -1, 'I'}}}, "[%iport%][%oport%]", "[a][]"},
         Row{"NodesOnlyInNodeAndSignal",
-            {{"a", -1, -1, 'I'}, {"nb", 1, 0, 'N'}},
+            {{{"a", -1, -1, 'I'}, {"nb", 1, 0, 'N'}}},
             "%node%;%signal%;%port%;%busport%",
-            "nb;a, nb;a;",
-            ""},
+            "nb;a, nb;a;"},
         Row{"KeepsListOrder",
-            {{"x", -1, -1, 'O'}, {"y", -1, -1, 'B'}, {"z", -1, -1, 'O'}},
+            {{{"x", -1, -1, 'O'}, {"y", -1, -1, 'B'}, {"z", -1, -1, 'O'}}},
             "%obport%",
-            "x, y, z",
-            ""},
+            "x, y, z"},
         Row{"RangesAndBits",
-            {{"d", 1, 0, 'I'}, {"a", 0, 1, 'I'}, {"en", -1, -1, 'I'}, {"x", 0, 0, 'I'}},
+            {{{"d", 1, 0, 'I'}, {"a", 0, 1, 'I'}, {"en", -1, -1, 'I'}, {"x", 0, 0, 'I'}}},
             "@SHOWRANGE@%port%|@SET SHOWRANGE=AsPostfix@%port%|@EXPANDBUS@%port%",
             "[1:0] d, [0:1] a, en, [0:0] x|d[1:0], a[0:1], en, x[0:0]|"
-            "d_1_, d_0_, a_0_, a_1_, en, x_0_",
-            ""},
+            "d_1_, d_0_, a_0_, a_1_, en, x_0_"},
         Row{"EmptyBrackets",
-            {{"d", 7, 6, 'I'}},
+            {{{"d", 7, 6, 'I'}}},
             "@SET BUSLEFT=@@SET BUSRIGHT=@@EXPANDBUS@%port%",
-            "d7, d6",
-            ""},
+            "d7, d6"},
         Row{"NegativeIndices",
-            {{"n", 3, -2, 'I'}},
+            {{{"n", 3, -2, 'I'}}},
             "@EXPANDBUS@%port%|@NOEXPANDBUS@@SHOWRANGE@%port%",
-            "n_3_, n_2_, n_1_, n_0_, n, n_-2_|[3:-2] n",
-            ""},
+            "n_3_, n_2_, n_1_, n_0_, n, n_-2_|[3:-2] n"},
         Row{"RangeEnds",
-            {{"h", INT_MAX - 1, INT_MAX, 'I'}, {"l", INT_MIN + 1, INT_MIN, 'I'}},
+            {{{"h", INT_MAX - 1, INT_MAX, 'I'}, {"l", INT_MIN + 1, INT_MIN, 'I'}}},
             "@EXPANDBUS@%port%",
-            "h_2147483646_, h_2147483647_, l_-2147483647_, l_-2147483648_",
-            ""},
+            "h_2147483646_, h_2147483647_, l_-2147483647_, l_-2147483648_"},
         Row{"CaseSparesDelimiter",
-            {{"Data", -1, -1, 'I'}, {"x", -1, -1, 'I'}},
+            {{{"Data", -1, -1, 'I'}, {"x", -1, -1, 'I'}}},
             "@INVCASE@@SET SIGDELIM=aB@%port%",
-            "dATAaBX",
-            ""}),
+            "dATAaBX"}),
     rowName);
 
-const Ports kTyped = {{"en", -1, -1, 'I'}, {"data", 7, 0, 'I'}, {"addr", 0, 3, 'I'}};
+const Design kTyped{{{"en", -1, -1, 'I'}, {"data", 7, 0, 'I'}, {"addr", 0, 3, 'I'}}};
 const std::string kIterator =
     errorAt(1, "Iterator must be one of: %IPORT% %OBPORT% %OPORT% %BPORT% %PORT% %NODE% %SIGNAL%");
 const std::string kUnterminated = "@ITERATE@ must be terminated by @ENDITERATE@!";
@@ -288,63 +268,57 @@ const std::string kUnterminated = "@ITERATE@ must be terminated by @ENDITERATE@!
 INSTANTIATE_TEST_SUITE_P(
     Iteration, TemplateTest,
     ::testing::Values(
-        Row{"Passes", kAbc, "@iterate@%IPort%<@ITERATOR@>@enditerate@", "<a>, <b>, <c>", ""},
-        Row{"NoPortNoPass", kAbc, "x@ITERATE@%NODE%<@ITERATOR@>@ENDITERATE@y", "xy", ""},
-        Row{"EmptyBodyOnlyDelimiters", kAbc, "@ITERATE@%PORT%@ENDITERATE@", ", , ", ""},
+        Row{"Passes", kAbc, "@iterate@%IPort%<@ITERATOR@>@enditerate@", "<a>, <b>, <c>"},
+        Row{"NoPortNoPass", kAbc, "x@ITERATE@%NODE%<@ITERATOR@>@ENDITERATE@y", "xy"},
+        Row{"EmptyBodyOnlyDelimiters", kAbc, "@ITERATE@%PORT%@ENDITERATE@", ", , "},
         Row{"DelimiterAfterBody", kAbc, "@ITERATE@%IPORT%@ITERATOR@;\n@ENDITERATE@",
-            "a;\n, b;\n, c;\n", ""},
+            "a;\n, b;\n, c;\n"},
         Row{"DelimiterSetInBody", kAbc,
-            "@ITERATE@%IPORT%@ITERATOR@@SET SIGDELIM=;@@ENDITERATE@|%iport%", "a;b;c|a;b;c", ""},
+            "@ITERATE@%IPORT%@ITERATOR@@SET SIGDELIM=;@@ENDITERATE@|%iport%", "a;b;c|a;b;c"},
         Row{"CaseFromBodyPersists", kAbc, "@ITERATE@%IPORT%@ITERATOR@@UPCASE@@ENDITERATE@",
-            "a, B, C", ""},
+            "a, B, C"},
         Row{"BodyKeepsBlanks",
-            {{"a", -1, -1, 'I'}},
+            {{{"a", -1, -1, 'I'}}},
             "@ITERATE@%IPORT% @ITERATOR@\t@TAB@\n@ENDITERATE@",
-            " a\t\t\n",
-            ""},
+            " a\t\t\n"},
         Row{"VhdlTypes", kTyped,
             "@SET VHDL_BUSTYPE=bit_vector@@SET VHDL_NETTYPE=bit@@SET SIGDELIM=\n@"
             "@ITERATE@%IPORT%@ITERATOR@ : in @VHDL_TYPEDEC@;@ENDITERATE@",
-            "en : in bit;\ndata : in bit_vector(7 downto 0);\naddr : in bit_vector(0 to 3);", ""},
+            "en : in bit;\ndata : in bit_vector(7 downto 0);\naddr : in bit_vector(0 to 3);"},
         Row{"VhdlBounds",
-            {{"z", 0, 0, 'I'}, {"n", 3, -2, 'I'}},
+            {{{"z", 0, 0, 'I'}, {"n", 3, -2, 'I'}}},
             "@ITERATE@%IPORT%@VHDL_TYPEDEC@@ENDITERATE@",
-            "std_logic_vector(0 to 0), std_logic_vector(3 downto -2)",
-            ""},
+            "std_logic_vector(0 to 0), std_logic_vector(3 downto -2)"},
         Row{"VhdlExpandedBits",
-            {{"d", 7, 6, 'I'}},
+            {{{"d", 7, 6, 'I'}}},
             "@EXPANDBUS@@ITERATE@%IPORT%@VHDL_TYPEDEC@@ENDITERATE@",
-            "std_logic_vector(7 to 7), std_logic_vector(6 to 6)",
-            ""},
+            "std_logic_vector(7 to 7), std_logic_vector(6 to 6)"},
         Row{"VhdlTypesIgnoreCase",
-            {{"data", 7, 0, 'I'}},
+            {{{"data", 7, 0, 'I'}}},
             "@UPCASE@@ITERATE@%IPORT%@ITERATOR@ : @VHDL_TYPEDEC@@ENDITERATE@",
-            "DATA : std_logic_vector(7 downto 0)",
-            ""},
+            "DATA : std_logic_vector(7 downto 0)"},
         Row{"VhdlPieceEqualToDelimiterWraps",
-            {{"d", 1, 0, 'I'}},
+            {{{"d", 1, 0, 'I'}}},
             "@SET SIGDELIM=(@@SET OUTLINEWIDTH=0@@ITERATE@%IPORT%@VHDL_TYPEDEC@@ENDITERATE@",
-            "std_logic_vector(\n1 downto 0)",
-            ""},
+            "std_logic_vector(\n1 downto 0)"},
         Row{"ConditionalPerPass", kDesign,
-            "@ITERATE@%PORT%@IFHAS IPORT=clk@+@ENDIF@@ITERATOR@@ENDITERATE@", "+clk, +data, +q",
-            ""},
+            "@ITERATE@%PORT%@IFHAS IPORT=clk@+@ENDIF@@ITERATOR@@ENDITERATE@", "+clk, +data, +q"},
         // The iteration keeps its own position while searches and mappings run in its body.
         Row{"FailedSearchKeepsPosition", kAbc,
-            "@ITERATE@%PORT%@IFNHAS PORT=zz@@ITERATOR@@ENDIF@@ENDITERATE@", "a, b, c", ""},
+            "@ITERATE@%PORT%@IFNHAS PORT=zz@@ITERATOR@@ENDIF@@ENDITERATE@", "a, b, c"},
         Row{"SearchKeepsCurrentBit", kSmallBus,
             "@EXPANDBUS@@ITERATE@%PORT%@IFHAS OPORT=q@@ITERATOR@@ENDIF@"
             "@IFHAS IPORT=d@=@ITERATOR@@ENDIF@@ENDITERATE@",
-            "d_1_=d_1_, d_0_=d_0_, q=q", ""},
+            "d_1_=d_1_, d_0_=d_0_, q=q"},
         Row{"MappingKeepsPosition", kAbc,
-            "@MAP@@ITERATE@%PORT%@MAPSIGNAL c TO z@@ITERATOR@@ENDITERATE@", "a, b, z", ""},
+            "@MAP@@ITERATE@%PORT%@MAPSIGNAL c TO z@@ITERATOR@@ENDITERATE@", "a, b, z"},
         Row{"MappingKeepsCurrentBit", kSmallBus,
             "@MAP@@EXPANDBUS@@ITERATE@%PORT%@MAPSIGNAL q TO r@@ITERATOR@@ENDITERATE@|%port%",
-            "d_1_, d_0_, r|d_1_, d_0_, r", ""},
+            "d_1_, d_0_, r|d_1_, d_0_, r"},
         // Bits already handed out keep the mapped name their bus had when it was expanded.
         Row{"MappingReachesNextExpansion", kSmallBus,
             "@MAP@@EXPANDBUS@@ITERATE@%IPORT%@MAPSIGNAL d TO e@@ITERATOR@@ENDITERATE@|%iport%",
-            "d_1_, d_0_|e_1_, e_0_", ""},
+            "d_1_, d_0_|e_1_, e_0_"},
         Row{"HeaderVariableIterator", kAbc, "@ITERATE@%MODULE%x@ENDITERATE@", "", kIterator},
         Row{"IteratorMissing", kAbc, "z@ITERATE@", "z", kIterator},
         Row{"UnterminatedBody", kAbc, "z@ITERATE@%PORT%@ITERATOR@\nx\n", "z",
@@ -362,12 +336,6 @@ INSTANTIATE_TEST_SUITE_P(
 
 // A block still open at the end is allowed but almost always a forgotten @ENDIF@: the run
 // succeeds with one warning naming the outermost open block, and saying whether text was lost.
-struct OpenBlockRow {
-  const char* templateText;
-  const char* output;
-  std::string warning;  // empty: no warning
-};
-
 std::string dropped(const std::string& block) {
   return "template t.tmpl: " + block + " is never closed; the rest of the template was dropped";
 }
@@ -376,30 +344,22 @@ std::string kept(const std::string& block) {
   return "template t.tmpl: " + block + " is never closed; the rest of the template was kept";
 }
 
-TEST(OpenBlock, WarnsAboutOutermost) {
-  const OpenBlockRow rows[] = {
-      {"a@IFHAS IPORT=zz@b", "a", dropped("@IFHAS at line 1")},
-      {"\n\n@IFHAS PORT=*@x", "\n\nx", kept("@IFHAS at line 3")},
-      {"@IFHAS PORT=*@@IFHAS PORT=*@x@ENDIF@", "x", kept("@IFHAS at line 1")},
-      {"@IFHAS PORT=*@a\n@IFHAS PORT=zz@b", "a\n", dropped("@IFHAS at line 1")},
-      // A block opened by a replayed body is dated like an error there: the @ENDITERATE@ line.
-      {"@ITERATE@%IPORT%@IFPORT clk@@ITERATOR@\n@ENDITERATE@", "clk\n, ",
-       dropped("@IFPORT at line 2")},
-      {"@IFHAS PORT=*@@ENDIF@@IFHAS PORT=zz@@ENDIF@x", "x", ""},
-      {"@IFHAS PORT=*@%foo%", "", ""},
-      {"@IFHAS PORT=*@@ITERATE@%PORT%", "", ""},
-  };
-  for (const OpenBlockRow& row : rows) {
-    const handlers_test::Run run = handlers_test::runTemplate(row.templateText, kDesign);
-    EXPECT_EQ(run.output, row.output) << row.templateText;
-    EXPECT_EQ(run.completed, run.status == 0) << row.templateText;
-    if (row.warning.empty()) {
-      EXPECT_TRUE(run.warnings.empty()) << row.templateText;
-      continue;
-    }
-    EXPECT_EQ(run.status, 0u) << row.templateText;
-    EXPECT_EQ(run.warnings, std::vector<std::string>{row.warning}) << row.templateText;
-  }
-}
+INSTANTIATE_TEST_SUITE_P(
+    OpenBlock, TemplateTest,
+    ::testing::Values(
+        Row{"Dropped", kDesign, "a@IFHAS IPORT=zz@b", "a", "", dropped("@IFHAS at line 1")},
+        Row{"Kept", kDesign, "\n\n@IFHAS PORT=*@x", "\n\nx", "", kept("@IFHAS at line 3")},
+        Row{"OuterOfTwo", kDesign, "@IFHAS PORT=*@@IFHAS PORT=*@x@ENDIF@", "x", "",
+            kept("@IFHAS at line 1")},
+        Row{"OuterKeptInnerDropped", kDesign, "@IFHAS PORT=*@a\n@IFHAS PORT=zz@b", "a\n", "",
+            dropped("@IFHAS at line 1")},
+        // A block opened by a replayed body is dated like an error there: the @ENDITERATE@ line.
+        Row{"OpenedInReplayedBody", kDesign, "@ITERATE@%IPORT%@IFPORT clk@@ITERATOR@\n@ENDITERATE@",
+            "clk\n, ", "", dropped("@IFPORT at line 2")},
+        Row{"AllClosed", kDesign, "@IFHAS PORT=*@@ENDIF@@IFHAS PORT=zz@@ENDIF@x", "x"},
+        Row{"ErrorInsideNoWarning", kDesign, "@IFHAS PORT=*@%foo%", "", unknown("%foo%")},
+        Row{"UnterminatedBodyNoWarning", kDesign, "@IFHAS PORT=*@@ITERATE@%PORT%", "",
+            errorAt(1, kUnterminated)}),
+    rowName);
 
 }  // namespace
