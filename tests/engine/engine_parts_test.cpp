@@ -111,57 +111,42 @@ TEST(KeywordTable, SortedPrefixFreeAndFoundIgnoringCase) {
   for (const auto& [token, index] : lookups) EXPECT_EQ(lookupKeyword(token), index) << token;
 }
 
-// Handler lines only: every token also gets a dispatcher line, which the end-to-end cases show.
-std::string handlerLines(const std::string& trace) {
-  std::string kept;
-  size_t start = 0;
-  while (start < trace.size()) {
-    const size_t end = std::min(trace.find('\n', start), trace.size() - 1) + 1;
-    const std::string_view line(trace.data() + start, end - start);
-    if (line.substr(0, 10) != "doToken() ") kept += line;
-    start = end;
-  }
-  return kept;
-}
-
-TEST(Trace, HandlerLines) {
-  const Design design{{{"d", 1, 0, 'I'}, {"q", -1, -1, 'O'}}};
+// Lines the end-to-end trace case does not reach: a false @IFNHAS, a mapping that finds no
+// port, @SET, a bad iterator, and a failed block, whose tokens show up to a NUL.
+TEST(Trace, Lines) {
   const std::pair<std::string, std::string> rows[] = {
-      {"@IFNHAS PORT=q@@IFHAS PORT=*@@ENDIF@@ENDIF@@MAPSIGNAL zz TO s@@SET sigdelim=;@",
+      {"@IFNHAS PORT=q@@ENDIF@@MAPSIGNAL zz TO s@@SET sigdelim=;@",
+       "doToken() called: szToken=@IFNHAS PORT=q@|pTokList=0\n"
        "doIf() called: token=@IFNHAS PORT=q@|Condition=0\n"
        "addCondition() called: condition=1\n"
-       "doIf() called: token=@IFHAS PORT=*@|Condition=1\n"
-       "addCondition() called: condition=1\n"
-       "doEndIf() called: m_ConditionalDepth=2\n"
+       "doToken() called: szToken=@ENDIF@|pTokList=0\n"
+       "doToken() processing token=@ENDIF@| with condition test failed.\n"
        "doEndIf() called: m_ConditionalDepth=1\n"
+       "doToken() called: szToken=@MAPSIGNAL zz TO s@|pTokList=0\n"
        "doMapSignal() called: token=@MAPSIGNAL zz TO s@\n"
-       "doSet() called: token=@SET sigdelim=;@\n"},
-      {"@ITERATE@%module%", "eatIterate() Iterator=%module%\n"},
-      {"@IFHAS PORT=zz@@IfTyped@@ENDIF@@ENDIF@",
+       "doToken() called: szToken=@SET sigdelim=;@|pTokList=0\n"
+       "doSet() called: token=@SET sigdelim=;@\n"
+       "doToken() called: szToken=|pTokList=0\n"},
+      {"@ITERATE@%module%",
+       "doToken() called: szToken=@ITERATE@|pTokList=0\neatIterate() Iterator=%module%\n"},
+      {std::string("@IFHAS PORT=zz@x\0y@IfTyped@@ENDIF@", 34),
+       "doToken() called: szToken=@IFHAS PORT=zz@|pTokList=0\n"
        "doIf() called: token=@IFHAS PORT=zz@|Condition=1\n"
        "addCondition() called: condition=1\n"
+       "doToken() called: szToken=x|pTokList=0\n"
+       "doToken() processing token=x| with condition test failed.\n"
+       "doToken() called: szToken=@IfTyped@|pTokList=0\n"
+       "doToken() processing token=@IfTyped@| with condition test failed.\n"
        "doIfDeclared() called: token=@iftyped@\n"
        "addCondition() called: condition=1\n"
+       "doToken() called: szToken=@ENDIF@|pTokList=0\n"
+       "doToken() processing token=@ENDIF@| with condition test failed.\n"
        "doEndIf() called: m_ConditionalDepth=2\n"
-       "doEndIf() called: m_ConditionalDepth=1\n"},
-  };
-  for (const auto& [templateText, lines] : rows) {
-    EXPECT_EQ(handlerLines(runOn(templateText, design, true).trace), lines) << templateText;
-  }
-}
-
-TEST(Trace, FailedConditionLinesShowTokensUpToNul) {
-  const std::string templateText("@IFHAS PORT=zz@x\0y@FOO@", 23);
-  EXPECT_EQ(runOn(templateText, Design{}, true).trace,
-            "doToken() called: szToken=@IFHAS PORT=zz@|pTokList=0\n"
-            "doIf() called: token=@IFHAS PORT=zz@|Condition=1\n"
-            "addCondition() called: condition=1\n"
-            "doToken() called: szToken=x|pTokList=0\n"
-            "doToken() processing token=x| with condition test failed.\n"
-            "doToken() called: szToken=@FOO@|pTokList=0\n"
-            "doToken() processing token=@FOO@| with condition test failed.\n"
-            "doToken() called: szToken=|pTokList=0\n"
-            "doToken() processing token=| with condition test failed.\n");
+       "doToken() called: szToken=|pTokList=0\n"
+       "doToken() processing token=| with condition test failed.\n"}};
+  const Design design{{{"d", 1, 0, 'I'}, {"q", -1, -1, 'O'}}};
+  for (const auto& [templateText, trace] : rows)
+    EXPECT_EQ(runOn(templateText, design, true).trace, trace) << templateText;
 }
 
 // The name index and the cached wildcard results must answer exactly as a walk over all ports
