@@ -44,7 +44,6 @@ INSTANTIATE_TEST_SUITE_P(
     Tokens, TemplateTest,
     ::testing::ValuesIn(std::vector<Row>{
         {"CommentsVanish", kNone, "a@comment x = y@b@COMMENTARY@c@comment open", "abc"},
-        {"CaseLeavesFixedTextAlone", kNone, "@UPCASE@%ext%@CR@x@AT@", "VHD\nx@"},
         {"UnknownVariable", kNone, "ok %foo% never", "ok ", unknown("%foo%")},
         {"ClosedByOtherMark", kNone, "%date@x", "", unknown("%date@")},
         {"DoublePercent", kNone, "50%% off", "50", unknown("%%")},
@@ -219,7 +218,6 @@ INSTANTIATE_TEST_SUITE_P(
 INSTANTIATE_TEST_SUITE_P(
     PortLists, TemplateTest,
     ::testing::ValuesIn(std::vector<Row>{
-        {"OnePortOrNone", {{{"a", -1, -1, 'I'}}}, "[%iport%][%oport%]", "[a][]"},
         {"NodesOnlyInNodeAndSignal",
          {{{"a", -1, -1, 'I'}, {"nb", 1, 0, 'N'}}},
          "%node%;%signal%;%port%;%busport%",

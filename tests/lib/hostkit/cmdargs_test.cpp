@@ -77,7 +77,6 @@ TEST(CmdArgs, Grammar) {
         {"--a", {{}}},
         {"-a", {{}}},
         {"-module", {{"m"}, {"n"}}}}},
-      {kUsage, {"-foo"}, "unknown switch -foo", {}},
       {kUsage, {"-prj", "p", "-", "q"}, "unknown switch -", {}},
       {kUsage, {"-module", "m", "-bogus", "-h"}, "unknown switch -bogus", {}},
       {kUsage, {"-lib"}, "switch -lib needs an argument <libname>", {}},
