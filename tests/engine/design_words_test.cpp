@@ -157,11 +157,7 @@ const Design kEmptyValue{{}, {{"W", "", "", ""}}, "", DesignLanguage::Verilog};
 
 // `word` as the innermost of `depth` nested blocks inside a generic iteration.
 std::string nestedInGenericBody(const std::string& word, int depth) {
-  std::string text = "@ITERATE@%GENERIC%";
-  for (int i = 1; i < depth; ++i) text += "@IFHAS PORT=*@";
-  text += word + "x";
-  for (int i = 0; i < depth; ++i) text += "@ENDIF@";
-  return text + "@ENDITERATE@";
+  return "@ITERATE@%GENERIC%" + handlers_test::nested(depth, word) + "@ENDITERATE@";
 }
 
 const std::string kDefaultOnly =
@@ -201,8 +197,7 @@ INSTANTIATE_TEST_SUITE_P(
          "@ENDIF@@ENDIF@y",
          "y"},
         {"NineLevels", kDeclared, nestedInGenericBody("@IFDEFAULT@", 9), "x, , x"},
-        {"TenthLevel", kDeclared, nestedInGenericBody("@IFNTYPED@", 10), "",
-         errorAt(1, "Maximum number of nested @IFHAS or @IFNHAS directives exceeded.")},
+        {"TenthLevel", kDeclared, nestedInGenericBody("@IFNTYPED@", 10), "", handlers_test::kDepth},
         {"DefaultOutside", kDeclared, "a@IFDEFAULT@b@ENDIF@", "a", errorAt(1, kDefaultOnly)},
         {"NoDefaultInPortBody", kDeclared, "@ITERATE@%PORT%@IFNDEFAULT@@ENDIF@@ENDITERATE@", ", ",
          errorAt(1, kDefaultOnly)},

@@ -169,11 +169,9 @@ TEST(NameSearch, AgreesWithAWalkOverAllPorts) {
   for (int round = 0; round < 40; ++round) {
     // '[' and '{' differ only in the bit that tells ASCII letters' case apart.
     Design design;
-    std::vector<std::string> names;
-    for (unsigned i = 0, n = 1 + pick(12); i < n; ++i) names.push_back(randomName("aA[{", 4));
-    for (const std::string& name : names) {
+    for (unsigned i = 0, n = 1 + pick(12); i < n; ++i) {
       const bool bus = pick(2) == 0;
-      design.ports.push_back({name, bus ? 1 : -1, bus ? 0 : -1, "IOBN"[pick(4)]});
+      design.ports.push_back({randomName("aA[{", 4), bus ? 1 : -1, bus ? 0 : -1, "IOBN"[pick(4)]});
     }
     const std::vector<handlers_test::Port>& ports = design.ports;
     std::vector<std::string> mapped(ports.size());
@@ -190,7 +188,7 @@ TEST(NameSearch, AgreesWithAWalkOverAllPorts) {
         const std::string to = "m" + std::to_string(step);
         templateText += "@MAPSIGNAL " + from + " TO " + to + "@";
         for (size_t i = 0; i < ports.size(); ++i) {
-          if (names[i] == from) {
+          if (ports[i].name == from) {
             mapped[i] = to;
             break;
           }
@@ -201,12 +199,12 @@ TEST(NameSearch, AgreesWithAWalkOverAllPorts) {
         const PortKind& selection = *portKindFor(kind);
         bool found = false;
         for (size_t i = 0; i < ports.size(); ++i) {
-          bool same = names[i].size() == pattern.size();
+          bool same = ports[i].name.size() == pattern.size();
           for (size_t c = 0; same && c < pattern.size(); ++c) {
             const auto fold = [foldCase](char x) {
               return foldCase ? static_cast<char>(std::tolower(static_cast<unsigned char>(x))) : x;
             };
-            same = pattern[c] == '?' || fold(pattern[c]) == fold(names[i][c]);
+            same = pattern[c] == '?' || fold(pattern[c]) == fold(ports[i].name[c]);
           }
           if ((pattern == "*" || same) && selection.selects(ports[i].dir, ports[i].left != -1))
             found = true;
@@ -220,7 +218,7 @@ TEST(NameSearch, AgreesWithAWalkOverAllPorts) {
     }
     std::string list;
     for (size_t i = 0; i < ports.size(); ++i)
-      list += (i > 0 ? "," : "") + (mapped[i].empty() ? names[i] : mapped[i]);
+      list += (i > 0 ? "," : "") + (mapped[i].empty() ? ports[i].name : mapped[i]);
     const std::string whole = templateText + "@SET SIGDELIM=,@@MAP@%signal%";
     EXPECT_EQ(runOn(whole, design).output, expected + list) << whole;
     // Replayed in an iteration, every pass sees the same answers.

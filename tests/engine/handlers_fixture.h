@@ -104,6 +104,19 @@ inline std::string errorAt(int line, std::string_view text) {
 
 inline const std::string kNoError = "No errors or warnings";
 
+/// "x" inside `depth` nested blocks: `outermost`, @IFHAS PORT=*@ blocks, then `innermost`.
+inline std::string nested(int depth, const std::string& innermost = "@IFHAS PORT=*@",
+                          const std::string& outermost = "@IFHAS PORT=*@") {
+  std::string text = outermost;
+  for (int i = 2; i < depth; ++i) text += "@IFHAS PORT=*@";
+  text += innermost + "x";
+  for (int i = 0; i < depth; ++i) text += "@ENDIF@";
+  return text;
+}
+
+inline const std::string kDepth =
+    errorAt(1, "Maximum number of nested @IFHAS or @IFNHAS directives exceeded.");
+
 struct Row {
   const char* name;
   Design design;

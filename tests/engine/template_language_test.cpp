@@ -13,6 +13,8 @@ namespace {
 
 using handlers_test::Design;
 using handlers_test::errorAt;
+using handlers_test::kDepth;
+using handlers_test::nested;
 using handlers_test::Row;
 using handlers_test::rowName;
 using handlers_test::TemplateTest;
@@ -135,19 +137,9 @@ const std::string kIfType =
     errorAt(1,
             "Invalid syntax for @IFHAS or @IFNHAS directive, SIGNALTYPE must be one of:\n"
             "IPORT, OBPORT, OPORT, BPORT, PORT, NODE, SIGNAL.");
-const std::string kDepth =
-    errorAt(1, "Maximum number of nested @IFHAS or @IFNHAS directives exceeded.");
 const std::string kEndIf = "@ENDIF@ directive encountered without a matching @IFHAS or @IFNHAS.";
 const std::string kMapForm =
     "Invalid syntax for @MAPSIGNAL directive, must be of the form: @MAPSIGNAL OLDNAME TO NEWNAME@";
-
-std::string nested(const char* outer, int depth) {
-  std::string text = outer;
-  for (int i = 1; i < depth; ++i) text += "@IFHAS PORT=*@";
-  text += "x";
-  for (int i = 0; i < depth; ++i) text += "@ENDIF@";
-  return text;
-}
 
 INSTANTIATE_TEST_SUITE_P(
     Conditionals, TemplateTest,
@@ -171,9 +163,10 @@ INSTANTIATE_TEST_SUITE_P(
          "@IFHAS IPORT=data@a@ENDIF@@EXPANDBUS@@IFHAS IPORT=data@b@ENDIF@"
          "@IFHAS IPORT=data_7_@c@ENDIF@",
          "ab"},
-        {"NineLevels", kDesign, nested("@IFHAS PORT=*@", 9), "x"},
-        {"TenthLevel", kDesign, nested("@IFHAS PORT=*@", 10), "", kDepth},
-        {"TenthLevelInFailedBlock", kDesign, nested("@IFHAS PORT=zz@", 10), "", kDepth},
+        {"NineLevels", kDesign, nested(9), "x"},
+        {"TenthLevel", kDesign, nested(10), "", kDepth},
+        {"TenthLevelInFailedBlock", kDesign, nested(10, "@IFHAS PORT=*@", "@IFHAS PORT=zz@"), "",
+         kDepth},
         {"EndIfOutside", kDesign, "a\n@ENDIF@b", "a\n", errorAt(2, kEndIf)},
         {"EndIfInBodyClosesOuterBlock", kDesign,
          "@IFHAS PORT=*@@ITERATE@%PORT%@ITERATOR@@ENDIF@@ENDITERATE@", "clk, data, ",
