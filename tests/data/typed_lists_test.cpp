@@ -4,7 +4,6 @@
 #include <gtest/gtest.h>
 
 #include <string>
-#include <utility>
 #include <vector>
 
 namespace {
@@ -57,28 +56,10 @@ TEST(TypedLists, HeaderValuesAreCopiedAndPortsComeBackInAppendOrder) {
   EXPECT_EQ(tokens.first()->m_Text, std::string("a\0b", 3));
 }
 
-TEST(PortRecord, BusAndMappedName) {
-  const std::pair<std::pair<int32_t, int32_t>, bool> cases[] = {
-      {{-1, -1}, false}, {{2, 0}, true}, {{0, 1}, true}, {{0, 0}, true}, {{-1, 5}, false}};
-  for (const auto& [bounds, bus] : cases)
-    EXPECT_EQ(PortRecord("p", bounds.first, bounds.second, 'N').isBus(), bus)
-        << bounds.first << ":" << bounds.second;
-
-  PortRecord port("data", 3, 0, 'O');
-  EXPECT_FALSE(port.m_MappedName.has_value());
-  port.setMappedName("first_longer_name");
-  port.setMappedName("q");
-  ASSERT_TRUE(port.m_MappedName.has_value());
-  EXPECT_EQ(*port.m_MappedName, "q");
-  EXPECT_EQ(port.m_Name, "data");
-}
-
 TEST(PortRecord, UnknownRangeKeepsItsProblemTextEvenWhenEmpty) {
   PortRecord port("d", -1, -1, 'I');
   EXPECT_FALSE(port.isRangeUnknown());
   EXPECT_EQ(port.rangeProblem(), "");
-  EXPECT_EQ(port.m_Kind, PortTypeKind::Other);
-  EXPECT_EQ(port.m_DeclaredType, "");
   port.setRangeUnknown(std::string("W\0x", 3));
   EXPECT_TRUE(port.isRangeUnknown());
   EXPECT_EQ(port.rangeProblem(), std::string("W\0x", 3));

@@ -1,10 +1,14 @@
-// Runs one template through a processor over in-memory design data and captures what it wrote:
-// the output, the result status, message and warnings, and (on request) the trace lines.
+// Runs one template through a processor over an in-memory design and captures what it wrote,
+// and the table every template suite fills: one row per template, its whole output and either a
+// clean finish or the exact message with its line.
 #pragma once
+
+#include <gtest/gtest.h>
 
 #include <cstdint>
 #include <cstdio>
 #include <memory>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -14,11 +18,23 @@
 
 namespace handlers_test {
 
-struct PortSpec {
-  const char* name;
+/// A port as a reader hands it over; what the declaration says beyond bounds is optional.
+struct Port {
+  std::string name;
   int32_t left;
   int32_t right;
   char dir;
+  std::string type = {};
+  PortTypeKind kind = PortTypeKind::Other;
+  PortMode mode = PortMode::FromLetter;
+  std::optional<std::string> rangeProblem = {};  // set: the range could not be evaluated
+};
+
+struct Design {
+  std::vector<Port> ports;
+  std::vector<GenericRecord> generics = {};
+  std::string context = {};
+  DesignLanguage language = DesignLanguage::Vhdl;
 };
 
 struct Run {
@@ -30,9 +46,6 @@ struct Run {
   std::vector<std::string> warnings;
 };
 
-/// The template name every run here gives the processor.
-inline constexpr std::string_view kTemplateName = "t.tmpl";
-
 /// A temporary file holding `text`, positioned at its start. The caller closes it.
 inline std::FILE* fileWith(std::string_view text) {
   std::FILE* file = std::tmpfile();
@@ -41,29 +54,41 @@ inline std::FILE* fileWith(std::string_view text) {
   return file;
 }
 
-using pinforge_test::readBack;
-
-/// Design data with the header values every run here uses (module "top", ext "vhd").
-inline StbDataList* newDesignData() {
-  return new StbDataList("prj", "top", "out.vhd", "vhd", "pinforge", "", "title", "date");
+/// `design` as the program hands it to the processor (module "top", ext "vhd").
+inline std::unique_ptr<StbDataList> build(const Design& design) {
+  auto data = std::make_unique<StbDataList>("prj", "top", "out.vhd", "vhd", "pinforge", "", "title",
+                                            "date");
+  data->m_Language = design.language;
+  data->m_Generics = design.generics;
+  data->m_Context = design.context;
+  for (const Port& p : design.ports) {
+    auto* record = new PortRecord(p.name, p.left, p.right, p.dir);
+    record->m_DeclaredType = p.type;
+    record->m_Kind = p.kind;
+    record->m_Mode = p.mode;
+    if (p.rangeProblem) record->setRangeUnknown(*p.rangeProblem);
+    data->appendOwned(record);
+  }
+  return data;
 }
 
-/// Expands `templateText` over `data` with a fresh processor.
-inline Run runOn(std::string_view templateText, StbDataList& data, bool traced = false) {
+/// Expands `templateText` (named t.tmpl) over `design` with a fresh processor.
+inline Run runOn(std::string_view templateText, const Design& design, bool traced = false) {
+  const std::unique_ptr<StbDataList> data = build(design);
   std::FILE* in = fileWith(templateText);
   std::FILE* out = std::tmpfile();
   std::FILE* debug = traced ? std::tmpfile() : nullptr;
   Run run;
   {
-    Forge forge(out, in, debug, &data);
-    forge.setTemplateName(kTemplateName);
+    Forge forge(out, in, debug, data.get());
+    forge.setTemplateName("t.tmpl");
     run.completed = forge.processTemplate();
     run.status = forge.getResult(run.message);
     run.warnings = forge.warnings();
   }
-  run.output = readBack(out);
+  run.output = pinforge_test::readBack(out);
   if (debug != nullptr) {
-    run.trace = readBack(debug);
+    run.trace = pinforge_test::readBack(debug);
     std::fclose(debug);
   }
   std::fclose(out);
@@ -71,22 +96,38 @@ inline Run runOn(std::string_view templateText, StbDataList& data, bool traced =
   return run;
 }
 
-/// Expands `templateText` over `ports` with a fresh processor (module "top", ext "vhd").
-inline Run runTemplate(std::string_view templateText, const std::vector<PortSpec>& ports,
-                       bool traced = false) {
-  const std::unique_ptr<StbDataList> data(newDesignData());
-  for (const PortSpec& p : ports) data->appendOwned(new PortRecord(p.name, p.left, p.right, p.dir));
-  return runOn(templateText, *data, traced);
-}
-
 /// The message recorded for a template error on `line`.
 inline std::string errorAt(int line, std::string_view text) {
-  std::string message = "Error - Syntax error in template file line " + std::to_string(line) + "\n";
-  message += text;
-  message += '\n';
-  return message;
+  return "Error - Syntax error in template file line " + std::to_string(line) + "\n" +
+         std::string(text) + "\n";
 }
 
 inline const std::string kNoError = "No errors or warnings";
+
+/// "x" inside `depth` nested blocks: `outermost`, @IFHAS PORT=*@ blocks, then `innermost`.
+inline std::string nested(int depth, const std::string& innermost = "@IFHAS PORT=*@",
+                          const std::string& outermost = "@IFHAS PORT=*@") {
+  std::string text = outermost;
+  for (int i = 2; i < depth; ++i) text += "@IFHAS PORT=*@";
+  text += innermost + "x";
+  for (int i = 0; i < depth; ++i) text += "@ENDIF@";
+  return text;
+}
+
+inline const std::string kDepth =
+    errorAt(1, "Maximum number of nested @IFHAS or @IFNHAS directives exceeded.");
+
+struct Row {
+  const char* name;
+  Design design;
+  std::string templateText;
+  std::string output;
+  std::string message = {};  // empty: the run finishes without error
+  std::string warning = {};  // the one warning the run gives; empty: none
+};
+
+class TemplateTest : public ::testing::TestWithParam<Row> {};
+
+inline std::string rowName(const ::testing::TestParamInfo<Row>& param) { return param.param.name; }
 
 }  // namespace handlers_test

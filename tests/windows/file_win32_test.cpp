@@ -1,5 +1,5 @@
 // The Windows file functions: temporary files made exclusively in the temporary folder and
-// written as bytes, removal of read-only files, UTF-8 names, and the executable's folder.
+// written as bytes, UTF-8 names, output files, identities, and the executable's folder.
 #include <gtest/gtest.h>
 #include <windows.h>
 
@@ -9,11 +9,13 @@
 
 #include "hostkit/wide_text-win32.h"
 #include "platform/hostkit.h"
+#include "support/scratch_dir.h"
 #include "windows/scratch_folder.h"
 
 namespace {
 
 using Host::File;
+using pinforge_test::readFile;
 using pinforge_test::ScratchFolder;
 
 std::string temporaryFolder() {
@@ -53,10 +55,7 @@ TEST(FileWin32, TestsAndRemovesByUtf8Name) {
   EXPECT_TRUE(File::isfile(name.c_str()));
   EXPECT_FALSE(File::isfile(folder.file("").c_str()));
   EXPECT_FALSE(File::isfile(folder.file("other.txt").c_str()));
-  const std::wstring wide = Host::win32::widen(name);
-  ASSERT_TRUE(::SetFileAttributesW(wide.c_str(), FILE_ATTRIBUTE_READONLY));
-  EXPECT_FALSE(File::remove(name.c_str()));
-  EXPECT_TRUE(File::remove_f(name.c_str()));
+  EXPECT_TRUE(File::remove(name.c_str()));
   EXPECT_FALSE(File::isfile(name.c_str()));
   EXPECT_FALSE(File::remove(name.c_str()));
 }
@@ -68,17 +67,6 @@ TEST(FileWin32, ExecutableFolderHoldsTheRunningProgram) {
   EXPECT_TRUE(File::isfile((folder + "\\test_windows.exe").c_str())) << folder;
 }
 
-std::string readAll(const std::string& path) {
-  std::string content;
-  std::FILE* in = std::fopen(path.c_str(), "rb");
-  if (in == nullptr) return "<missing>";
-  char buffer[256];
-  for (size_t got; (got = std::fread(buffer, 1, sizeof buffer, in)) > 0;)
-    content.append(buffer, got);
-  std::fclose(in);
-  return content;
-}
-
 TEST(FileWin32, ReplacedOutputAppearsOnlyOnCommit) {
   ScratchFolder folder;
   const std::string target = folder.file("out.txt");
@@ -88,14 +76,14 @@ TEST(FileWin32, ReplacedOutputAppearsOnlyOnCommit) {
     Host::OutputFile output;
     ASSERT_TRUE(output.open(target.c_str(), Host::OutputFile::Placement::Replace, error)) << error;
     std::fputs("new\n", output.stream());
-    EXPECT_EQ(readAll(target), "old");
+    EXPECT_EQ(readFile(target), "old");
   }
-  EXPECT_EQ(readAll(target), "old");  // dropped without commit
+  EXPECT_EQ(readFile(target), "old");  // dropped without commit
   Host::OutputFile output;
   ASSERT_TRUE(output.open(target.c_str(), Host::OutputFile::Placement::Replace, error)) << error;
   std::fputs("new\n", output.stream());
   ASSERT_TRUE(output.commit(error)) << error;
-  EXPECT_EQ(readAll(target), "new\n");
+  EXPECT_EQ(readFile(target), "new\n");
   EXPECT_TRUE(output.removeWritten());
   EXPECT_FALSE(File::isfile(target.c_str()));
   WIN32_FIND_DATAW found{};
@@ -130,8 +118,8 @@ TEST(FileWin32, OutputsThatCannotBeWritten) {
     EXPECT_FALSE(output.open(c.path.c_str(), Host::OutputFile::Placement::Replace, error));
     EXPECT_EQ(error, c.error);
   }
-  EXPECT_EQ(readAll(folder.file("ro.txt")), "keep");
-  File::remove_f(folder.file("ro.txt").c_str());
+  EXPECT_EQ(readFile(folder.file("ro.txt")), "keep");
+  ::SetFileAttributesW(Host::win32::widen(folder.file("ro.txt")).c_str(), FILE_ATTRIBUTE_NORMAL);
 }
 
 TEST(FileWin32, IdentityIgnoresSpelling) {

@@ -95,32 +95,6 @@ TEST(Process, StatusAndOutput) {
   ::close(leaked);
 }
 
-/// Sets PATH and the current folder for one test, and puts both back afterwards.
-class SearchSetting {
- public:
-  SearchSetting(const std::string& path, const std::string& folder) {
-    const char* old = std::getenv("PATH");
-    m_HadPath = old != nullptr;
-    if (m_HadPath) m_Path = old;
-    char buffer[4096];
-    if (::getcwd(buffer, sizeof buffer) != nullptr) m_Folder = buffer;
-    ::setenv("PATH", path.c_str(), 1);
-    EXPECT_EQ(::chdir(folder.c_str()), 0);
-  }
-  ~SearchSetting() {
-    if (m_HadPath)
-      ::setenv("PATH", m_Path.c_str(), 1);
-    else
-      ::unsetenv("PATH");
-    EXPECT_EQ(::chdir(m_Folder.c_str()), 0);
-  }
-
- private:
-  bool m_HadPath = false;
-  std::string m_Path;
-  std::string m_Folder;
-};
-
 TEST(Process, FindProgram) {
   pinforge_test::ScratchDir dir;
   for (const char* sub : {"a", "b", "cwd", "cwd/rel"}) ASSERT_TRUE(dir.makeDir(sub));
@@ -155,11 +129,16 @@ TEST(Process, FindProgram) {
       {a + ":" + b, "a/tool", ""},
       {a + ":" + b, "", ""},
   };
+  const char* path = std::getenv("PATH");
+  const std::string savedPath = path != nullptr ? path : "/usr/bin:/bin";
+  const std::filesystem::path savedFolder = std::filesystem::current_path();
+  std::filesystem::current_path(dir.file("cwd"));
   for (const auto& c : cases) {
-    SCOPED_TRACE(c.path + " " + c.name);
-    const SearchSetting setting(c.path, dir.file("cwd"));
-    EXPECT_EQ(Host::Process::findProgram(c.name), c.found);
+    ::setenv("PATH", c.path.c_str(), 1);
+    EXPECT_EQ(Host::Process::findProgram(c.name), c.found) << c.path << " " << c.name;
   }
+  ::setenv("PATH", savedPath.c_str(), 1);
+  std::filesystem::current_path(savedFolder);
 }
 
 }  // namespace
