@@ -1,0 +1,95 @@
+// The one way the Verilog reader tests read a design: fixtures and in-memory texts indexed as
+// one compilation unit, one unit selected and described, and the first line of every message.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <cstdio>
+#include <cstdlib>
+#include <string>
+#include <vector>
+
+#include "scan/common/diagnostics.h"
+#include "scan/verilog/verilog_reader.h"
+#include "support/scratch_dir.h"
+
+namespace verilog_test {
+
+/// Names a parameterised test after its parameter's `label`.
+struct Label {
+  template <class Param>
+  std::string operator()(const testing::TestParamInfo<Param>& test) const {
+    return test.param.label;
+  }
+};
+
+/// The path of `name` under tests/fixtures/verilog.
+inline std::string fixture(const std::string& name) {
+  const char* root = std::getenv("PINFORGE_SOURCE_DIR");
+  return std::string(root ? root : ".") + "/tests/fixtures/verilog/" + name;
+}
+
+struct Input {
+  std::vector<std::string> texts;  ///< indexed after the files as "t.v", "t1.v", ...
+  const char* unit = "m";
+  ScanSettings settings = {};
+  std::vector<std::string> files = {};  ///< paths, indexed first
+};
+
+struct Read {
+  bool found = false;
+  bool ok = false;  ///< readUnit's verdict
+  scan::UnitDescription unit;
+  std::vector<std::string> units;     ///< "library kind name file:line" of the listing
+  std::vector<std::string> messages;  ///< first line of every message
+};
+
+inline Read read(const Input& input) {
+  Read result;
+  pinforge_test::FilePtr sink(std::tmpfile());
+  {
+    scan::Diagnostics diagnostics(sink.get(), 1000);
+    scan::verilog::VerilogReader reader(diagnostics, input.settings);
+    std::vector<scan::DesignFileEntry> files;
+    for (const std::string& path : input.files) files.push_back({"work", path});
+    if (!files.empty()) reader.indexFiles(files);
+    for (size_t i = 0; i < input.texts.size(); ++i)
+      reader.indexText(i == 0 ? "t.v" : "t" + std::to_string(i) + ".v", input.texts[i], "work");
+    result.found = reader.selectUnit("work", input.unit);
+    if (result.found) result.ok = reader.readUnit(result.unit);
+    for (const ScanUnitInfo& info : reader.listUnits())
+      result.units.push_back(info.library + " " + info.kind + " " + info.name + " " +
+                             info.file.substr(info.file.rfind('/') + 1) + ":" +
+                             std::to_string(info.line));
+  }
+  result.messages = pinforge_test::messageHeads(pinforge_test::readBack(sink.get()));
+  return result;
+}
+
+/// "[left:right]", or "" for a port without a range.
+inline std::string bounds(const ScanPort& port) {
+  if (!port.hasRange()) return "";
+  int32_t left = 0;
+  int32_t right = 0;
+  port.getBounds(left, right);
+  return "[" + std::to_string(left) + ":" + std::to_string(right) + "]";
+}
+
+/// "in", "out", "inout", "buffer", "linkage", "ref" or "interface"; "?" for anything else.
+inline const char* directionName(int direction) {
+  static const char* const names[] = {"?",      "in",      "out", "inout",
+                                      "buffer", "linkage", "ref", "interface"};
+  return direction >= 1 && direction <= 7 ? names[direction] : names[0];
+}
+
+/// "in byte a[7:0]": direction, type name when there is one, name and bounds, then " asc" for
+/// ascending bounds and " ?" with the reason for a range that cannot be evaluated.
+inline std::string portText(const ScanPort& port) {
+  std::string text = directionName(port.direction()) + std::string(" ") + port.typeName();
+  text += (text.back() == ' ' ? "" : " ") + std::string(port.name()) + bounds(port);
+  if (port.hasRange() && port.isAscending()) text += " asc";
+  if (port.rangeUnknown()) text += " ? " + port.rangeProblem();
+  return text;
+}
+
+}  // namespace verilog_test
