@@ -23,10 +23,15 @@ struct Label {
   }
 };
 
+/// The path of `relative` in the source tree.
+inline std::string sourcePath(const std::string& relative) {
+  const char* root = std::getenv("PINFORGE_SOURCE_DIR");
+  return std::string(root ? root : ".") + "/" + relative;
+}
+
 /// The path of `name` under tests/fixtures/verilog.
 inline std::string fixture(const std::string& name) {
-  const char* root = std::getenv("PINFORGE_SOURCE_DIR");
-  return std::string(root ? root : ".") + "/tests/fixtures/verilog/" + name;
+  return sourcePath("tests/fixtures/verilog/" + name);
 }
 
 struct Input {
@@ -90,6 +95,15 @@ inline std::string portText(const ScanPort& port) {
   if (port.hasRange() && port.isAscending()) text += " asc";
   if (port.rangeUnknown()) text += " ? " + port.rangeProblem();
   return text;
+}
+
+/// "ok" or "bad" (readUnit's verdict), each port's text after "; ", then each message on a
+/// line of its own.
+inline std::string outcome(const Read& result) {
+  std::string out = result.ok ? "ok" : "bad";
+  for (const ScanPort& port : result.unit.ports) out += "; " + portText(port);
+  for (const std::string& message : result.messages) out += "\n" + message;
+  return out;
 }
 
 }  // namespace verilog_test

@@ -10,6 +10,7 @@
 #include <string>
 #include <vector>
 
+#include "support/diff_tools.h"
 #include "yosys_harness.h"
 
 namespace {

@@ -8,6 +8,7 @@
 #include <string>
 #include <vector>
 
+#include "support/diff_tools.h"
 #include "yosys_harness.h"
 
 namespace {
