@@ -4,9 +4,12 @@
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
+#include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "scan/common/diagnostics.h"
@@ -95,6 +98,65 @@ inline std::string portText(const ScanPort& port) {
   if (port.hasRange() && port.isAscending()) text += " asc";
   if (port.rangeUnknown()) text += " ? " + port.rangeProblem();
   return text;
+}
+
+/// One design read and what it must give; "outcome" is in the form of the suite it is in.
+struct Case {
+  std::string label;
+  std::vector<std::string> texts;
+  std::string outcome;
+  ScanSettings settings = {};
+  std::vector<std::string> files = {};
+  std::string unit = "m";
+
+  Input input() const { return {texts, unit.c_str(), settings, files}; }
+};
+
+/// The cases of `name` in this folder, a file whose first lines describe its format; one
+/// failing case when the file cannot be read.
+inline std::vector<Case> casesFromFile(const std::string& name) {
+  std::string data;
+  if (!pinforge_test::readFile(sourcePath("tests/lib/scan/verilog/" + name), data))
+    return {{"CaseFile", {}, name + " cannot be read"}};
+  std::vector<Case> cases;
+  std::string* into = nullptr;
+  for (size_t at = 0, end = 0; at < data.size(); at = end + 1) {
+    end = std::min(data.find('\n', at), data.size());
+    const std::string line = data.substr(at, end - at);
+    const std::string option = line.rfind("--- ", 0) == 0 ? line.substr(4) : "";
+    const size_t equals = option.find('=');
+    if (line.rfind("=== ", 0) == 0) {
+      cases.push_back({line.substr(4), {""}, ""});
+      into = &cases.back().texts.back();
+    } else if (into == nullptr) {
+      continue;
+    } else if (option == "next file") {
+      into = &cases.back().texts.emplace_back();
+    } else if (option == "outcome") {
+      into = &cases.back().outcome;
+    } else if (option.rfind("unit ", 0) == 0) {
+      cases.back().unit = option.substr(5);
+    } else if (option.rfind("fixture ", 0) == 0) {
+      cases.back().files.push_back(fixture(option.substr(8)));
+    } else if (option.rfind("-g ", 0) == 0) {
+      cases.back().settings.genericOverrides.emplace_back(option.substr(3, equals - 3),
+                                                          option.substr(equals + 1));
+    } else if (option.rfind("-D ", 0) == 0) {
+      cases.back().settings.macros.emplace_back(
+          option.substr(3, equals - 3),
+          equals == std::string::npos ? std::nullopt
+                                      : std::optional<std::string>(option.substr(equals + 1)));
+    } else if (line == "\\ No newline at end of file") {
+      into->pop_back();
+    } else if (into == &cases.back().outcome) {
+      *into += (into->empty() ? "" : "\n") + line;
+    } else {
+      *into += line + "\n";
+    }
+  }
+  for (Case& c : cases)
+    if (c.texts == std::vector<std::string>{""}) c.texts.clear();
+  return cases;
 }
 
 /// "ok" or "bad" (readUnit's verdict), each port's text after "; ", then each message on a

@@ -5,7 +5,6 @@
 // files that cannot be read.
 #include <gtest/gtest.h>
 
-#include <algorithm>
 #include <string>
 #include <vector>
 
@@ -14,6 +13,7 @@
 
 namespace {
 
+using verilog_test::Case;
 using verilog_test::outcome;
 using verilog_test::read;
 
@@ -39,64 +39,14 @@ std::string longMacroChain() {
   return text + "`A40\n";
 }
 
-constexpr const char* kCaseFile = "tests/lib/scan/verilog/reader_cases.txt";
-
-struct Case {
-  std::string label;
-  std::vector<std::string> texts;
-  std::string outcome;
-  ScanSettings settings = {};
-};
-
-ScanSettings overrides(std::vector<std::pair<std::string, std::string>> values) {
-  ScanSettings settings;
-  settings.genericOverrides = std::move(values);
-  return settings;
-}
-
-ScanSettings macros(std::vector<std::pair<std::string, std::optional<std::string>>> values) {
-  ScanSettings settings;
-  settings.macros = std::move(values);
-  return settings;
-}
-
-// The cases of reader_cases.txt, whose first lines describe the format.
-std::vector<Case> casesFromFile() {
-  std::string data;
-  if (!pinforge_test::readFile(verilog_test::sourcePath(kCaseFile), data))
-    return {{"CaseFile", {}, std::string(kCaseFile) + " cannot be read"}};
-  std::vector<Case> cases;
-  std::string* into = nullptr;
-  for (size_t at = 0, end = 0; at < data.size(); at = end + 1) {
-    end = std::min(data.find('\n', at), data.size());
-    const std::string line = data.substr(at, end - at);
-    if (line.rfind("=== ", 0) == 0) {
-      cases.push_back({line.substr(4), {""}, ""});
-      into = &cases.back().texts.back();
-    } else if (into == nullptr) {
-      continue;
-    } else if (line == "--- next file") {
-      into = &cases.back().texts.emplace_back();
-    } else if (line == "--- outcome") {
-      into = &cases.back().outcome;
-    } else if (line == "\\ No newline at end of file") {
-      into->pop_back();
-    } else if (into == &cases.back().outcome) {
-      *into += (into->empty() ? "" : "\n") + line;
-    } else {
-      *into += line + "\n";
-    }
-  }
-  return cases;
-}
-
-class VerilogReadTest : public testing::TestWithParam<Case> {};
+class VerilogReadTest : public testing::TestWithParam<verilog_test::Case> {};
 
 TEST_P(VerilogReadTest, ReadsAsExpected) {
-  EXPECT_EQ(outcome(read({GetParam().texts, "m", GetParam().settings})), GetParam().outcome);
+  EXPECT_EQ(outcome(read(GetParam().input())), GetParam().outcome);
 }
 
-INSTANTIATE_TEST_SUITE_P(Cases, VerilogReadTest, testing::ValuesIn(casesFromFile()),
+INSTANTIATE_TEST_SUITE_P(Cases, VerilogReadTest,
+                         testing::ValuesIn(verilog_test::casesFromFile("reader_cases.txt")),
                          verilog_test::Label());
 
 // Inputs too large or too odd for the case file.
@@ -166,37 +116,6 @@ INSTANTIATE_TEST_SUITE_P(
              {longMacroChain()},
              "bad\n"
              "t.v:42:1: error: expansion of macro `A40 is too large"}),
-    verilog_test::Label());
-
-INSTANTIATE_TEST_SUITE_P(
-    CommandLine, VerilogReadTest,
-    testing::Values(
-        Case{"OverrideGivesTheMissingValue",
-             {"module m #(parameter W) (input logic [W-1:0] data);\nendmodule\n"},
-             "ok; in logic data[2:0]",
-             overrides({{"W", "3"}})},
-        Case{"MacrosComeBeforeTheFirstFile",
-             {"`ifdef FLAG\n"
-              "module m (input [`ADD(2, 3):0] a);\n"
-              "`else\n"
-              "module m (input b);\n"
-              "`endif\n"
-              "endmodule\n"},
-             "ok; in a[5:0]",
-             macros({{"ADD(x, y)", "x + y"}, {"FLAG", ""}, {"LATE", "1"}})},
-        Case{"BadValuesAreErrorsNamingTheSwitch",
-             {"module m #(parameter W = 1, V = 1, type T = int) (input [W:0] a);\n"
-              "endmodule\n"},
-             "bad; in a[1:0]\n"
-             "-D 1BAD: error: '1BAD' is not a macro name\n"
-             "-g W: error: expected an expression but found the end of the file\n"
-             "-g V:1:3: error: unexpected '3' after the value\n"
-             "-g T: error: expected ']' but found the end of the file",
-             [] {
-               ScanSettings settings = overrides({{"W", "3 +"}, {"V", "2 3"}, {"T", "[3:0"}});
-               settings.macros = {{"1BAD", "2"}};
-               return settings;
-             }()}),
     verilog_test::Label());
 
 }  // namespace
