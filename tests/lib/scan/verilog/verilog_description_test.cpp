@@ -1,14 +1,13 @@
 // What the Verilog reader tells about the selected unit besides port ranges: parameters with
-// their values after -g, declared types and kinds, package imports, the reason a range is
-// unknown, -D and -I, and the unit listing. Each description is flattened to lines so a
-// failure shows every difference at once.
+// their values after -g, declared types and defaults as written, kinds, package imports (the
+// cases of description_cases.txt), then -I with PINFORGE_INCLUDE, hostile -g and -D values,
+// and the unit listing.
 #include <gtest/gtest.h>
 
 #include <cstdlib>
 #include <string>
 #include <vector>
 
-#include "scan/verilog/verilog_text.h"
 #include "verilog_read.h"
 
 namespace {
@@ -143,21 +142,6 @@ TEST(VerilogListingTest, EveryUnitInFileOrder) {
                               "work module r t.v:2",
                               "work module described t.v:4",
                           }));
-}
-
-TEST(VerilogWrittenTextTest, DropsCommentsAndKeepsLiteralsAndEscapedNames) {
-  const std::vector<std::pair<std::string, std::string>> cases = {
-      {"  logic\t[W-1:0]\r\n ", "logic [W-1:0]"},
-      {"\"a // b /* c */\"  // d", "\"a // b /* c */\""},
-      {"\"q\\\" //\"  +  1", "\"q\\\" //\" + 1"},
-      {"\\bus[0]  [3:0]", "\\bus[0] [3:0]"},
-      {"a /* one\ntwo */b", "a b"},
-      {"x /* never closed", "x"},
-      {"\"never closed", "\"never closed"},
-      {std::string("n\0m", 3), std::string("n\0m", 3)},
-      {"", ""},
-  };
-  for (const auto& [text, want] : cases) EXPECT_EQ(scan::verilog::normaliseWritten(text), want);
 }
 
 }  // namespace
