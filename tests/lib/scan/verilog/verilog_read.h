@@ -1,5 +1,6 @@
 // The one way the Verilog reader tests read a design: fixtures and in-memory texts indexed as
-// one compilation unit, one unit selected and described, and the first line of every message.
+// one compilation unit, one unit selected and described, and the first line of every message;
+// and the loader of the case files (reader_cases.txt, description_cases.txt) they run over.
 #pragma once
 
 #include <gtest/gtest.h>
@@ -52,6 +53,7 @@ struct Read {
   std::vector<std::string> messages;  ///< first line of every message
 };
 
+/// Reads `input` with every message kept; the unit is described only when it is found.
 inline Read read(const Input& input) {
   Read result;
   pinforge_test::FilePtr sink(std::tmpfile());

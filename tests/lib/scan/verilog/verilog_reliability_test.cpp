@@ -1,14 +1,13 @@
-// Text in, verdict out: small designs and hostile or truncated Verilog (generated here) must
-// end in the right ports, the right verdict on the selected unit's header and the exact
-// messages, never in a crash, a hang or unbounded memory. Covers the reporting rules for
-// ports, header errors of every kind, preprocessor errors, the evaluator's width rules, and
-// files that cannot be read.
+// Text in, verdict out: small designs and hostile or truncated Verilog must end in the right
+// ports, the right verdict on the selected unit's header and the exact messages, never in a
+// crash, a hang or unbounded memory. The cases of reader_cases.txt cover the reporting rules
+// for ports, header, preprocessor and -g/-D errors of every kind and the evaluator's width
+// rules; the inputs too large or too odd for a text file are generated here.
 #include <gtest/gtest.h>
 
 #include <string>
 #include <vector>
 
-#include "support/scratch_dir.h"
 #include "verilog_read.h"
 
 namespace {
