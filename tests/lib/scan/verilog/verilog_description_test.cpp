@@ -1,25 +1,19 @@
 // What the Verilog reader tells about the selected unit besides port ranges: parameters with
-// their values after -g, declared types and kinds, package imports, the reason a range is
-// unknown, -D and -I, and the unit listing. Each description is flattened to lines so a
-// failure shows every difference at once.
+// their values after -g, declared types and defaults as written, kinds, package imports (the
+// cases of description_cases.txt), then -I with PINFORGE_INCLUDE, hostile -g and -D values,
+// and the unit listing.
 #include <gtest/gtest.h>
 
-#include <cstdio>
 #include <cstdlib>
 #include <string>
 #include <vector>
 
-#include "scan/common/diagnostics.h"
-#include "scan/verilog/verilog_reader.h"
-#include "scan/verilog/verilog_text.h"
-#include "support/scratch_dir.h"
+#include "verilog_read.h"
 
 namespace {
 
-std::string fixture(const std::string& name) {
-  const char* root = std::getenv("PINFORGE_SOURCE_DIR");
-  return std::string(root ? root : ".") + "/tests/fixtures/verilog/" + name;
-}
+using verilog_test::fixture;
+using verilog_test::Input;
 
 const char* kindName(ScanPort::Kind kind) {
   static const char* const names[] = {"bit",   "vector", "integer",   "record",
@@ -27,23 +21,12 @@ const char* kindName(ScanPort::Kind kind) {
   return names[static_cast<int>(kind)];
 }
 
-const char* directionName(int direction) {
-  static const char* const names[] = {"?",      "in",      "out", "inout",
-                                      "buffer", "linkage", "ref", "interface"};
-  return direction >= 1 && direction <= 7 ? names[direction] : names[0];
-}
-
 // "data in 'logic [W-1:0]' vector [7:0]"; an unknown range is "?", none is "-".
 std::string portLine(const ScanPort& port) {
-  std::string range = "-";
-  if (port.rangeUnknown()) {
-    range = "?";
-  } else if (port.hasRange()) {
-    int32_t left = 0, right = 0;
-    port.getBounds(left, right);
-    range = "[" + std::to_string(left) + ":" + std::to_string(right) + "]";
-  }
-  return std::string(port.name()) + " " + directionName(port.direction()) + " '" +
+  const std::string range = port.rangeUnknown() ? "?"
+                            : port.hasRange()   ? verilog_test::bounds(port)
+                                                : "-";
+  return std::string(port.name()) + " " + verilog_test::directionName(port.direction()) + " '" +
          port.declaredType() + "' " + kindName(port.kind()) + " " + range;
 }
 
@@ -54,328 +37,31 @@ std::string genericLine(const ScanGeneric& generic) {
          generic.value.value_or("none") + " @" + std::to_string(generic.sourceLine);
 }
 
-struct Read {
-  bool found = false;
-  bool ok = true;
-  scan::UnitDescription unit;
-  std::vector<std::string> ports;
-  std::vector<std::string> generics;
-  std::vector<std::string> units;
-  std::vector<std::string> messages;  ///< first line of every message
-};
-
-struct Input {
-  std::vector<std::string> fixtures;
-  std::string text;  ///< read after the fixtures as "t.sv", when not empty
-  const char* unit;
-  ScanSettings settings;
-};
-
-Read read(const Input& input) {
-  Read result;
-  pinforge_test::FilePtr sink(std::tmpfile());
-  {
-    scan::Diagnostics diagnostics(sink.get(), 1000);
-    scan::verilog::VerilogReader reader(diagnostics, input.settings);
-    std::vector<scan::DesignFileEntry> files;
-    for (const std::string& name : input.fixtures) files.push_back({"work", fixture(name)});
-    if (!files.empty()) reader.indexFiles(files);
-    if (!input.text.empty()) reader.indexText("t.sv", input.text, "work");
-    result.found = reader.selectUnit("work", input.unit);
-    if (result.found) result.ok = reader.readUnit(result.unit);
-    for (const ScanPort& port : result.unit.ports) result.ports.push_back(portLine(port));
-    for (const ScanGeneric& generic : result.unit.generics)
-      result.generics.push_back(genericLine(generic));
-    for (const ScanUnitInfo& info : reader.listUnits()) {
-      std::string file = info.file.substr(info.file.rfind('/') + 1);
-      result.units.push_back(info.library + " " + info.kind + " " + info.name + " " + file + ":" +
-                             std::to_string(info.line));
-    }
-  }
-  result.messages = pinforge_test::messageHeads(pinforge_test::readBack(sink.get()));
-  return result;
+// The verdict, then "parameter ..." for each parameter, "port ..." for each port and the
+// context lines, as in description_cases.txt.
+std::string description(const verilog_test::Read& result) {
+  std::string out = result.ok ? "ok" : "bad";
+  for (const ScanGeneric& generic : result.unit.generics)
+    out += "\nparameter " + genericLine(generic);
+  for (const ScanPort& port : result.unit.ports) out += "\nport " + portLine(port);
+  return out + (result.unit.context.empty() ? "" : "\n" + result.unit.context);
 }
 
-ScanSettings overrides(std::vector<std::pair<std::string, std::string>> values) {
-  ScanSettings settings;
-  settings.genericOverrides = std::move(values);
-  return settings;
+std::vector<std::string> portsOf(const verilog_test::Read& result) {
+  std::vector<std::string> lines;
+  for (const ScanPort& port : result.unit.ports) lines.push_back(portLine(port));
+  return lines;
 }
 
-struct DescriptionCase {
-  const char* label;
-  Input input;
-  std::vector<std::string> generics;
-  std::vector<std::string> ports;
-  std::string context;
-};
-
-const std::vector<DescriptionCase>& descriptionCases() {
-  static const std::vector<DescriptionCase> all = {
-      {"AnsiTypesKindsAndImports",
-       {{"described.sv"}, "", "ansi_typed", {}},
-       {"W 'int' = '8' -> 8 @27", "D '' = 'W * 2' -> 16 @28",
-        "T type 'type' = 'logic [W-1:0]' -> none @29", "R 'real' = '1.5' -> 1.5 @30",
-        "S 'string' = '\"a  b\"' -> \"a  b\" @31", "N 'logic [3:0]' = '4'd5' -> 5 @33",
-        "M 'logic [3:0]' = 'N + 1' -> 6 @33"},
-       {"data in 'logic [W-1:0]' vector [7:0]", "sdata in 'wire signed [7:0]' vector [7:0]",
-        "req out 'req_t' record [11:0]", "mode out 'desc_pkg::mode_t' enum [1:0]",
-        "b in 'byte_t' vector [7:0]", "mem in 'mem_t' array [7:0]",
-        "arr in 'logic [7:0]' array [7:0]", "count in 'integer' integer -",
-        "word in 'int' integer [31:0]", "typed in 'T' vector [7:0]",
-        "reqs in 'req_t [1:0]' array [23:0]", "s interface 'bus_if.slave' interface -",
-        "flag out 'logic [D-1:0]' vector [15:0]", "m interface 'bus_if' interface -"},
-       "import desc_pkg::*;\nimport other_pkg::SHIFT;"},
-      {"OverridesReachEveryWidthThatUsesThem",
-       {{"described.sv"},
-        "",
-        "ansi_typed",
-        overrides({{"W", "4"},
-                   {"T", "logic [W+1:0]"},
-                   {"R", "2.0"},
-                   {"S", "\"x\""},
-                   {"N", "4'd2 + 1"},
-                   {"L", "9"},
-                   {"D", "W + 1"}})},
-       {"W 'int' = '8' -> 4 @27", "D '' = 'W * 2' -> 5 @28",
-        "T type 'type' = 'logic [W-1:0]' -> none @29", "R 'real' = '1.5' -> 2.0 @30",
-        "S 'string' = '\"a  b\"' -> \"x\" @31", "N 'logic [3:0]' = '4'd5' -> 3 @33",
-        "M 'logic [3:0]' = 'N + 1' -> 4 @33"},
-       {"data in 'logic [W-1:0]' vector [3:0]", "sdata in 'wire signed [7:0]' vector [7:0]",
-        "req out 'req_t' record [11:0]", "mode out 'desc_pkg::mode_t' enum [1:0]",
-        "b in 'byte_t' vector [7:0]", "mem in 'mem_t' array [7:0]",
-        "arr in 'logic [7:0]' array [7:0]", "count in 'integer' integer -",
-        "word in 'int' integer [31:0]", "typed in 'T' vector [5:0]",
-        "reqs in 'req_t [1:0]' array [23:0]", "s interface 'bus_if.slave' interface -",
-        "flag out 'logic [D-1:0]' vector [4:0]", "m interface 'bus_if' interface -"},
-       "import desc_pkg::*;\nimport other_pkg::SHIFT;"},
-      {"NonAnsiTypesFromTheBodyAndBodyParameters",
-       {{"described.sv"}, "", "nonansi_typed", {}},
-       {"WIDTH '' = '4' -> 4 @55", "INIT '[7:0]' = '8'h0f' -> 15 @57"},
-       {"clk in '' bit -", "q out 'reg [WIDTH-1:0]' vector [3:0]",
-        "d in 'wire [HALF-1:0]' vector [1:0]", "bus inout '[7:0]' vector [7:0]",
-        "sel out 'reg' bit -"},
-       "import desc_pkg::*;"},
-      {"NonAnsiOverride",
-       {{"described.sv"}, "", "nonansi_typed", overrides({{"WIDTH", "8"}, {"HALF", "1"}})},
-       {"WIDTH '' = '4' -> 8 @55", "INIT '[7:0]' = '8'h0f' -> 15 @57"},
-       {"clk in '' bit -", "q out 'reg [WIDTH-1:0]' vector [7:0]",
-        "d in 'wire [HALF-1:0]' vector [3:0]", "bus inout '[7:0]' vector [7:0]",
-        "sel out 'reg' bit -"},
-       "import desc_pkg::*;"},
-      {"AParameterListHidesBodyParameters",
-       {{},
-        "module m #(parameter A = 1, localparam B = A, C = 2, parameter signed E = -1)\n"
-        "  (input [A:0] x);\n"
-        "  parameter F = 3;\n"
-        "endmodule\n",
-        "m",
-        {}},
-       {"A '' = '1' -> 1 @1", "E 'signed' = '-1' -> -1 @1"},
-       {"x in '[A:0]' vector [1:0]"},
-       ""},
-      {"ListWithoutParametersStillHidesTheBody",
-       {{}, "module m #() (input x);\n  parameter F = 3;\nendmodule\n", "m", {}},
-       {},
-       {"x in '' bit -"},
-       ""},
-      {"TypeParameterWithANamedDefaultAndOverride",
-       {{},
-        "typedef logic [4:0] five_t;\n"
-        "typedef struct packed { logic a; } one_t;\n"
-        "module m #(parameter type T = five_t, U = int) (input T t, input U u);\n"
-        "endmodule\n",
-        "m",
-        overrides({{"U", "one_t"}})},
-       {"T type 'type' = 'five_t' -> none @3", "U type 'type' = 'int' -> none @3"},
-       {"t in 'T' vector [4:0]", "u in 'U' record -"},
-       ""},
-      {"InterfacePortsOfAnInterfaceNoFileDeclares",
-       {{},
-        "module m (input clk, output logic o, bus_if m, bus_if.slave s [2], interface i);\n"
-        "endmodule\n",
-        "m",
-        {}},
-       {},
-       {"clk in '' bit -", "o out 'logic' bit -", "m interface 'bus_if' interface -",
-        "s interface 'bus_if.slave' interface -", "i interface 'interface' interface -"},
-       ""},
-      {"ImportsBeforeTheUnitOnlyOnceEach",
-       {{},
-        "package p; localparam X = 1; endpackage\n"
-        "package q; localparam Y = 1; endpackage\n"
-        "import p::*;\n"
-        "import p::X, q::Y;\n"
-        "module m import p::*, q::*; (input [X:0] a);\n"
-        "endmodule\n"
-        "import q::*;\n",
-        "m",
-        {}},
-       {},
-       {"a in '[X:0]' vector [1:0]"},
-       "import p::*;\nimport p::X, q::Y;\nimport p::*, q::*;"},
-      {"NonAnsiBodyImportsArePartOfTheContext",
-       {{},
-        "package p; typedef logic [2:0] t; endpackage\n"
-        "module m (a);\n"
-        "  import p::*;\n"
-        "  input t a;\n"
-        "endmodule\n",
-        "m",
-        {}},
-       {},
-       {"a in 't' vector [2:0]"},
-       "import p::*;"},
-      {"CommentsAndLineBreaksInWrittenText",
-       {{},
-        "module m #(parameter /* kind */ int\n  W = 4 /* four */ + // more\n  1)\n"
-        "  (input logic /* c */ [W-1\n    :0] a);\n"
-        "endmodule\n",
-        "m",
-        {}},
-       {"W 'int' = '4 + 1' -> 5 @2"},
-       {"a in 'logic [W-1 :0]' vector [4:0]"},
-       ""},
-      {"FifoHeaderAsFoundInTheWild",
-       {{},
-        "module fifo #(\n"
-        "  parameter int unsigned DEPTH = 8,\n"
-        "  parameter bit FALL_THROUGH = 1'b0,\n"
-        "  parameter type dtype = logic [7:0],\n"
-        "  parameter int unsigned ADDR_DEPTH = (DEPTH > 1) ? $clog2(DEPTH) : 1\n"
-        ") (\n"
-        "  input  logic clk_i,\n"
-        "  input  dtype data_i,\n"
-        "  output logic [ADDR_DEPTH-1:0] usage_o\n"
-        ");\n"
-        "endmodule\n",
-        "fifo",
-        overrides({{"DEPTH", "32"}})},
-       {"DEPTH 'int unsigned' = '8' -> 32 @2", "FALL_THROUGH 'bit' = '1'b0' -> 0 @3",
-        "dtype type 'type' = 'logic [7:0]' -> none @4",
-        "ADDR_DEPTH 'int unsigned' = '(DEPTH > 1) ? $clog2(DEPTH) : 1' -> 5 @5"},
-       {"clk_i in 'logic' bit -", "data_i in 'dtype' vector [7:0]",
-        "usage_o out 'logic [ADDR_DEPTH-1:0]' vector [4:0]"},
-       ""},
-      {"SelectsAndConcatenationsHaveTheirEvaluatedRange",
-       {{},
-        "module m (.p(x[5:2]), .q({x, y}), y);\n"
-        "  input [7:0] x;\n"
-        "  input y;\n"
-        "endmodule\n",
-        "m",
-        {}},
-       {},
-       {"p in '[5:2]' vector [5:2]", "q in '[8:0]' vector [8:0]", "y in '' bit -"},
-       ""},
-  };
-  return all;
-}
-
-class VerilogDescriptionTest : public testing::TestWithParam<DescriptionCase> {};
+class VerilogDescriptionTest : public testing::TestWithParam<verilog_test::Case> {};
 
 TEST_P(VerilogDescriptionTest, DescribesTheUnit) {
-  const DescriptionCase& c = GetParam();
-  Read result = read(c.input);
-  ASSERT_TRUE(result.found);
-  EXPECT_TRUE(result.ok);
-  EXPECT_EQ(result.generics, c.generics);
-  EXPECT_EQ(result.ports, c.ports);
-  EXPECT_EQ(result.unit.context, c.context);
+  EXPECT_EQ(description(verilog_test::read(GetParam().input())), GetParam().outcome);
 }
 
-INSTANTIATE_TEST_SUITE_P(Cases, VerilogDescriptionTest, testing::ValuesIn(descriptionCases()),
-                         [](const auto& info) { return std::string(info.param.label); });
-
-struct ProblemCase {
-  const char* label;
-  std::string text;
-  ScanSettings settings;
-  const char* port;
-  const char* problem;  ///< empty when the range must evaluate
-};
-
-const std::vector<ProblemCase>& problemCases() {
-  static const std::vector<ProblemCase> all = {
-      {"ParameterWithoutDefault",
-       "module m #(parameter W) (input logic [W-1:0] data);\nendmodule\n",
-       {},
-       "data",
-       "port 'data': cannot evaluate [W-1:0]: parameter 'W' has no value; give one with -g "
-       "W=VALUE"},
-      {"OverrideGivesTheMissingValue",
-       "module m #(parameter W) (input logic [W-1:0] data);\nendmodule\n", overrides({{"W", "3"}}),
-       "data", ""},
-      {"ScopedTypeOfAMissingPackage",
-       "module m (input axi_pkg::req_t req);\nendmodule\n",
-       {},
-       "req",
-       "port 'req': cannot evaluate axi_pkg::req_t: package 'axi_pkg' is not in any design "
-       "file; add the file that declares it"},
-      {"ScopedNameOfAMissingPackage",
-       "module m (input logic [axi_pkg::W-1:0] d);\nendmodule\n",
-       {},
-       "d",
-       "port 'd': cannot evaluate [axi_pkg::W-1:0]: package 'axi_pkg' is not in any design file; "
-       "add the file that declares it"},
-      {"NameFromAMissingImportedPackage",
-       "import axi_pkg::*;\nmodule m (input logic [AW-1:0] a);\nendmodule\n",
-       {},
-       "a",
-       "port 'a': cannot evaluate [AW-1:0]: unknown name 'AW'; package 'axi_pkg' is not in any "
-       "design file; add the file that declares it"},
-      {"TypeFromMissingImportedPackages",
-       "module m import a_pkg::*, b_pkg::*; (input req_t r);\nendmodule\n",
-       {},
-       "r",
-       "port 'r': cannot evaluate req_t: unknown type 'req_t'; packages 'a_pkg' and 'b_pkg' are "
-       "not in any design file; add the files that declare them"},
-      {"LocalparamWithoutValueHasNoOverrideHint",
-       "module m (a);\n  localparam W;\n  input [W:0] a;\nendmodule\n",
-       {},
-       "a",
-       "port 'a': cannot evaluate [W:0]: parameter 'W' has no value"},
-      {"UnsupportedConstruct",
-       "module m (input logic [$random:0] x);\nendmodule\n",
-       {},
-       "x",
-       "port 'x': cannot evaluate [$random:0]: unsupported system function $random"},
-      {"FailureInsideATypedef",
-       "module m #(parameter W) (x);\n  typedef logic [W:0] w_t;\n  input w_t x;\nendmodule\n",
-       {},
-       "x",
-       "port 'x': cannot evaluate w_t: parameter 'W' has no value; give one with -g W=VALUE"},
-      {"NonAnsiSelect",
-       "module m (.p(x[W-1:0]));\n  parameter W;\n  input [7:0] x;\nendmodule\n",
-       {},
-       "p",
-       "port 'p': cannot evaluate .p(x[W-1:0]): parameter 'W' has no value; give one with -g "
-       "W=VALUE"},
-  };
-  return all;
-}
-
-class VerilogRangeProblemTest : public testing::TestWithParam<ProblemCase> {};
-
-TEST_P(VerilogRangeProblemTest, NamesTheCauseAndTheFix) {
-  const ProblemCase& c = GetParam();
-  Read result = read({{}, c.text, "m", c.settings});
-  ASSERT_TRUE(result.found);
-  const ScanPort* port = nullptr;
-  for (const ScanPort& candidate : result.unit.ports)
-    if (std::string(candidate.name()) == c.port) port = &candidate;
-  ASSERT_NE(port, nullptr);
-  EXPECT_EQ(port->rangeProblem(), c.problem);
-  EXPECT_EQ(port->rangeUnknown(), !port->hasRange() && *c.problem != '\0');
-  // The warning of old stays for every unknown range.
-  size_t warnings = 0;
-  for (const std::string& message : result.messages)
-    warnings += message.find("warning: cannot evaluate the range of port") != std::string::npos;
-  EXPECT_EQ(warnings, *c.problem ? 1u : 0u);
-}
-
-INSTANTIATE_TEST_SUITE_P(Cases, VerilogRangeProblemTest, testing::ValuesIn(problemCases()),
-                         [](const auto& info) { return std::string(info.param.label); });
+INSTANTIATE_TEST_SUITE_P(Cases, VerilogDescriptionTest,
+                         testing::ValuesIn(verilog_test::casesFromFile("description_cases.txt")),
+                         verilog_test::Label());
 
 struct SearchCase {
   const char* label;
@@ -410,50 +96,12 @@ TEST(VerilogCommandLineTest, IncludeFoldersAndMacros) {
     ScanSettings settings;
     settings.includeDirectories = c.includeDirectories;
     settings.macros = c.macros;
-    Read result = read({{"search/include_order.v"}, "", "include_order", settings});
+    const verilog_test::Read result =
+        verilog_test::read({{}, "include_order", settings, {fixture("search/include_order.v")}});
     ASSERT_TRUE(result.found);
-    EXPECT_EQ(result.ports, c.ports);
+    EXPECT_EQ(portsOf(result), c.ports);
   }
   unsetenv("PINFORGE_INCLUDE");
-}
-
-TEST(VerilogCommandLineTest, MacrosComeBeforeTheFirstFile) {
-  ScanSettings settings;
-  settings.macros = {{"ADD(x, y)", "x + y"}, {"FLAG", ""}, {"LATE", "1"}};
-  Read result = read({{},
-                      "`ifdef FLAG\n"
-                      "module m (input [`ADD(2, 3):0] a);\n"
-                      "`else\n"
-                      "module m (input b);\n"
-                      "`endif\n"
-                      "endmodule\n",
-                      "m",
-                      settings});
-  ASSERT_TRUE(result.found);
-  EXPECT_EQ(result.ports, std::vector<std::string>{"a in '[`ADD(2, 3):0]' vector [5:0]"});
-  EXPECT_TRUE(result.messages.empty());
-}
-
-TEST(VerilogCommandLineTest, BadValuesAreErrorsNamingTheSwitch) {
-  ScanSettings settings;
-  settings.genericOverrides = {{"W", "3 +"}, {"V", "2 3"}, {"T", "[3:0"}};
-  settings.macros = {{"1BAD", "2"}};
-  Read result = read({{},
-                      "module m #(parameter W = 1, V = 1, type T = int) (input [W:0] a);\n"
-                      "endmodule\n",
-                      "m",
-                      settings});
-  ASSERT_TRUE(result.found);
-  EXPECT_FALSE(result.ok);
-  EXPECT_EQ(result.messages,
-            (std::vector<std::string>{
-                "-D 1BAD: error: '1BAD' is not a macro name",
-                "-g W: error: expected an expression but found the end of the file",
-                "-g V:1:3: error: unexpected '3' after the value",
-                "-g T: error: expected ']' but found the end of the file",
-            }));
-  // A value that could not be read leaves the default in place.
-  EXPECT_EQ(result.ports, std::vector<std::string>{"a in '[W:0]' vector [1:0]"});
 }
 
 TEST(VerilogCommandLineTest, HostileValuesEndInMessages) {
@@ -464,50 +112,36 @@ TEST(VerilogCommandLineTest, HostileValuesEndInMessages) {
     ScanSettings settings;
     settings.genericOverrides = {{"W", value}};
     settings.macros = {{"LINES", "1 +\n 2"}, {"OTHER", value}};
-    Read result = read({{},
-                        "module m #(parameter W = 1) (input [W:0] a, input [`LINES:0] b);\n"
-                        "endmodule\n",
-                        "m",
-                        settings});
+    const verilog_test::Read result =
+        verilog_test::read({{"module m #(parameter W = 1) (input [W:0] a, input [`LINES:0] b);\n"
+                             "endmodule\n"},
+                            "m",
+                            settings});
     ASSERT_TRUE(result.found);
     EXPECT_FALSE(result.ok);
     EXPECT_FALSE(result.messages.empty());
-    ASSERT_EQ(result.ports.size(), 2u);
-    EXPECT_EQ(result.ports[1], "b in '[`LINES:0]' vector [3:0]");
+    ASSERT_EQ(portsOf(result).size(), 2u);
+    EXPECT_EQ(portsOf(result)[1], "b in '[`LINES:0]' vector [3:0]");
   }
 }
 
 TEST(VerilogListingTest, EveryUnitInFileOrder) {
-  Read result = read({{"described.sv"},
-                      "program p; endprogram\nmacromodule r (input a); endmodule\n"
-                      "interface class c; endclass\nmodule described; endmodule\n",
-                      "described",
-                      {}});
+  const verilog_test::Read result =
+      verilog_test::read({{"program p; endprogram\nmacromodule r (input a); endmodule\n"
+                           "interface class c; endclass\nmodule described; endmodule\n"},
+                          "described",
+                          {},
+                          {fixture("described.sv")}});
   EXPECT_EQ(result.units, (std::vector<std::string>{
                               "work package desc_pkg described.sv:2",
                               "work package other_pkg described.sv:13",
                               "work interface bus_if described.sv:19",
                               "work module ansi_typed described.sv:25",
                               "work module nonansi_typed described.sv:54",
-                              "work program p t.sv:1",
-                              "work module r t.sv:2",
-                              "work module described t.sv:4",
+                              "work program p t.v:1",
+                              "work module r t.v:2",
+                              "work module described t.v:4",
                           }));
-}
-
-TEST(VerilogWrittenTextTest, DropsCommentsAndKeepsLiteralsAndEscapedNames) {
-  const std::vector<std::pair<std::string, std::string>> cases = {
-      {"  logic\t[W-1:0]\r\n ", "logic [W-1:0]"},
-      {"\"a // b /* c */\"  // d", "\"a // b /* c */\""},
-      {"\"q\\\" //\"  +  1", "\"q\\\" //\" + 1"},
-      {"\\bus[0]  [3:0]", "\\bus[0] [3:0]"},
-      {"a /* one\ntwo */b", "a b"},
-      {"x /* never closed", "x"},
-      {"\"never closed", "\"never closed"},
-      {std::string("n\0m", 3), std::string("n\0m", 3)},
-      {"", ""},
-  };
-  for (const auto& [text, want] : cases) EXPECT_EQ(scan::verilog::normaliseWritten(text), want);
 }
 
 }  // namespace

@@ -8,12 +8,11 @@
 
 #include "scan/common/diagnostics.h"
 #include "scan/common/source_buffer.h"
-#include "scan/verilog/verilog_eval.h"
 #include "scan/verilog/verilog_lexer.h"
-#include "scan/verilog/verilog_parser.h"
 #include "scan/verilog/verilog_preprocessor.h"
 #include "scan/verilog/verilog_sources.h"
 #include "support/scratch_dir.h"
+#include "verilog_read.h"
 
 namespace scan::verilog {
 namespace {
@@ -82,41 +81,12 @@ INSTANTIATE_TEST_SUITE_P(
                 "I:i P:|-> I:j"},
         LexCase{"SystemNamesAndDirectives", "$clog2(`W) $ `\"", "S:$clog2 P:( D:W P:) P:$ P:`\""},
         LexCase{"IdentifiersWithDollarAndDigits", "a$b _c9 9d", "I:a$b I:_c9 N:9d"}),
-    [](const testing::TestParamInfo<LexCase>& info) { return std::string(info.param.label); });
+    verilog_test::Label());
 
 TEST(VerilogLexerCoarseTest, ReturnsOnlyWhatTheIndexNeeds) {
   EXPECT_EQ(lex("NAND2 \\u[1] ( .A(n1), .Y(\\n[2] ) ); wire x; end : lbl @ \"s\" `D $f(1)", true),
             "P:; I:wire P:; I:end P:: P:@ Q:\"s\" D:D");
 }
-
-struct NumberCase {
-  const char* text;
-  int64_t value;
-  int width;
-  bool known;
-};
-
-class VerilogNumberTest : public testing::TestWithParam<NumberCase> {};
-
-TEST_P(VerilogNumberTest, Value) {
-  Expr expr;
-  bool known = parseNumber(GetParam().text, expr);
-  EXPECT_EQ(known, GetParam().known);
-  if (!known) return;
-  EXPECT_EQ(expr.integer, GetParam().value);
-  EXPECT_EQ(expr.width, GetParam().width);
-}
-
-INSTANTIATE_TEST_SUITE_P(
-    Literals, VerilogNumberTest,
-    testing::Values(NumberCase{"42", 42, 0, true}, NumberCase{"1_000", 1000, 0, true},
-                    NumberCase{"8'hFF", 255, 8, true}, NumberCase{"4'hFF", 15, 4, true},
-                    NumberCase{"4'sb1111", -1, 4, true}, NumberCase{"'d12", 12, 0, true},
-                    NumberCase{"12 'o17", 15, 12, true}, NumberCase{"'1", 1, 1, true},
-                    NumberCase{"64'hFFFF_FFFF_FFFF_FFFF", -1, 64, true},
-                    NumberCase{"8'b1x", 0, 0, false}, NumberCase{"'z", 0, 0, false},
-                    NumberCase{"99999999999999999999", 0, 0, false},
-                    NumberCase{"10ns", 0, 0, false}, NumberCase{"4'b102", 0, 0, false}));
 
 // Preprocesses `text` and returns the token texts joined by blanks.
 std::string preprocess(const std::string& text, std::string* messages = nullptr) {
@@ -188,60 +158,24 @@ INSTANTIATE_TEST_SUITE_P(
                        "`pragma protect end_protected\nb `protected\n@#$`\n`endprotected\nc",
                        "a b c"},
         PreprocessCase{"FileAndLine", "\n`__LINE__ `__FILE__", "2 \"t.v\""}),
-    [](const testing::TestParamInfo<PreprocessCase>& info) {
-      return std::string(info.param.label);
-    });
+    verilog_test::Label());
 
-// Evaluates a constant expression with the parameters declared in `declarations`.
-class ExpressionScope : public ScopeProvider {
- public:
-  Scope* package(const std::string&) override { return nullptr; }
-  Scope* compilationUnit() override { return &m_Unit; }
-
- private:
-  Scope m_Unit;
-};
-
+// The value of parameter X = `expression`, read with P = 5, Q = P * 2, [3:0] N = 20 and
+// R = 2.5 declared before it; "error: ..." with the reason when X has no value.
 std::string evaluate(const std::string& expression) {
-  MacroTable macros;
-  SourceStore sources("", {});
-  std::unique_ptr<SourceBuffer> source = SourceBuffer::fromText(
-      "t.v", "parameter P = 5, Q = P * 2, [3:0] N = 20, R = 2.5; " + expression);
-  Preprocessor pre(nullptr, macros, sources);
-  pre.start(*source, 0, 0);
-  TokenStream tokens(pre);
-  Parser parser(tokens);
-  Scope scope;
-  tokens.take();
-  do {
-    std::string name(tokens.take().text);
-    auto type = std::make_shared<TypeSpec>();
-    if (name == "[") {
-      Dimension dim;
-      dim.left = parser.expression();
-      tokens.take();
-      dim.right = parser.expression();
-      tokens.take();
-      type->packed.push_back(dim);
-      name.assign(tokens.take().text);
-    }
-    tokens.take();
-    Parameter parameter;
-    parameter.value = parser.expression();
-    if (!type->packed.empty()) parameter.type = type;
-    scope.parameters.emplace(name, parameter);
-  } while (tokens.acceptSymbol(","));
-  tokens.take();
-  ExprPtr expr = parser.expression();
-  if (!expr) return "parse error: " + parser.errorText();
-  ExpressionScope provider;
-  Evaluator evaluator(provider);
-  Value value;
-  if (!evaluator.evaluate(*expr, scope, value)) return "error: " + evaluator.error();
-  if (value.isReal()) return "real " + std::to_string(value.asReal());
-  if (value.isString()) return "string " + value.asString();
-  return std::to_string(value.asInteger());
+  const verilog_test::Read result = verilog_test::read(
+      {{"module m #(parameter P = 5, parameter Q = P * 2, parameter [3:0] N = 20,\n"
+        "  parameter R = 2.5, parameter X = " +
+        expression + ")\n(input [X:0] a); endmodule\n"}});
+  if (!result.ok) return result.messages.empty() ? "not ok" : result.messages.front();
+  for (const ScanGeneric& generic : result.unit.generics)
+    if (generic.name == "X" && generic.value) return *generic.value;
+  if (result.unit.ports.size() != 1) return "no port";
+  const std::string problem = result.unit.ports[0].rangeProblem();
+  return "error: " + problem.substr(problem.find("]: ") + 3);
 }
+
+const char* const kXz = "error: a literal with x or z bits has no numeric value";
 
 struct EvalCase {
   std::string expression;
@@ -257,6 +191,11 @@ TEST_P(VerilogEvaluatorTest, Evaluates) {
 INSTANTIATE_TEST_SUITE_P(
     Expressions, VerilogEvaluatorTest,
     testing::Values(
+        EvalCase{"42", "42"}, EvalCase{"1_000", "1000"}, EvalCase{"8'hFF", "255"},
+        EvalCase{"4'hFF", "15"}, EvalCase{"4'sb1111", "-1"}, EvalCase{"'d12", "12"},
+        EvalCase{"12 'o17", "15"}, EvalCase{"'1", "1"}, EvalCase{"64'hFFFF_FFFF_FFFF_FFFF", "-1"},
+        EvalCase{"$bits(8'hFF) + $bits(12 'o17) * 100 + $bits('1) * 10000", "11208"},
+        EvalCase{"8'b1x", kXz}, EvalCase{"'z", kXz}, EvalCase{"10ns", kXz}, EvalCase{"4'b102", kXz},
         EvalCase{"1 + 2 * 3 - 4 / 2", "5"}, EvalCase{"2 ** 3 ** 2", "64"},
         EvalCase{"(1 + 2) * 3", "9"}, EvalCase{"-7 % 3", "-1"}, EvalCase{"1 << 4 | 1", "17"},
         EvalCase{"-16 >>> 2", "-4"}, EvalCase{"8'hF0 >> 4", "15"}, EvalCase{"5 & 3 ^ 1 | 8", "8"},
@@ -267,8 +206,8 @@ INSTANTIATE_TEST_SUITE_P(
         EvalCase{"|Q", "1"}, EvalCase{"^3'b111", "1"}, EvalCase{"{4'h1, 4'h2}", "18"},
         EvalCase{"{2{2'b10}}", "10"},
         EvalCase{"$clog2(1) + $clog2(2) * 10 + $clog2(1025) * 100", "1110"},
-        EvalCase{"$bits(N) + $bits(logic [3:0][1:0])", "12"}, EvalCase{"R * 2", "real 5.000000"},
-        EvalCase{"$rtoi(R) + $ceil(R)", "real 5.000000"}, EvalCase{"\"ab\" == \"ab\"", "1"},
+        EvalCase{"$bits(N) + $bits(logic [3:0][1:0])", "12"}, EvalCase{"R * 2", "5.0"},
+        EvalCase{"$rtoi(R) + $ceil(R)", "5.0"}, EvalCase{"\"ab\" == \"ab\"", "1"},
         EvalCase{"int'(P) + 4'(1)", "6"}, EvalCase{"1 / 0", "error: division by zero"},
         EvalCase{"9223372036854775807 + 1", "error: arithmetic overflow in '+'"},
         // Unsigned operands wrap at the wider operand's width, an integer counting 32 bits.
@@ -279,12 +218,11 @@ INSTANTIATE_TEST_SUITE_P(
         EvalCase{"8'hFF << 1", "254"}, EvalCase{"4'sd7 + 4'sd7", "14"}, EvalCase{"80'h5 + 1", "6"},
         EvalCase{"80'h1_0000_0000_0000_0000", "error: the literal does not fit in 64 bits"},
         EvalCase{"99999999999999999999", "error: the literal does not fit in 64 bits"},
-        EvalCase{"UNKNOWN + 1", "error: unknown name 'UNKNOWN'"},
-        EvalCase{"4'bx1 + 1", "error: a literal with x or z bits has no numeric value"},
+        EvalCase{"UNKNOWN + 1", "error: unknown name 'UNKNOWN'"}, EvalCase{"4'bx1 + 1", kXz},
         EvalCase{"{P, 1'b1}", "error: a concatenation needs sized operands"},
         EvalCase{"$fopen(1)", "error: unsupported system function $fopen"},
         EvalCase{"f(1)", "error: unknown function 'f'"},
-        EvalCase{"(1 + ", "parse error: expected an expression but found the end of the file"}));
+        EvalCase{"(1 + ", "t.v:2:41: error: expected an expression but found ')'"}));
 
 }  // namespace
 }  // namespace scan::verilog

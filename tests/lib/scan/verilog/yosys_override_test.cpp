@@ -3,20 +3,17 @@
 // and elaborated by Yosys with chparam setting the same values; every port's bounds must agree.
 #include <gtest/gtest.h>
 
-#include <nlohmann/json.hpp>
-
-#include <filesystem>
 #include <map>
 #include <ostream>
 #include <string>
 #include <vector>
 
-#include "platform/scan.h"
 #include "support/diff_tools.h"
+#include "yosys_harness.h"
 
 namespace {
 
-using namespace difftest;
+using namespace yosys_test;
 
 struct Override {
   std::string name;
@@ -95,65 +92,17 @@ const OverrideCase kCases[] = {
 
 void PrintTo(const OverrideCase& c, std::ostream* os) { *os << c.label; }
 
-std::string fixtureDir() { return sourceDir() + "/tests/fixtures/verilog"; }
-
-// Yosys writes escaped identifiers without the backslash and the terminating blank.
-std::string plainName(std::string name) {
-  if (!name.empty() && name[0] == '\\') name.erase(0, 1);
-  while (!name.empty() && (name.back() == ' ' || name.back() == '\t')) name.pop_back();
-  return name;
-}
-
-/// "[left:right]", "[left:right] ascending", or "scalar" for a single bit at 0 (with a range
-/// [0:0] or none).
-std::string oursRange(const ScanPort& port) {
-  if (port.rangeUnknown()) return "unknown: " + port.rangeProblem();
-  if (!port.hasRange()) return "scalar";
-  int32_t left = 0;
-  int32_t right = 0;
-  port.getBounds(left, right);
-  if (left == 0 && right == 0) return "scalar";
-  return "[" + std::to_string(left) + ":" + std::to_string(right) + "]" +
-         (port.isAscending() != 0 && left != right ? " ascending" : "");
-}
-
-/// The same form for a port of Yosys' JSON, which cannot tell a scalar from [0:0].
-std::string theirRange(const nlohmann::json& port) {
-  const long long width =
-      static_cast<long long>(port.value("bits", nlohmann::json::array()).size());
-  const long long offset = port.value("offset", 0LL);
-  const bool upto = port.value("upto", 0) != 0;
-  if (width == 1 && offset == 0) return "scalar";
-  const long long left = upto ? offset : offset + width - 1;
-  const long long right = upto ? offset + width - 1 : offset;
-  return "[" + std::to_string(left) + ":" + std::to_string(right) + "]" +
-         (upto && width > 1 ? " ascending" : "");
-}
-
-// Types whose width the type itself gives; such a port has no range of its own.
-const std::map<std::string, std::string> kImpliedRanges = {{"integer", "[31:0]"},
-                                                           {"int", "[31:0]"}};
-
-/// Every port's range by name, as the reader gives it with `settings`; empty when the module
-/// is not found.
+/// Port name -> "direction range" of `module` read with `overrides`; empty when not found.
 std::map<std::string, std::string> readOurs(const std::string& file, const char* module,
-                                            ScanSettings settings,
-                                            std::vector<std::string>& unknownNames) {
-  std::map<std::string, std::string> ranges;
-  ScanExtractor extractor;
-  extractor.configure(std::move(settings));
-  extractor.addDesignFile("work", file.c_str(), ScanExtractor::Verilog);
-  extractor.Parse(ScanExtractor::Verilog);
-  if (!extractor.selectDesignUnit("work", module, ScanExtractor::SearchAllLibraries)) return ranges;
-  const ScanPortList& ports = *extractor.getPorts();
-  for (const ScanPort* port = ports.firstPort(); port != nullptr; port = ports.nextPort(port)) {
-    std::string range = oursRange(*port);
-    const auto implied = kImpliedRanges.find(port->typeName());
-    if (range == "scalar" && implied != kImpliedRanges.end()) range = implied->second;
-    ranges[plainName(port->name())] = range;
-  }
-  unknownNames = extractor.unknownOverrides();
-  return ranges;
+                                            const std::vector<Override>& overrides) {
+  ScanSettings settings;
+  for (const Override& o : overrides) settings.genericOverrides.emplace_back(o.name, o.ours);
+  const std::unique_ptr<ScanExtractor> extractor = parsed({file}, std::move(settings));
+  if (!extractor->selectDesignUnit("work", module, ScanExtractor::SearchAllLibraries)) return {};
+  std::map<std::string, std::string> ports = ourPorts(*extractor->getPorts());
+  EXPECT_EQ(extractor->unknownOverrides(), std::vector<std::string>{})
+      << "overrides that name no parameter";
+  return ports;
 }
 
 class YosysOverride : public testing::TestWithParam<OverrideCase> {};
@@ -171,44 +120,25 @@ TEST_P(YosysOverride, PortRangesMatchYosysChparam) {
 
   // Without -noblackbox Yosys makes a module with an empty body a black box, which chparam
   // does not select.
-  std::string script = "read_verilog -sv -noblackbox -I" + fixtureDir() + " " + file + "\n";
-  script += "chparam";
+  std::string script = "read_verilog -sv -noblackbox -I" + fixtureDir() + " " + file + "\nchparam";
   for (const Override& o : c.overrides) script += " -set " + o.name + " " + o.yosys;
-  script += " " + std::string(c.module) + "\n";
-  script += "hierarchy -top " + std::string(c.module) + "\nproc\n";
-  script += "write_json " + dir.file("out.json") + "\n";
-  ASSERT_TRUE(dir.write("run.ys", script));
-  const ToolRun run = runTool({yosys, "-q", "-s", dir.file("run.ys")}, dir.path());
+  script += " " + std::string(c.module) + "\nhierarchy -top " + c.module + "\nproc\n";
+  const ToolRun run = runYosys(yosys, dir.path(), "run", script + "write_json out.json\n");
   ASSERT_EQ(run.status, 0) << firstErrorLine(run.output);
   ASSERT_EQ(run.output.find("did not match"), std::string::npos) << run.output;
-  std::string text;
-  ASSERT_TRUE(readFile(dir.file("out.json"), text));
-  const nlohmann::json json = nlohmann::json::parse(text, nullptr, false);
-  const nlohmann::json::json_pointer ports =
-      nlohmann::json::json_pointer("/modules") / c.module / "ports";
-  ASSERT_TRUE(json.is_object() && json.contains(ports))
-      << "no ports of " << c.module << " in Yosys' JSON";
+  const Json json = readJson(dir.file("out.json"));
+  const Json::json_pointer module = Json::json_pointer("/modules") / c.module;
+  ASSERT_TRUE(!json.is_discarded() && json.contains(module))
+      << "no module " << c.module << " in Yosys' JSON";
 
-  ScanSettings settings;
-  for (const Override& o : c.overrides) settings.genericOverrides.emplace_back(o.name, o.ours);
-  std::vector<std::string> unknownNames;
-  const std::map<std::string, std::string> ours =
-      readOurs(file, c.module, std::move(settings), unknownNames);
+  const std::map<std::string, std::string> ours = readOurs(file, c.module, c.overrides);
   ASSERT_FALSE(ours.empty()) << c.module << " not found by ours";
-  EXPECT_EQ(unknownNames, std::vector<std::string>{}) << "overrides that name no parameter";
-
-  std::map<std::string, std::string> theirs;
-  for (const auto& [name, port] : json[ports].items()) theirs[name] = theirRange(port);
-  EXPECT_EQ(ours, theirs);
-
+  EXPECT_EQ(ours, theirPorts(json[module]));
   // A case whose overrides change no width would hold nothing against Yosys.
-  std::vector<std::string> ignored;
-  EXPECT_NE(readOurs(file, c.module, {}, ignored), ours) << "the overrides change no width";
+  EXPECT_NE(readOurs(file, c.module, {}), ours) << "the overrides change no width";
 }
 
 INSTANTIATE_TEST_SUITE_P(Fixtures, YosysOverride, testing::ValuesIn(kCases),
-                         [](const testing::TestParamInfo<OverrideCase>& info) {
-                           return std::string(info.param.label);
-                         });
+                         [](const auto& test) { return std::string(test.param.label); });
 
 }  // namespace
