@@ -16,12 +16,13 @@ class UnitReader::Session {
  public:
   Session(UnitReader& reader) : m_Reader(reader), m_Pre(nullptr, m_Table, reader.m_Sources) {}
 
-  /// Reads the statements at `place` with `read` (called once per statement).
+  /// Reads the statements at `place` with `read` (called once per statement), their
+  /// expressions into `arena`.
   template <typename Read>
-  void readAt(const Place& place, Read read) {
+  void readAt(const Place& place, ExprArena& arena, Read read) {
     moveTo(place);
     TokenStream tokens(m_Pre);
-    Parser parser(tokens);
+    Parser parser(tokens, arena);
     for (int guard = 0; guard < 100000; ++guard) {
       read(parser);
       const Token& next = tokens.peek();
@@ -217,7 +218,7 @@ void readParameters(Parser& parser, Scope& scope, bool local = false,
         if (defaultText.empty()) defaultText = value->written;
       } else {
         parameter.value = parser.expression();
-        if (!parameter.value) return;
+        if (parameter.value == kNoExpr) return;
         defaultText = writtenBetween(valueStart, tokens.peek());
       }
     }
@@ -307,7 +308,7 @@ void readAnsiPorts(Parser& parser, UnitModel& model) {
     std::vector<Dimension> unpacked;
     parser.dimensions(unpacked);
     port.unpacked = !unpacked.empty();
-    if (tokens.acceptSymbol("=") && !parser.expression()) return;
+    if (tokens.acceptSymbol("=") && parser.expression() == kNoExpr) return;
     // A header cut short keeps no half-read name such as `outpu`.
     if (!tokens.peek().isSymbol(",") && !tokens.peek().isSymbol(")")) {
       parser.expectSymbol(")");
@@ -342,12 +343,12 @@ bool readPortMember(Parser& parser, PortReference::Member& member) {
   member.signal.assign(tokens.take().text);
   if (!tokens.acceptSymbol("[")) return true;
   member.left = parser.expression();
-  if (!member.left) return false;
+  if (member.left == kNoExpr) return false;
   const Token& sep = tokens.peek();
   if (sep.isSymbol(":") || sep.isSymbol("+:") || sep.isSymbol("-:")) {
     member.op = operatorOf(tokens.take().text);
     member.right = parser.expression();
-    if (!member.right) return false;
+    if (member.right == kNoExpr) return false;
   }
   return parser.expectSymbol("]");
 }
@@ -510,7 +511,7 @@ UnitReader::UnitReader(Diagnostics& diagnostics, const MacroTable& macros, Sourc
 void UnitReader::readUnit(const UnitRecord& unit, UnitModel& model) {
   Session session(*this);
   bool headerRead = false;
-  session.readAt(unit.start, [&](Parser& parser) {
+  session.readAt(unit.start, model.scope.arena, [&](Parser& parser) {
     if (headerRead) return;
     headerRead = true;
     readHeader(parser, model);
@@ -521,7 +522,7 @@ void UnitReader::readUnit(const UnitRecord& unit, UnitModel& model) {
   for (const PortReference& ref : model.headerList)
     for (const PortReference::Member& member : ref.members) listed.insert(member.signal);
   for (const Place& place : unit.declarations)
-    session.readAt(place, [&](Parser& parser) {
+    session.readAt(place, model.scope.arena, [&](Parser& parser) {
       size_t before = session.errors();
       if (!readBodyItem(parser, model, listed)) return;
       session.report(parser);
@@ -532,7 +533,7 @@ void UnitReader::readUnit(const UnitRecord& unit, UnitModel& model) {
 void UnitReader::readScope(const std::vector<Place>& places, Scope& scope) {
   Session session(*this);
   for (const Place& place : places)
-    session.readAt(place, [&](Parser& parser) {
+    session.readAt(place, scope.arena, [&](Parser& parser) {
       if (!readScopeItem(parser, scope)) parser.skipStatement();
     });
 }
@@ -542,7 +543,7 @@ std::vector<std::string> UnitReader::readImports(const std::vector<Place>& place
   std::vector<std::string> imports;
   Scope ignored;
   for (size_t i = 0; i < count && i < places.size(); ++i)
-    session.readAt(places[i], [&](Parser& parser) {
+    session.readAt(places[i], ignored.arena, [&](Parser& parser) {
       if (parser.tokens().acceptWord(Word::Import))
         verilog::readImports(parser, ignored, &imports);
       else
@@ -551,14 +552,14 @@ std::vector<std::string> UnitReader::readImports(const std::vector<Place>& place
   return imports;
 }
 
-bool UnitReader::readValue(const SourceBuffer& buffer, bool isType, ExprPtr& value,
+bool UnitReader::readValue(const SourceBuffer& buffer, bool isType, ExprArena& arena, ExprId& value,
                            std::shared_ptr<TypeSpec>& type) {
   size_t errors = m_Diagnostics.errorCount();
   MacroTable macros = m_Macros.replay(m_Macros.logSize());
   Preprocessor pre(&m_Diagnostics, macros, m_Sources);
   pre.start(buffer, 0, 0);
   TokenStream tokens(pre);
-  Parser parser(tokens);
+  Parser parser(tokens, arena);
   if (isType) {
     type = std::make_shared<TypeSpec>();
     if (!typeValue(parser, *type) && !parser.failed()) parser.fail("expected a data type");
