@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstdint>
+#include <deque>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -102,8 +103,8 @@ struct Expr {
 /// The expressions of one scope (a unit, a package or the compilation unit): its parameters,
 /// types, functions and ports refer to them by id, and an expression is always evaluated in
 /// the scope that holds it, so the scope's arena is the one to look in. Nodes are freed with
-/// the scope, all at once, however deep the trees.
-using ExprArena = std::vector<Expr>;
+/// the scope, all at once, however deep the trees; a deque, so growing never moves them.
+using ExprArena = std::deque<Expr>;
 
 struct Dimension {
   ExprId left = kNoExpr;

@@ -37,6 +37,8 @@ class Parser {
   Parser(TokenStream& tokens, ExprArena& arena) : m_Tokens(tokens), m_Arena(arena) {}
 
   TokenStream& tokens() { return m_Tokens; }
+  /// Where the expressions read go.
+  ExprArena& arena() { return m_Arena; }
   bool failed() const { return m_Failed; }
   const std::string& errorText() const { return m_Error; }
   const Token& errorAt() const { return m_ErrorAt; }

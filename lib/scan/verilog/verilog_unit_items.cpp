@@ -103,6 +103,7 @@ void readParameters(Parser& parser, Scope& scope, bool local,
     Token nameToken = tokens.take();
     std::string name(nameToken.text);
     Parameter parameter;
+    size_t firstNode = parser.arena().size();
     parser.dimensions(parameter.unpacked);
     parameter.type = type;
     parameter.isType = isType;
@@ -127,7 +128,9 @@ void readParameters(Parser& parser, Scope& scope, bool local,
     if (declared && !local)
       declared->push_back(
           {name, isType, typeText, std::move(defaultText), nameToken.source, nameToken.offset});
-    scope.parameters.emplace(std::move(name), std::move(parameter));
+    // The first declaration of a name wins; the nodes of a later one are nobody's.
+    if (!scope.parameters.emplace(std::move(name), std::move(parameter)).second)
+      parser.arena().resize(firstNode);
     if (!tokens.acceptSymbol(",")) return;
   }
 }
