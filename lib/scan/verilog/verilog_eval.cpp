@@ -32,7 +32,7 @@ bool Evaluator::toInteger(const Value& value, int64_t& out) {
   return fail("a string is not a number");
 }
 
-bool Evaluator::evaluate(const Expr& expr, Scope& scope, Value& out) {
+bool Evaluator::evaluate(ExprId expr, Scope& scope, Value& out) {
   m_Error.clear();
   m_Unresolved = {};
   m_Steps = 0;
@@ -41,7 +41,7 @@ bool Evaluator::evaluate(const Expr& expr, Scope& scope, Value& out) {
   return eval(expr, scope, nullptr, out);
 }
 
-bool Evaluator::integer(const Expr& expr, Scope& scope, int64_t& out) {
+bool Evaluator::integer(ExprId expr, Scope& scope, int64_t& out) {
   Value value;
   return evaluate(expr, scope, value) && toInteger(value, out);
 }
@@ -164,9 +164,9 @@ bool Evaluator::typeWidth(const TypeSpec& type, Scope& scope, int64_t& width) {
   for (const Dimension& dim : type.packed) {
     int64_t left = 0, right = 0, size = 0;
     Value value;
-    if (!eval(*dim.left, scope, nullptr, value) || !toInteger(value, left)) return false;
-    if (dim.right) {
-      if (!eval(*dim.right, scope, nullptr, value) || !toInteger(value, right)) return false;
+    if (!eval(dim.left, scope, nullptr, value) || !toInteger(value, left)) return false;
+    if (dim.right != kNoExpr) {
+      if (!eval(dim.right, scope, nullptr, value) || !toInteger(value, right)) return false;
       if (!checkedSub(left, right, size)) return fail("dimension too large");
       size = (size < 0 ? -size : size) + 1;
     } else {
@@ -185,12 +185,12 @@ bool Evaluator::evalParameter(const std::string& name, Parameter& parameter, Sco
     return true;
   }
   if (parameter.isType) return fail("'" + name + "' is a type, not a value");
-  if (!parameter.value)
+  if (parameter.value == kNoExpr)
     return failAt(Unresolved::Kind::ParameterWithoutValue, name,
                   "parameter '" + name + "' has no value");
   if (parameter.busy) return fail("parameter '" + name + "' depends on itself");
   parameter.busy = true;
-  bool ok = eval(*parameter.value, owner, nullptr, out);
+  bool ok = eval(parameter.value, owner, nullptr, out);
   parameter.busy = false;
   if (!ok) return false;
   if (parameter.type && !convert(*parameter.type, owner, out)) return false;

@@ -14,10 +14,10 @@ class Evaluator {
  public:
   explicit Evaluator(ScopeProvider& scopes) : m_Scopes(scopes) {}
 
-  /// Evaluates `expr` in `scope`; on failure error() says why.
-  bool evaluate(const Expr& expr, Scope& scope, Value& out);
+  /// Evaluates `expr` of `scope`'s arena in `scope`; on failure error() says why.
+  bool evaluate(ExprId expr, Scope& scope, Value& out);
   /// Like evaluate, then converts to an integer (reals round to nearest).
-  bool integer(const Expr& expr, Scope& scope, int64_t& out);
+  bool integer(ExprId expr, Scope& scope, int64_t& out);
   /// The number of bits of `type` declared in `scope`.
   bool typeWidth(const TypeSpec& type, Scope& scope, int64_t& width);
   /// The typedef or type parameter `name` (in `package` when set) seen from `scope`.
@@ -40,7 +40,7 @@ class Evaluator {
   using Locals = std::unordered_map<std::string, Value>;
   enum class Flow { Normal, Return };
 
-  bool eval(const Expr& expr, Scope& scope, Locals* locals, Value& out);
+  bool eval(ExprId id, Scope& scope, Locals* locals, Value& out);
   /// Applies the binary operator `expr` to the value `a` of its left operand.
   bool binary(const Expr& expr, const Value& a, Scope& scope, Locals* locals, Value& out);
   bool unsignedBinary(Op op, const Value& a, const Value& b, int64_t x, int64_t y, Value& out);

@@ -46,11 +46,12 @@ uint64_t unsignedPower(uint64_t base, uint64_t exponent) {
 
 }  // namespace
 
-bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out) {
+bool Evaluator::eval(ExprId id, Scope& scope, Locals* locals, Value& out) {
   if (++m_Steps > limits::kVerilogEvalSteps)
     return fail("evaluation did not finish within the step limit");
   DepthGuard nesting(m_Nesting, limits::kVerilogEvalNesting);
   if (nesting.tooDeep()) return fail("evaluation is nested too deeply");
+  const Expr& expr = scope.expr(id);
   switch (expr.kind) {
     case Expr::Kind::Number:
       if (expr.tooWide) return fail("the literal does not fit in 64 bits");
@@ -84,17 +85,17 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
     }
     case Expr::Kind::Ternary: {
       Value condition;
-      if (!eval(*expr.args[0], scope, locals, condition)) return false;
+      if (!eval(expr.args[0], scope, locals, condition)) return false;
       bool yes = condition.isReal() ? condition.asReal() != 0 : false;
       if (!condition.isReal()) {
         int64_t i = 0;
         if (!toInteger(condition, i)) return false;
         yes = i != 0;
       }
-      return eval(*expr.args[yes ? 1 : 2], scope, locals, out);
+      return eval(expr.args[yes ? 1 : 2], scope, locals, out);
     }
     case Expr::Kind::Select: {
-      if (const Expr& base = *expr.args[0];
+      if (const Expr& base = scope.expr(expr.args[0]);
           base.kind == Expr::Kind::Name &&
           !(locals && base.scope.empty() && locals->count(base.name))) {
         Scope* owner = nullptr;
@@ -113,11 +114,11 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
       }
       Value base, index;
       int64_t b = 0, i = 0, j = 0;
-      if (!eval(*expr.args[0], scope, locals, base) || !toInteger(base, b)) return false;
-      if (!eval(*expr.args[1], scope, locals, index) || !toInteger(index, i)) return false;
+      if (!eval(expr.args[0], scope, locals, base) || !toInteger(base, b)) return false;
+      if (!eval(expr.args[1], scope, locals, index) || !toInteger(index, i)) return false;
       if (expr.args.size() == 3) {
         Value second;
-        if (!eval(*expr.args[2], scope, locals, second) || !toInteger(second, j)) return false;
+        if (!eval(expr.args[2], scope, locals, second) || !toInteger(second, j)) return false;
       }
       int64_t low = 0, width = 0;
       selectBits(expr.op, i, j, expr.args.size() == 3, low, width);
@@ -127,7 +128,7 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
     }
     case Expr::Kind::Unary: {
       Value operand;
-      if (!eval(*expr.args[0], scope, locals, operand)) return false;
+      if (!eval(expr.args[0], scope, locals, operand)) return false;
       Op op = expr.op;
       if (operand.isReal() && (op == Op::Minus || op == Op::Plus)) {
         out = Value::real(op == Op::Minus ? -operand.asReal() : operand.asReal());
@@ -175,14 +176,14 @@ bool Evaluator::eval(const Expr& expr, Scope& scope, Locals* locals, Value& out)
   }
   // A long left-associative chain (a + b + c + ...) is one deep left spine: walk it with a
   // loop and recurse only into the right operands, which the parser keeps shallow.
-  std::vector<const Expr*> spine;
-  const Expr* leftmost = &expr;
-  while (leftmost->kind == Expr::Kind::Binary) {
-    spine.push_back(leftmost);
-    leftmost = leftmost->args[0].get();
+  std::vector<const Expr*> spine{&expr};
+  ExprId leftmost = expr.args[0];
+  while (scope.expr(leftmost).kind == Expr::Kind::Binary) {
+    spine.push_back(&scope.expr(leftmost));
+    leftmost = spine.back()->args[0];
   }
   Value acc;
-  if (!eval(*leftmost, scope, locals, acc)) return false;
+  if (!eval(leftmost, scope, locals, acc)) return false;
   for (auto node = spine.rbegin(); node != spine.rend(); ++node) {
     Value result;
     if (!binary(**node, acc, scope, locals, result)) return false;
@@ -256,13 +257,13 @@ bool Evaluator::binary(const Expr& expr, const Value& a, Scope& scope, Locals* l
       out = Value::integer(left ? 1 : 0);
       return true;
     }
-    if (!eval(*expr.args[1], scope, locals, b)) return false;
+    if (!eval(expr.args[1], scope, locals, b)) return false;
     bool right = b.isReal() ? b.asReal() != 0 : (toInteger(b, x) && x != 0);
     if (!m_Error.empty()) return false;
     out = Value::integer(right ? 1 : 0);
     return true;
   }
-  if (!eval(*expr.args[1], scope, locals, b)) return false;
+  if (!eval(expr.args[1], scope, locals, b)) return false;
   if (a.isString() && b.isString() && isComparison(op)) {
     bool equal = a.asString() == b.asString();
     out = Value::integer(isInequality(op) ? !equal : equal);

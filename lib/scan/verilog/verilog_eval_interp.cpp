@@ -11,11 +11,11 @@ bool Evaluator::assignSelect(const Stmt& stmt, const Value& v, Scope& scope, Loc
   int64_t old = 0, value = 0, i = 0, j = 0;
   Value index;
   if (!toInteger(target->second, old) || !toInteger(v, value)) return false;
-  if (!eval(*stmt.index, scope, &locals, index) || !toInteger(index, i)) return false;
-  if (stmt.indexEnd && (!eval(*stmt.indexEnd, scope, &locals, index) || !toInteger(index, j)))
-    return false;
+  if (!eval(stmt.index, scope, &locals, index) || !toInteger(index, i)) return false;
+  bool part = stmt.indexEnd != kNoExpr;
+  if (part && (!eval(stmt.indexEnd, scope, &locals, index) || !toInteger(index, j))) return false;
   int64_t low = 0, width = 0;
-  selectBits(stmt.selectOp, i, j, stmt.indexEnd != nullptr, low, width);
+  selectBits(stmt.selectOp, i, j, part, low, width);
   if (low < 0 || low >= 64 || width <= 0) return fail("bit select out of range");
   uint64_t mask = lowMask(width) << low;
   uint64_t bits =
@@ -39,10 +39,10 @@ bool Evaluator::runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flo
                 std::to_string(limits::kVerilogEvalSteps) + " steps");
   DepthGuard nesting(m_Nesting, limits::kVerilogEvalNesting);
   if (nesting.tooDeep()) return fail("evaluation is nested too deeply");
-  auto truth = [&](const ExprPtr& condition, bool& result) {
+  auto truth = [&](ExprId condition, bool& result) {
     Value v;
     int64_t i = 0;
-    if (!eval(*condition, scope, &locals, v)) return false;
+    if (!eval(condition, scope, &locals, v)) return false;
     if (v.isReal()) {
       result = v.asReal() != 0;
       return true;
@@ -58,25 +58,17 @@ bool Evaluator::runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flo
       return run(stmt.body, scope, locals, flow);
     case Stmt::Kind::Declare: {
       Value v = Value::integer(0);
-      if (stmt.value && !eval(*stmt.value, scope, &locals, v)) return false;
+      if (stmt.value != kNoExpr && !eval(stmt.value, scope, &locals, v)) return false;
       locals[stmt.target] = v;
       return true;
     }
     case Stmt::Kind::Assign: {
       Value v;
-      if (!eval(*stmt.value, scope, &locals, v)) return false;
-      if (stmt.index) return assignSelect(stmt, v, scope, locals);
-      if (stmt.op != Op::None) {
-        auto it = locals.find(stmt.target);
-        if (it == locals.end()) return fail("unknown variable '" + stmt.target + "'");
-        Expr current;
-        current.kind = Expr::Kind::Binary;
-        current.op = stmt.op;
-        auto left = std::make_shared<Expr>();
-        left->kind = Expr::Kind::Name;
-        left->name = stmt.target;
-        current.args = {left, stmt.value};
-        if (!eval(current, scope, &locals, v)) return false;
+      if (!eval(stmt.value, scope, &locals, v)) return false;
+      if (stmt.index != kNoExpr) return assignSelect(stmt, v, scope, locals);
+      if (stmt.update != kNoExpr) {
+        if (!locals.count(stmt.target)) return fail("unknown variable '" + stmt.target + "'");
+        if (!eval(stmt.update, scope, &locals, v)) return false;
       } else if (!locals.count(stmt.target)) {
         return fail("unknown variable '" + stmt.target + "'");
       }
@@ -110,7 +102,7 @@ bool Evaluator::runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flo
     case Stmt::Kind::Repeat: {
       Value v;
       int64_t count = 0;
-      if (!eval(*stmt.value, scope, &locals, v) || !toInteger(v, count)) return false;
+      if (!eval(stmt.value, scope, &locals, v) || !toInteger(v, count)) return false;
       for (int64_t i = 0; i < count; ++i) {
         if (!runOne(stmt.body[0], scope, locals, flow)) return false;
         if (flow == Flow::Return) return true;
@@ -118,9 +110,9 @@ bool Evaluator::runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flo
       return true;
     }
     case Stmt::Kind::Return:
-      if (stmt.value) {
+      if (stmt.value != kNoExpr) {
         Value v;
-        if (!eval(*stmt.value, scope, &locals, v)) return false;
+        if (!eval(stmt.value, scope, &locals, v)) return false;
         locals[m_ReturnName] = v;
       }
       flow = Flow::Return;
@@ -128,12 +120,12 @@ bool Evaluator::runOne(const Stmt& stmt, Scope& scope, Locals& locals, Flow& flo
     case Stmt::Kind::Case: {
       Value subject;
       int64_t key = 0;
-      if (!eval(*stmt.value, scope, &locals, subject) || !toInteger(subject, key)) return false;
+      if (!eval(stmt.value, scope, &locals, subject) || !toInteger(subject, key)) return false;
       for (size_t i = 0; i < stmt.body.size(); ++i) {
-        for (const ExprPtr& label : stmt.labels[i]) {
+        for (ExprId label : stmt.labels[i]) {
           Value v;
           int64_t candidate = 0;
-          if (!eval(*label, scope, &locals, v) || !toInteger(v, candidate)) return false;
+          if (!eval(label, scope, &locals, v) || !toInteger(v, candidate)) return false;
           if (candidate == key) return runOne(stmt.body[i], scope, locals, flow);
         }
       }

@@ -22,12 +22,12 @@ bool Evaluator::evalElement(const Expr& select, const std::string& name, Paramet
   if (select.args.size() != 2) return fail("a slice of parameter array '" + name + "'");
   Value index;
   int64_t i = 0, left = 0, right = 0;
-  if (!eval(*select.args[1], scope, locals, index) || !toInteger(index, i)) return false;
+  if (!eval(select.args[1], scope, locals, index) || !toInteger(index, i)) return false;
   const Dimension& dim = parameter.unpacked[0];
   Value bound;
-  if (!eval(*dim.left, owner, nullptr, bound) || !toInteger(bound, left)) return false;
-  if (dim.right) {
-    if (!eval(*dim.right, owner, nullptr, bound) || !toInteger(bound, right)) return false;
+  if (!eval(dim.left, owner, nullptr, bound) || !toInteger(bound, left)) return false;
+  if (dim.right != kNoExpr) {
+    if (!eval(dim.right, owner, nullptr, bound) || !toInteger(bound, right)) return false;
   } else {
     right = left - 1;
     left = 0;
@@ -35,31 +35,32 @@ bool Evaluator::evalElement(const Expr& select, const std::string& name, Paramet
   int64_t position = left <= right ? i - left : left - i;
   if (position < 0 || position > (left <= right ? right - left : left - right))
     return fail("index " + std::to_string(i) + " is outside parameter array '" + name + "'");
-  const Expr* pattern = parameter.value.get();
-  if (!pattern) return fail("parameter '" + name + "' has no value");
-  if (pattern->kind != Expr::Kind::Pattern)
+  if (parameter.value == kNoExpr) return fail("parameter '" + name + "' has no value");
+  const Expr& pattern = owner.expr(parameter.value);
+  if (pattern.kind != Expr::Kind::Pattern)
     return fail("parameter array '" + name + "' is not given an assignment pattern");
-  const Expr* element = nullptr;
+  const std::vector<ExprId>& items = pattern.args;
+  ExprId element = kNoExpr;
   size_t at = static_cast<size_t>(position);
-  if (pattern->op == Op::PatternReplicate) {
-    size_t items = pattern->args.size() - 1;
-    if (items > 0) element = pattern->args[1 + at % items].get();
-  } else if (pattern->op == Op::PatternKeyed) {
-    for (size_t k = 0; k + 1 < pattern->args.size() && !element; k += 2) {
+  if (pattern.op == Op::PatternReplicate) {
+    size_t count = items.size() - 1;
+    if (count > 0) element = items[1 + at % count];
+  } else if (pattern.op == Op::PatternKeyed) {
+    for (size_t k = 0; k + 1 < items.size() && element == kNoExpr; k += 2) {
       Value key;
       int64_t keyIndex = 0;
-      if (!pattern->args[k]) continue;
-      if (!eval(*pattern->args[k], owner, nullptr, key) || !toInteger(key, keyIndex)) return false;
-      if (keyIndex == i) element = pattern->args[k + 1].get();
+      if (items[k] == kNoExpr) continue;
+      if (!eval(items[k], owner, nullptr, key) || !toInteger(key, keyIndex)) return false;
+      if (keyIndex == i) element = items[k + 1];
     }
-    for (size_t k = 0; k + 1 < pattern->args.size() && !element; k += 2)
-      if (!pattern->args[k]) element = pattern->args[k + 1].get();
-  } else if (at < pattern->args.size()) {
-    element = pattern->args[at].get();
+    for (size_t k = 0; k + 1 < items.size() && element == kNoExpr; k += 2)
+      if (items[k] == kNoExpr) element = items[k + 1];
+  } else if (at < items.size()) {
+    element = items[at];
   }
-  if (!element)
+  if (element == kNoExpr)
     return fail("the assignment pattern of '" + name + "' has no element " + std::to_string(i));
-  if (!eval(*element, owner, nullptr, out)) return false;
+  if (!eval(element, owner, nullptr, out)) return false;
   return !parameter.type || convert(*parameter.type, owner, out);
 }
 
@@ -105,7 +106,7 @@ bool Evaluator::sizedValue(const Expr& expr, Scope& scope, Locals* locals, int64
     size_t first = 0;
     if (expr.kind == Expr::Kind::Replicate) {
       Value times;
-      if (!eval(*expr.args[0], scope, locals, times) || !toInteger(times, count)) return false;
+      if (!eval(expr.args[0], scope, locals, times) || !toInteger(times, count)) return false;
       if (count < 0 || count > 4096) return fail("replication count out of range");
       first = 1;
     }
@@ -114,7 +115,7 @@ bool Evaluator::sizedValue(const Expr& expr, Scope& scope, Locals* locals, int64
     for (int64_t r = 0; r < count; ++r)
       for (size_t i = first; i < expr.args.size(); ++i) {
         int64_t v = 0, w = 0;
-        if (!sizedValue(*expr.args[i], scope, locals, v, w)) return false;
+        if (!sizedValue(scope.expr(expr.args[i]), scope, locals, v, w)) return false;
         acc = (w >= 64 ? 0 : acc << w) | (static_cast<uint64_t>(v) & lowMask(w));
         total += w;
       }
@@ -142,15 +143,14 @@ bool Evaluator::evalBits(const Expr& arg, Scope& scope, Locals* locals, int64_t&
       return typeWidth(*type, *owner, width);
     Parameter* parameter = arg.scope.empty() ? findParameter(arg.name, scope, owner) : nullptr;
     if (parameter && parameter->type) return typeWidth(*parameter->type, *owner, width);
-    if (parameter && parameter->value) {
-      int64_t value = 0;
-      if (parameter->value->kind == Expr::Kind::Number && parameter->value->width > 0) {
-        width = parameter->value->width;
+    if (parameter && parameter->value != kNoExpr) {
+      if (const Expr& value = owner->expr(parameter->value);
+          value.kind == Expr::Kind::Number && value.width > 0) {
+        width = value.width;
         return true;
       }
       Value v;
       if (!evalParameter(arg.name, *parameter, *owner, v)) return false;
-      (void)value;
       width = v.isString() ? static_cast<int64_t>(v.asString().size()) * 8 : 32;
       return true;
     }
@@ -164,15 +164,15 @@ bool Evaluator::evalSystem(const Expr& expr, Scope& scope, Locals* locals, Value
   if (name == "$bits") {
     int64_t width = 0;
     if (expr.args.size() != 1) return fail("$bits takes one argument");
-    if (!evalBits(*expr.args[0], scope, locals, width)) return false;
+    if (!evalBits(scope.expr(expr.args[0]), scope, locals, width)) return false;
     out = Value::integer(width);
     return true;
   }
   std::vector<Value> args;
-  for (const ExprPtr& arg : expr.args) {
-    if (arg->kind == Expr::Kind::TypeName) return fail(name + " does not take a type");
+  for (ExprId arg : expr.args) {
+    if (scope.expr(arg).kind == Expr::Kind::TypeName) return fail(name + " does not take a type");
     Value v;
-    if (!eval(*arg, scope, locals, v)) return false;
+    if (!eval(arg, scope, locals, v)) return false;
     args.push_back(std::move(v));
   }
   auto needs = [&](size_t count) {
@@ -252,7 +252,7 @@ bool Evaluator::evalCall(const Expr& expr, Scope& scope, Locals* locals, Value& 
   Locals frame;
   for (size_t i = 0; i < expr.args.size(); ++i) {
     Value v;
-    if (!eval(*expr.args[i], scope, locals, v)) return false;
+    if (!eval(expr.args[i], scope, locals, v)) return false;
     frame[function->inputs[i]] = v;
   }
   frame[function->name] = Value::integer(0);

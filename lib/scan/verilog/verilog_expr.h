@@ -1,8 +1,10 @@
-// Constant expressions, data types and constant functions of the Verilog reader, kept as
-// small owned trees so they outlive the token stream they were read from.
+// Constant expressions, data types and constant functions of the Verilog reader. Expression
+// nodes live in the arena of the scope that declares them and refer to each other by index,
+// so they outlive the token stream they were read from.
 #pragma once
 
 #include <cstdint>
+#include <deque>
 #include <memory>
 #include <string>
 #include <string_view>
@@ -61,16 +63,12 @@ Op operatorOf(std::string_view text);
 /// How `op` is written.
 std::string_view operatorText(Op op);
 
-struct Expr;
-using ExprPtr = std::shared_ptr<const Expr>;
+/// A node's place in its arena; children, dimensions, statements and parameters refer to
+/// nodes this way.
+using ExprId = int32_t;
+constexpr ExprId kNoExpr = -1;
 
 struct Expr {
-  Expr() = default;
-  Expr(const Expr&) = default;
-  Expr& operator=(const Expr&) = default;
-  /// Frees the subtree with a loop: a chain of 25,000 operators must not recurse as deep.
-  ~Expr();
-
   enum class Kind {
     Number,  ///< integer literal; `unknown` when it holds x or z bits
     Real,
@@ -86,7 +84,7 @@ struct Expr {
     Select,     ///< args[0][args[1]] or args[0][args[1]:args[2]]
     TypeName,   ///< a data type used as an argument ($bits(logic [3:0]))
     Pattern,    ///< '{args}; PatternReplicate: '{args[0]{args[1..]}}; PatternKeyed: key,
-                ///< value pairs (null key: default)
+                ///< value pairs (kNoExpr key: default)
   };
   Kind kind = Kind::Number;
   Op op = Op::None;   ///< operator, or the kind of a part select or pattern
@@ -98,31 +96,19 @@ struct Expr {
   bool isSigned = false;  ///< a sized literal written with 's
   bool unknown = false;
   bool tooWide = false;  ///< an integer literal whose value does not fit in 64 bits
-  std::vector<ExprPtr> args;
+  std::vector<ExprId> args;
   std::shared_ptr<const struct TypeSpec> type;  ///< for TypeName
-  const SourceBuffer* source = nullptr;
-  size_t offset = 0;
 };
 
-inline Expr::~Expr() {
-  std::vector<ExprPtr> pending = std::move(args);
-  while (!pending.empty()) {
-    ExprPtr next = std::move(pending.back());
-    pending.pop_back();
-    // Only a node nobody else holds is freed now; take its children first so its own
-    // destructor finds none. Every node is made non-const, so casting the constness away is
-    // sound.
-    if (next.use_count() == 1) {
-      std::vector<ExprPtr>& children = const_cast<Expr&>(*next).args;
-      for (ExprPtr& child : children) pending.push_back(std::move(child));
-      children.clear();
-    }
-  }
-}
+/// The expressions of one scope (a unit, a package or the compilation unit): its parameters,
+/// types, functions and ports refer to them by id, and an expression is always evaluated in
+/// the scope that holds it, so the scope's arena is the one to look in. Nodes are freed with
+/// the scope, all at once, however deep the trees; a deque, so growing never moves them.
+using ExprArena = std::deque<Expr>;
 
 struct Dimension {
-  ExprPtr left;
-  ExprPtr right;  ///< null for a size-only dimension [N]
+  ExprId left = kNoExpr;
+  ExprId right = kNoExpr;  ///< kNoExpr for a size-only dimension [N]
 };
 
 struct TypeSpec {
@@ -153,15 +139,17 @@ struct Stmt {
   enum class Kind { Block, Assign, If, For, While, Repeat, Return, Case, Declare, Nothing };
   Kind kind = Kind::Nothing;
   std::string target;      ///< assigned or declared variable
-  Op op = Op::None;        ///< Assign: the operator of `+=`, `<<=`, ...; None for `=`
-  ExprPtr value;           ///< right-hand side, condition, count or returned value
+  ExprId value = kNoExpr;  ///< right-hand side, condition, count or returned value
   std::vector<Stmt> body;  ///< block statements; If: then, else; loops: init, step, body
-  std::vector<std::vector<ExprPtr>> labels;  ///< Case: one label list per body statement
-  bool hasDefault = false;                   ///< Case: the last body statement is the default
+  std::vector<std::vector<ExprId>> labels;  ///< Case: one label list per body statement
+  bool hasDefault = false;                  ///< Case: the last body statement is the default
   /// Assign to a bit or part select, target[index], target[index selectOp indexEnd].
-  ExprPtr index;
-  ExprPtr indexEnd;
+  ExprId index = kNoExpr;
+  ExprId indexEnd = kNoExpr;
   Op selectOp = Op::None;
+  /// Assign with an operator (`+=`, `<<=`, `++`, ...): the expression `target op value`
+  /// whose value is assigned; kNoExpr for `=`.
+  ExprId update = kNoExpr;
 };
 
 struct Function {

@@ -149,11 +149,8 @@ void Parser::skipStatement(Word stop) {
   }
 }
 
-ExprPtr Parser::make(Expr::Kind kind, const Token& at) {
-  auto expr = std::make_shared<Expr>();
-  expr->kind = kind;
-  expr->source = at.source;
-  expr->offset = at.offset;
-  return expr;
+ExprId Parser::add(Expr node) {
+  m_Arena.push_back(std::move(node));
+  return static_cast<ExprId>(m_Arena.size() - 1);
 }
 }  // namespace scan::verilog

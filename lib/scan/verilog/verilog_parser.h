@@ -30,11 +30,15 @@ class TokenStream {
   std::deque<Token> m_Ahead;
 };
 
+/// Reads from `tokens`; every expression node goes to `arena`, which must outlive the ids
+/// handed out.
 class Parser {
  public:
-  explicit Parser(TokenStream& tokens) : m_Tokens(tokens) {}
+  Parser(TokenStream& tokens, ExprArena& arena) : m_Tokens(tokens), m_Arena(arena) {}
 
   TokenStream& tokens() { return m_Tokens; }
+  /// Where the expressions read go.
+  ExprArena& arena() { return m_Arena; }
   bool failed() const { return m_Failed; }
   const std::string& errorText() const { return m_Error; }
   const Token& errorAt() const { return m_ErrorAt; }
@@ -43,7 +47,8 @@ class Parser {
   void fail(const std::string& text);
   bool expectSymbol(std::string_view symbol);
 
-  ExprPtr expression();
+  /// One expression, or kNoExpr after an error.
+  ExprId expression();
   /// Reads a data type if one starts here: net kind, var, signed, built-in or user type,
   /// struct/union/enum, packed dimensions. False when nothing was read. A user type is only
   /// taken when a name follows it, so `name` alone stays a name.
@@ -59,22 +64,27 @@ class Parser {
   bool userTypeAt(size_t n);
 
  private:
-  ExprPtr ternary();
-  ExprPtr binary(int minPrecedence);
-  ExprPtr unary();
-  ExprPtr postfix(ExprPtr base);
-  ExprPtr primary();
-  ExprPtr systemCall(const Token& name);
-  ExprPtr pattern(const Token& at);
-  ExprPtr make(Expr::Kind kind, const Token& at);
+  ExprId ternary();
+  ExprId binary(int minPrecedence);
+  ExprId unary();
+  ExprId postfix(ExprId base);
+  ExprId primary();
+  ExprId systemCall(const Token& name);
+  ExprId concatenation();
+  ExprId pattern();
+  /// Appends `node` (whose children are already in the arena) and returns its id.
+  ExprId add(Expr node);
   void structBody(TypeSpec& type);
   void enumBody(TypeSpec& type);
   bool statement(Function& function, std::vector<Stmt>& out);
   bool assignment(Stmt& stmt);
+  /// Sets `stmt.update` to `target op value`.
+  void compound(Stmt& stmt, Op op);
   bool declaration(std::vector<Stmt>& out);
   void skipLabel();
 
   TokenStream& m_Tokens;
+  ExprArena& m_Arena;
   bool m_Failed = false;
   std::string m_Error;
   Token m_ErrorAt;

@@ -62,91 +62,88 @@ bool isUnaryOperator(const Token& token) {
 
 }  // namespace
 
-ExprPtr Parser::expression() {
+ExprId Parser::expression() {
   DepthGuard guard(m_Depth, limits::kVerilogSyntaxNesting);
   if (guard.tooDeep()) {
     fail("expression nested too deeply");
-    return nullptr;
+    return kNoExpr;
   }
   return ternary();
 }
 
-ExprPtr Parser::ternary() {
-  Token at = m_Tokens.peek();
-  ExprPtr condition = binary(1);
-  if (!condition || !m_Tokens.acceptSymbol("?")) return condition;
-  ExprPtr yes = expression();
-  if (!yes || !expectSymbol(":")) return nullptr;
-  ExprPtr no = expression();
-  if (!no) return nullptr;
-  auto expr = std::const_pointer_cast<Expr>(make(Expr::Kind::Ternary, at));
-  expr->args = {condition, yes, no};
-  return expr;
+ExprId Parser::ternary() {
+  ExprId condition = binary(1);
+  if (condition == kNoExpr || !m_Tokens.acceptSymbol("?")) return condition;
+  ExprId yes = expression();
+  if (yes == kNoExpr || !expectSymbol(":")) return kNoExpr;
+  ExprId no = expression();
+  if (no == kNoExpr) return kNoExpr;
+  Expr expr = node(Expr::Kind::Ternary);
+  expr.args = {condition, yes, no};
+  return add(std::move(expr));
 }
 
-ExprPtr Parser::binary(int minPrecedence) {
-  ExprPtr left = unary();
-  while (left) {
+ExprId Parser::binary(int minPrecedence) {
+  ExprId left = unary();
+  while (left != kNoExpr) {
     const Token& op = m_Tokens.peek();
     int p = precedence(op);
     if (p == 0 || p < minPrecedence) break;
     Token opToken = m_Tokens.take();
-    ExprPtr right = binary(p + 1);
-    if (!right) return nullptr;
-    auto expr = std::const_pointer_cast<Expr>(make(Expr::Kind::Binary, opToken));
-    expr->op = operatorOf(opToken.text);
-    expr->args = {left, right};
-    left = expr;
+    ExprId right = binary(p + 1);
+    if (right == kNoExpr) return kNoExpr;
+    Expr expr = node(Expr::Kind::Binary, operatorOf(opToken.text));
+    expr.args = {left, right};
+    left = add(std::move(expr));
   }
   return left;
 }
 
-ExprPtr Parser::unary() {
+ExprId Parser::unary() {
   DepthGuard guard(m_Depth, limits::kVerilogSyntaxNesting);
   if (guard.tooDeep()) {
     fail("expression nested too deeply");
-    return nullptr;
+    return kNoExpr;
   }
   if (isUnaryOperator(m_Tokens.peek())) {
     Token op = m_Tokens.take();
-    ExprPtr operand = unary();
-    if (!operand) return nullptr;
-    auto expr = std::const_pointer_cast<Expr>(make(Expr::Kind::Unary, op));
-    expr->op = operatorOf(op.text);
-    expr->args = {operand};
-    return expr;
+    ExprId operand = unary();
+    if (operand == kNoExpr) return kNoExpr;
+    Expr expr = node(Expr::Kind::Unary, operatorOf(op.text));
+    expr.args = {operand};
+    return add(std::move(expr));
   }
-  ExprPtr base = primary();
-  return base ? postfix(base) : nullptr;
+  ExprId base = primary();
+  return base == kNoExpr ? kNoExpr : postfix(base);
 }
 
-ExprPtr Parser::postfix(ExprPtr base) {
+ExprId Parser::postfix(ExprId base) {
   for (int selects = 0;; ++selects) {
     const Token& next = m_Tokens.peek();
     if (selects > limits::kVerilogSyntaxNesting) {  // each select nests the tree one level deeper
       fail("expression nested too deeply");
-      return nullptr;
+      return kNoExpr;
     }
     if (next.isSymbol("[")) {
-      Token at = m_Tokens.take();
-      auto select = std::const_pointer_cast<Expr>(make(Expr::Kind::Select, at));
-      ExprPtr index = expression();
-      if (!index) return nullptr;
-      select->args = {base, index};
+      m_Tokens.take();
+      Expr select = node(Expr::Kind::Select);
+      ExprId index = expression();
+      if (index == kNoExpr) return kNoExpr;
+      select.args = {base, index};
       const Token& sep = m_Tokens.peek();
       if (sep.isSymbol(":") || sep.isSymbol("+:") || sep.isSymbol("-:")) {
-        select->op = operatorOf(m_Tokens.take().text);
-        ExprPtr second = expression();
-        if (!second) return nullptr;
-        select->args.push_back(second);
+        select.op = operatorOf(m_Tokens.take().text);
+        ExprId second = expression();
+        if (second == kNoExpr) return kNoExpr;
+        select.args.push_back(second);
       }
-      if (!expectSymbol("]")) return nullptr;
-      base = select;
+      if (!expectSymbol("]")) return kNoExpr;
+      base = add(std::move(select));
     } else if (next.isSymbol("'") && m_Tokens.peek(1).isSymbol("(")) {
       m_Tokens.take();
       m_Tokens.take();
-      ExprPtr inner = expression();
-      if (!inner || !expectSymbol(")")) return nullptr;
+      ExprId inner = expression();
+      if (inner == kNoExpr || !expectSymbol(")")) return kNoExpr;
       base = inner;  // size and sign casts keep the value
     } else {
       return base;
@@ -154,120 +151,90 @@ ExprPtr Parser::postfix(ExprPtr base) {
   }
 }
 
-ExprPtr Parser::systemCall(const Token& name) {
-  auto call = std::const_pointer_cast<Expr>(make(Expr::Kind::System, name));
-  call->name.assign(name.text);
-  if (!m_Tokens.acceptSymbol("(")) return call;
-  if (m_Tokens.acceptSymbol(")")) return call;
+ExprId Parser::systemCall(const Token& name) {
+  Expr call = node(Expr::Kind::System, Op::None, name.text);
+  if (!m_Tokens.acceptSymbol("(") || m_Tokens.acceptSymbol(")")) return add(std::move(call));
   do {
-    Word word = m_Tokens.peekWord();
-    if (isTypeWord(word)) {
+    if (isTypeWord(m_Tokens.peekWord())) {
       auto type = std::make_shared<TypeSpec>();
-      Token at = m_Tokens.peek();
       dataType(*type);
-      auto arg = std::const_pointer_cast<Expr>(make(Expr::Kind::TypeName, at));
-      arg->type = type;
-      call->args.push_back(arg);
+      Expr arg = node(Expr::Kind::TypeName);
+      arg.type = std::move(type);
+      call.args.push_back(add(std::move(arg)));
     } else {
-      ExprPtr arg = expression();
-      if (!arg) return nullptr;
-      call->args.push_back(arg);
+      ExprId arg = expression();
+      if (arg == kNoExpr) return kNoExpr;
+      call.args.push_back(arg);
     }
   } while (m_Tokens.acceptSymbol(","));
-  if (!expectSymbol(")")) return nullptr;
-  return call;
+  if (!expectSymbol(")")) return kNoExpr;
+  return add(std::move(call));
 }
 
-ExprPtr Parser::primary() {
+ExprId Parser::primary() {
   Token token = m_Tokens.peek();
   switch (token.kind) {
     case TokenKind::Number: {
       m_Tokens.take();
-      auto expr = std::const_pointer_cast<Expr>(make(Expr::Kind::Number, token));
-      parseNumber(token.text, *expr);
-      return expr;
+      Expr expr;
+      parseNumber(token.text, expr);
+      return add(std::move(expr));
     }
-    case TokenKind::String: {
+    case TokenKind::String:
       m_Tokens.take();
-      auto expr = std::const_pointer_cast<Expr>(make(Expr::Kind::String, token));
-      expr->name.assign(token.text.substr(1, token.text.size() >= 2 ? token.text.size() - 2 : 0));
-      return expr;
-    }
+      return add(node(Expr::Kind::String, Op::None,
+                      token.text.substr(1, token.text.size() >= 2 ? token.text.size() - 2 : 0)));
     case TokenKind::SystemName:
       m_Tokens.take();
       return systemCall(token);
     case TokenKind::Identifier: {
-      Word word = classify(token.text);
-      if (isTypeWord(word)) {  // a cast such as int'(x)
+      if (isTypeWord(classify(token.text))) {  // a cast such as int'(x)
         TypeSpec ignored;
         dataType(ignored);
         if (!m_Tokens.peek().isSymbol("'")) {
           fail("expected an expression but found '" + std::string(token.text) + "'");
-          return nullptr;
+          return kNoExpr;
         }
         m_Tokens.take();
-        if (!expectSymbol("(")) return nullptr;
-        ExprPtr inner = expression();
-        if (!inner || !expectSymbol(")")) return nullptr;
+        if (!expectSymbol("(")) return kNoExpr;
+        ExprId inner = expression();
+        if (inner == kNoExpr || !expectSymbol(")")) return kNoExpr;
         return inner;
       }
       m_Tokens.take();
-      auto expr = std::const_pointer_cast<Expr>(make(Expr::Kind::Name, token));
-      expr->name.assign(token.text);
+      Expr expr = node(Expr::Kind::Name, Op::None, token.text);
       if (m_Tokens.peek().isSymbol("::") && m_Tokens.peek(1).kind == TokenKind::Identifier) {
         m_Tokens.take();
-        expr->scope = expr->name;
-        expr->name.assign(m_Tokens.take().text);
+        expr.scope = std::move(expr.name);
+        expr.name.assign(m_Tokens.take().text);
       }
       if (m_Tokens.acceptSymbol("(")) {
-        expr->kind = Expr::Kind::Call;
+        expr.kind = Expr::Kind::Call;
         if (!m_Tokens.acceptSymbol(")")) {
           do {
-            ExprPtr arg = expression();
-            if (!arg) return nullptr;
-            expr->args.push_back(arg);
+            ExprId arg = expression();
+            if (arg == kNoExpr) return kNoExpr;
+            expr.args.push_back(arg);
           } while (m_Tokens.acceptSymbol(","));
-          if (!expectSymbol(")")) return nullptr;
+          if (!expectSymbol(")")) return kNoExpr;
         }
       }
-      return expr;
+      return add(std::move(expr));
     }
     case TokenKind::Symbol:
       if (token.text == "(") {
         m_Tokens.take();
-        ExprPtr inner = expression();
-        if (!inner || !expectSymbol(")")) return nullptr;
+        ExprId inner = expression();
+        if (inner == kNoExpr || !expectSymbol(")")) return kNoExpr;
         return inner;
       }
       if (token.text == "'{") {
         m_Tokens.take();
-        return pattern(token);
+        return pattern();
       }
       if (token.text == "{") {
         m_Tokens.take();
-        auto expr = std::const_pointer_cast<Expr>(make(Expr::Kind::Concat, token));
-        ExprPtr first = expression();
-        if (!first) return nullptr;
-        if (m_Tokens.peek().isSymbol("{")) {
-          expr->kind = Expr::Kind::Replicate;
-          m_Tokens.take();
-          expr->args.push_back(first);
-          do {
-            ExprPtr item = expression();
-            if (!item) return nullptr;
-            expr->args.push_back(item);
-          } while (m_Tokens.acceptSymbol(","));
-          if (!expectSymbol("}")) return nullptr;
-        } else {
-          expr->args.push_back(first);
-          while (m_Tokens.acceptSymbol(",")) {
-            ExprPtr item = expression();
-            if (!item) return nullptr;
-            expr->args.push_back(item);
-          }
-        }
-        if (!expectSymbol("}")) return nullptr;
-        return expr;
+        return concatenation();
       }
       break;
     default:
@@ -276,50 +243,76 @@ ExprPtr Parser::primary() {
   fail(token.kind == TokenKind::End
            ? std::string("expected an expression but found the end of the file")
            : "expected an expression but found '" + std::string(token.text.substr(0, 40)) + "'");
-  return nullptr;
+  return kNoExpr;
 }
 
-ExprPtr Parser::pattern(const Token& at) {
-  auto expr = std::const_pointer_cast<Expr>(make(Expr::Kind::Pattern, at));
-  if (m_Tokens.acceptSymbol("}")) return expr;
+// {a, b, ...} or {n{a, b, ...}}, the '{' taken.
+ExprId Parser::concatenation() {
+  Expr expr = node(Expr::Kind::Concat);
+  ExprId first = expression();
+  if (first == kNoExpr) return kNoExpr;
+  expr.args.push_back(first);
+  if (m_Tokens.peek().isSymbol("{")) {
+    expr.kind = Expr::Kind::Replicate;
+    m_Tokens.take();
+    do {
+      ExprId item = expression();
+      if (item == kNoExpr) return kNoExpr;
+      expr.args.push_back(item);
+    } while (m_Tokens.acceptSymbol(","));
+    if (!expectSymbol("}")) return kNoExpr;
+  } else {
+    while (m_Tokens.acceptSymbol(",")) {
+      ExprId item = expression();
+      if (item == kNoExpr) return kNoExpr;
+      expr.args.push_back(item);
+    }
+  }
+  if (!expectSymbol("}")) return kNoExpr;
+  return add(std::move(expr));
+}
+
+ExprId Parser::pattern() {
+  Expr expr = node(Expr::Kind::Pattern);
+  if (m_Tokens.acceptSymbol("}")) return add(std::move(expr));
   do {
     if (m_Tokens.acceptWord(Word::Default)) {
-      if (!expectSymbol(":")) return nullptr;
-      ExprPtr value = expression();
-      if (!value) return nullptr;
-      expr->op = Op::PatternKeyed;
-      expr->args.push_back(nullptr);
-      expr->args.push_back(value);
+      if (!expectSymbol(":")) return kNoExpr;
+      ExprId value = expression();
+      if (value == kNoExpr) return kNoExpr;
+      expr.op = Op::PatternKeyed;
+      expr.args.push_back(kNoExpr);
+      expr.args.push_back(value);
       continue;
     }
-    ExprPtr first = expression();
-    if (!first) return nullptr;
-    if (expr->args.empty() && m_Tokens.acceptSymbol("{")) {  // '{N{items}}
-      expr->op = Op::PatternReplicate;
-      expr->args.push_back(first);
+    ExprId first = expression();
+    if (first == kNoExpr) return kNoExpr;
+    if (expr.args.empty() && m_Tokens.acceptSymbol("{")) {  // '{N{items}}
+      expr.op = Op::PatternReplicate;
+      expr.args.push_back(first);
       do {
-        ExprPtr item = expression();
-        if (!item) return nullptr;
-        expr->args.push_back(item);
+        ExprId item = expression();
+        if (item == kNoExpr) return kNoExpr;
+        expr.args.push_back(item);
       } while (m_Tokens.acceptSymbol(","));
-      if (!expectSymbol("}")) return nullptr;
+      if (!expectSymbol("}")) return kNoExpr;
       break;
     }
     if (m_Tokens.acceptSymbol(":")) {
-      ExprPtr value = expression();
-      if (!value) return nullptr;
-      expr->op = Op::PatternKeyed;
-      expr->args.push_back(first);
-      expr->args.push_back(value);
+      ExprId value = expression();
+      if (value == kNoExpr) return kNoExpr;
+      expr.op = Op::PatternKeyed;
+      expr.args.push_back(first);
+      expr.args.push_back(value);
       continue;
     }
-    if (expr->op == Op::PatternKeyed) {
+    if (expr.op == Op::PatternKeyed) {
       fail("expected 'key: value' in an assignment pattern");
-      return nullptr;
+      return kNoExpr;
     }
-    expr->args.push_back(first);
+    expr.args.push_back(first);
   } while (m_Tokens.acceptSymbol(","));
-  if (!expectSymbol("}")) return nullptr;
-  return expr;
+  if (!expectSymbol("}")) return kNoExpr;
+  return add(std::move(expr));
 }
 }  // namespace scan::verilog

@@ -14,9 +14,9 @@ Stmt block(std::vector<Stmt> body = {}) {
   return stmt;
 }
 
-ExprPtr one() {
-  auto expr = std::make_shared<Expr>();
-  expr->integer = 1;
+Expr one() {
+  Expr expr;
+  expr.integer = 1;
   return expr;
 }
 
@@ -48,31 +48,39 @@ bool Parser::declaration(std::vector<Stmt>& out) {
   return true;
 }
 
+void Parser::compound(Stmt& stmt, Op op) {
+  ExprId target = add(node(Expr::Kind::Name, Op::None, stmt.target));
+  Expr update = node(Expr::Kind::Binary, op);
+  update.args = {target, stmt.value};
+  stmt.update = add(std::move(update));
+}
+
 bool Parser::assignment(Stmt& stmt) {
   stmt.kind = Stmt::Kind::Assign;
   if (m_Tokens.peek().isSymbol("++") || m_Tokens.peek().isSymbol("--")) {
-    stmt.op = m_Tokens.take().text[0] == '+' ? Op::Plus : Op::Minus;
+    Op op = m_Tokens.take().text[0] == '+' ? Op::Plus : Op::Minus;
     if (m_Tokens.peek().kind != TokenKind::Identifier) return false;
     stmt.target.assign(m_Tokens.take().text);
-    stmt.value = one();
+    stmt.value = add(one());
+    compound(stmt, op);
     return true;
   }
   if (m_Tokens.peek().kind != TokenKind::Identifier) return false;
   stmt.target.assign(m_Tokens.take().text);
   if (m_Tokens.acceptSymbol("[")) {  // x[i] = ..., x[hi:lo] = ..., x[i +: w] = ...
-    if (!(stmt.index = expression())) return false;
+    if ((stmt.index = expression()) == kNoExpr) return false;
     const Token& sep = m_Tokens.peek();
     if (sep.isSymbol(":") || sep.isSymbol("+:") || sep.isSymbol("-:")) {
       stmt.selectOp = operatorOf(m_Tokens.take().text);
-      if (!(stmt.indexEnd = expression())) return false;
+      if ((stmt.indexEnd = expression()) == kNoExpr) return false;
     }
     if (!expectSymbol("]")) return false;
     if (!m_Tokens.peek().isSymbol("=") && !m_Tokens.peek().isSymbol("<=")) return false;
   }
   const Token& op = m_Tokens.peek();
   if (op.isSymbol("++") || op.isSymbol("--")) {
-    stmt.op = m_Tokens.take().text[0] == '+' ? Op::Plus : Op::Minus;
-    stmt.value = one();
+    stmt.value = add(one());
+    compound(stmt, m_Tokens.take().text[0] == '+' ? Op::Plus : Op::Minus);
     return true;
   }
   if (op.kind != TokenKind::Symbol ||
@@ -80,12 +88,15 @@ bool Parser::assignment(Stmt& stmt) {
         op.text == "/=" || op.text == "%=" || op.text == "&=" || op.text == "|=" ||
         op.text == "^=" || op.text == "<<=" || op.text == ">>=" || op.text == "<="))
     return false;
+  Op update = Op::None;
   if (!op.isSymbol("<=")) {
     Token assign = m_Tokens.take();
-    if (assign.text.size() > 1) stmt.op = operatorOf(assign.text.substr(0, assign.text.size() - 1));
+    if (assign.text.size() > 1) update = operatorOf(assign.text.substr(0, assign.text.size() - 1));
   }
   stmt.value = expression();
-  return stmt.value != nullptr;
+  if (stmt.value == kNoExpr) return false;
+  if (update != Op::None) compound(stmt, update);
+  return true;
 }
 
 // Reads one statement into `out`; false when the function uses something unsupported.
@@ -114,7 +125,8 @@ bool Parser::statement(Function& function, std::vector<Stmt>& out) {
     case Word::If: {
       m_Tokens.take();
       stmt.kind = Stmt::Kind::If;
-      if (!expectSymbol("(") || !(stmt.value = expression()) || !expectSymbol(")")) return false;
+      if (!expectSymbol("(") || (stmt.value = expression()) == kNoExpr || !expectSymbol(")"))
+        return false;
       std::vector<Stmt> yes, no;
       if (!statement(function, yes)) return false;
       if (m_Tokens.acceptWord(Word::Else) && !statement(function, no)) return false;
@@ -134,7 +146,8 @@ bool Parser::statement(Function& function, std::vector<Stmt>& out) {
           init.body.push_back(std::move(one));
         } while (m_Tokens.acceptSymbol(","));
       }
-      if (!expectSymbol(";") || !(stmt.value = expression()) || !expectSymbol(";")) return false;
+      if (!expectSymbol(";") || (stmt.value = expression()) == kNoExpr || !expectSymbol(";"))
+        return false;
       Stmt step = block();
       do {
         Stmt one;
@@ -151,7 +164,8 @@ bool Parser::statement(Function& function, std::vector<Stmt>& out) {
     case Word::Repeat: {
       m_Tokens.take();
       stmt.kind = word == Word::While ? Stmt::Kind::While : Stmt::Kind::Repeat;
-      if (!expectSymbol("(") || !(stmt.value = expression()) || !expectSymbol(")")) return false;
+      if (!expectSymbol("(") || (stmt.value = expression()) == kNoExpr || !expectSymbol(")"))
+        return false;
       Stmt body = block();
       if (!statement(function, body.body)) return false;
       stmt.body.push_back(std::move(body));
@@ -160,20 +174,21 @@ bool Parser::statement(Function& function, std::vector<Stmt>& out) {
     case Word::Return:
       m_Tokens.take();
       stmt.kind = Stmt::Kind::Return;
-      if (!m_Tokens.peek().isSymbol(";") && !(stmt.value = expression())) return false;
+      if (!m_Tokens.peek().isSymbol(";") && (stmt.value = expression()) == kNoExpr) return false;
       if (!expectSymbol(";")) return false;
       break;
     case Word::Case: {
       m_Tokens.take();
       stmt.kind = Stmt::Kind::Case;
-      if (!expectSymbol("(") || !(stmt.value = expression()) || !expectSymbol(")")) return false;
+      if (!expectSymbol("(") || (stmt.value = expression()) == kNoExpr || !expectSymbol(")"))
+        return false;
       while (!m_Failed && !m_Tokens.atEnd() && !m_Tokens.acceptWord(Word::Endcase)) {
-        std::vector<ExprPtr> labels;
+        std::vector<ExprId> labels;
         bool isDefault = m_Tokens.acceptWord(Word::Default);
         if (!isDefault) {
           do {
-            ExprPtr label = expression();
-            if (!label) return false;
+            ExprId label = expression();
+            if (label == kNoExpr) return false;
             labels.push_back(label);
           } while (m_Tokens.acceptSymbol(","));
         }

@@ -27,10 +27,10 @@ void Parser::dimensions(std::vector<Dimension>& dims) {
       return;
     }
     dim.left = expression();
-    if (!dim.left) return;
+    if (dim.left == kNoExpr) return;
     if (m_Tokens.acceptSymbol(":")) {
       dim.right = expression();
-      if (!dim.right) return;
+      if (dim.right == kNoExpr) return;
     }
     if (!expectSymbol("]")) return;
     dims.push_back(std::move(dim));
@@ -79,7 +79,7 @@ void Parser::structBody(TypeSpec& type) {
       m_Tokens.take();
       std::vector<Dimension> unpacked;
       dimensions(unpacked);
-      if (m_Tokens.acceptSymbol("=") && !expression()) return;
+      if (m_Tokens.acceptSymbol("=") && expression() == kNoExpr) return;
       type.members.push_back(member);
     } while (m_Tokens.acceptSymbol(","));
     if (!expectSymbol(";")) return;

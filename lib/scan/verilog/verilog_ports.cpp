@@ -71,8 +71,8 @@ class PortBuilder {
  private:
   bool dimension(const Dimension& dim, Bounds& bounds) {
     Scope& scope = m_Model.scope;
-    if (!m_Evaluator.integer(*dim.left, scope, bounds.left)) return false;
-    if (!dim.right) {  // [N] is [0:N-1]
+    if (!m_Evaluator.integer(dim.left, scope, bounds.left)) return false;
+    if (dim.right == kNoExpr) {  // [N] is [0:N-1]
       if (bounds.left <= 0) {
         m_Error = "dimension size must be positive";
         return false;
@@ -81,7 +81,7 @@ class PortBuilder {
       bounds.left = 0;
       return true;
     }
-    return m_Evaluator.integer(*dim.right, scope, bounds.right);
+    return m_Evaluator.integer(dim.right, scope, bounds.right);
   }
 
   bool typeRange(const TypeSpec& type, Range& range) {
@@ -139,13 +139,13 @@ class PortBuilder {
   }
 
   bool foreignDimension(const Dimension& dim, Scope& scope, Bounds& bounds) {
-    if (!m_Evaluator.integer(*dim.left, scope, bounds.left)) return false;
-    if (!dim.right) {
+    if (!m_Evaluator.integer(dim.left, scope, bounds.left)) return false;
+    if (dim.right == kNoExpr) {
       bounds.right = bounds.left - 1;
       bounds.left = 0;
       return true;
     }
-    return m_Evaluator.integer(*dim.right, scope, bounds.right);
+    return m_Evaluator.integer(dim.right, scope, bounds.right);
   }
 
   bool setError(std::string text) {
@@ -337,12 +337,12 @@ class PortBuilder {
 
   // Range of one member: its select when written, else its declared type.
   bool memberRange(const PortReference::Member& member, const TypeSpec& type, Range& range) {
-    if (!member.left) return typeRange(type, range);
+    if (member.left == kNoExpr) return typeRange(type, range);
     Scope& scope = m_Model.scope;
     int64_t first = 0, second = 0;
-    if (!m_Evaluator.integer(*member.left, scope, first)) return false;
-    if (!member.right) return true;  // one bit
-    if (!m_Evaluator.integer(*member.right, scope, second)) return false;
+    if (!m_Evaluator.integer(member.left, scope, first)) return false;
+    if (member.right == kNoExpr) return true;  // one bit
+    if (!m_Evaluator.integer(member.right, scope, second)) return false;
     if (member.op == Op::RangeSelect) {
       range = {true, first, second};
     } else if (second <= 0) {
@@ -378,15 +378,16 @@ class PortBuilder {
     if (!first) return;
     if (ref.members.size() == 1) {
       const PortReference::Member& member = ref.members[0];
-      if (member.left) written.expression = ref.text;
+      bool selected = member.left != kNoExpr;
+      if (selected) written.expression = ref.text;
       Range range;
       std::string problem;
       if (!memberRange(member, type, range)) {
         problem =
-            rangeFailed(ref.name, written.expression, !member.left, first->source, first->offset);
+            rangeFailed(ref.name, written.expression, !selected, first->source, first->offset);
         range = {};
       }
-      if (member.left) {
+      if (selected) {
         written.type = rangeText(range);
         written.kind = range.present ? ScanPort::Kind::BitVector : ScanPort::Kind::Bit;
       }

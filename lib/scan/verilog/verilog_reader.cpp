@@ -177,9 +177,9 @@ bool VerilogReader::applyOverrides(UnitModel& model, UnitReader& reader) {
     auto parameter = model.scope.parameters.find(name);
     if (declared == model.parameters.end() || parameter == model.scope.parameters.end()) continue;
     const SourceBuffer* buffer = m_Sources->adopt(SourceBuffer::fromText("-g " + name, text));
-    ExprPtr value;
+    ExprId value = kNoExpr;
     std::shared_ptr<TypeSpec> type;
-    if (!reader.readValue(*buffer, declared->isType, value, type)) {
+    if (!reader.readValue(*buffer, declared->isType, model.scope.arena, value, type)) {
       ok = false;
       continue;
     }
@@ -187,7 +187,7 @@ bool VerilogReader::applyOverrides(UnitModel& model, UnitReader& reader) {
     if (declared->isType)
       target.typeValue = std::move(type);
     else
-      target.value = std::move(value);
+      target.value = value;
     target.cached.reset();
   }
   return ok;
@@ -208,8 +208,10 @@ std::vector<ScanGeneric> VerilogReader::describeParameters(UnitModel& model, Eva
       Expr reference;
       reference.kind = Expr::Kind::Name;
       reference.name = declared.name;
+      model.scope.arena.push_back(std::move(reference));
+      ExprId id = static_cast<ExprId>(model.scope.arena.size() - 1);
       Value value;
-      if (evaluator.evaluate(reference, model.scope, value)) generic.value = literalText(value);
+      if (evaluator.evaluate(id, model.scope, value)) generic.value = literalText(value);
     }
     generics.push_back(std::move(generic));
   }

@@ -15,7 +15,7 @@
 namespace scan::verilog {
 
 struct Parameter {
-  ExprPtr value;                   ///< null when the declaration gives no default
+  ExprId value = kNoExpr;          ///< kNoExpr when the declaration gives no default
   std::shared_ptr<TypeSpec> type;  ///< the declared type, when one is written
   bool isType = false;             ///< a `parameter type`
   std::shared_ptr<TypeSpec> typeValue;
@@ -25,7 +25,13 @@ struct Parameter {
   bool busy = false;
 };
 
+/// Everything a scope declares refers to expressions in its own `arena`: parameter values,
+/// the dimensions of its types, the statements of its functions (and, for a unit, its ports
+/// and the overrides given for its parameters). The arena lives exactly as long as they do.
 struct Scope {
+  /// The node `id` of this scope's arena.
+  const Expr& expr(ExprId id) const { return arena[static_cast<size_t>(id)]; }
+
   std::string name;
   bool isCompilationUnit = false;
   std::unordered_map<std::string, Parameter> parameters;
@@ -34,6 +40,7 @@ struct Scope {
   std::unordered_map<std::string, std::shared_ptr<Function>> functions;
   std::vector<std::string> wildcardImports;                   ///< import pkg::*
   std::unordered_map<std::string, std::string> namedImports;  ///< name -> package
+  ExprArena arena;
 };
 
 /// Finds package scopes (parsed on first use) and the compilation-unit scope.

@@ -9,6 +9,7 @@
 #include "scan/verilog/verilog_parser.h"
 #include "scan/verilog/verilog_preprocessor.h"
 #include "scan/verilog/verilog_text.h"
+#include "scan/verilog/verilog_unit_items.h"
 
 namespace scan::verilog {
 
@@ -16,12 +17,13 @@ class UnitReader::Session {
  public:
   Session(UnitReader& reader) : m_Reader(reader), m_Pre(nullptr, m_Table, reader.m_Sources) {}
 
-  /// Reads the statements at `place` with `read` (called once per statement).
+  /// Reads the statements at `place` with `read` (called once per statement), their
+  /// expressions into `arena`.
   template <typename Read>
-  void readAt(const Place& place, Read read) {
+  void readAt(const Place& place, ExprArena& arena, Read read) {
     moveTo(place);
     TokenStream tokens(m_Pre);
-    Parser parser(tokens);
+    Parser parser(tokens, arena);
     for (int guard = 0; guard < 100000; ++guard) {
       read(parser);
       const Token& next = tokens.peek();
@@ -100,176 +102,6 @@ bool startsAnsiPort(Parser& parser) {
   }
 }
 
-// A name as it must be written back: an escaped name needs the blank that ends it.
-std::string nameText(std::string_view name) {
-  std::string text(name);
-  if (!text.empty() && text.front() == '\\') text += ' ';
-  return text;
-}
-
-// `import a::*, b::x;` (the keyword already taken). With `written`, the statement is also
-// written back in one canonical spelling, which holds no macro uses.
-void readImports(Parser& parser, Scope& scope, std::vector<std::string>* written = nullptr) {
-  TokenStream& tokens = parser.tokens();
-  if (tokens.peek().kind == TokenKind::String) {  // DPI import
-    parser.skipStatement();
-    return;
-  }
-  std::string text = "import ";
-  do {
-    if (tokens.peek().kind != TokenKind::Identifier) {
-      parser.fail("expected a package name after 'import'");
-      return;
-    }
-    std::string package(tokens.take().text);
-    if (!parser.expectSymbol("::")) return;
-    if (text.size() > 7) text += ", ";
-    text += nameText(package) + "::";
-    if (tokens.acceptSymbol("*")) {
-      scope.wildcardImports.push_back(package);
-      text += '*';
-    } else if (tokens.peek().kind == TokenKind::Identifier) {
-      std::string name(tokens.take().text);
-      text += nameText(name);
-      scope.namedImports.emplace(std::move(name), package);
-    } else {
-      parser.fail("expected a name or '*' after '::'");
-      return;
-    }
-  } while (tokens.acceptSymbol(","));
-  if (parser.expectSymbol(";") && written) written->push_back(text + ";");
-}
-
-// A type written as a value (`parameter type T = word_t`, `-g T=...`): a bare type name is
-// no declaration here, so nothing follows it.
-bool typeValue(Parser& parser, TypeSpec& type) {
-  TokenStream& tokens = parser.tokens();
-  if (parser.dataType(type)) return true;
-  if (parser.failed() || tokens.peek().kind != TokenKind::Identifier ||
-      classify(tokens.peek().text) != Word::None)
-    return false;
-  type.base = TypeSpec::Base::Named;
-  type.name.assign(tokens.take().text);
-  if (tokens.acceptSymbol("::")) {
-    if (tokens.peek().kind != TokenKind::Identifier) return false;
-    type.scope = type.name;
-    type.name.assign(tokens.take().text);
-  }
-  type.written = type.name;
-  parser.dimensions(type.packed);
-  return !parser.failed();
-}
-
-// A parameter list, up to (not including) the closing ')' or ';'. `local` says whether
-// entries before any keyword are localparams; the overridable ones go to `declared` when
-// it is given.
-void readParameters(Parser& parser, Scope& scope, bool local = false,
-                    std::vector<ParameterDeclaration>* declared = nullptr) {
-  TokenStream& tokens = parser.tokens();
-  std::shared_ptr<TypeSpec> type;
-  std::string typeText;
-  bool isType = false;
-  for (;;) {
-    Word word = tokens.peekWord();
-    if (word == Word::Parameter || word == Word::Localparam) {
-      tokens.take();
-      local = word == Word::Localparam;
-      type.reset();
-      typeText.clear();
-      isType = false;
-    }
-    Token typeStart = tokens.peek();
-    if (tokens.acceptWord(Word::Type)) {
-      isType = true;
-      type.reset();
-      typeText = "type";
-    } else {
-      TypeSpec written;
-      if (parser.dataType(written)) {
-        typeText = writtenBetween(typeStart, tokens.peek());
-        if (typeText.empty()) typeText = written.written;
-        type = std::make_shared<TypeSpec>(std::move(written));
-        isType = false;
-      }
-    }
-    if (parser.failed()) return;
-    if (tokens.peek().kind != TokenKind::Identifier) {
-      parser.fail("expected a parameter name");
-      return;
-    }
-    Token nameToken = tokens.take();
-    std::string name(nameToken.text);
-    Parameter parameter;
-    parser.dimensions(parameter.unpacked);
-    parameter.type = type;
-    parameter.isType = isType;
-    std::string defaultText;
-    if (tokens.acceptSymbol("=")) {
-      Token valueStart = tokens.peek();
-      if (isType) {
-        auto value = std::make_shared<TypeSpec>();
-        if (!typeValue(parser, *value)) {
-          parser.fail("expected a type after '='");
-          return;
-        }
-        parameter.typeValue = value;
-        defaultText = writtenBetween(valueStart, tokens.peek());
-        if (defaultText.empty()) defaultText = value->written;
-      } else {
-        parameter.value = parser.expression();
-        if (!parameter.value) return;
-        defaultText = writtenBetween(valueStart, tokens.peek());
-      }
-    }
-    if (declared && !local)
-      declared->push_back(
-          {name, isType, typeText, std::move(defaultText), nameToken.source, nameToken.offset});
-    scope.parameters.emplace(std::move(name), std::move(parameter));
-    if (!tokens.acceptSymbol(",")) return;
-  }
-}
-
-void readTypedef(Parser& parser, Scope& scope) {
-  TokenStream& tokens = parser.tokens();
-  auto type = std::make_shared<TypeSpec>();
-  if (!parser.dataType(*type) || tokens.peek().kind != TokenKind::Identifier) {
-    parser.skipStatement();
-    return;
-  }
-  std::string name(tokens.take().text);
-  std::vector<Dimension> unpacked;
-  parser.dimensions(unpacked);
-  if (!parser.expectSymbol(";")) return;
-  if (!unpacked.empty()) scope.unpackedTypedefs.insert(name);
-  scope.typedefs.emplace(std::move(name), std::move(type));
-}
-
-// The declarations any scope may hold; false when the statement is something else.
-bool readScopeItem(Parser& parser, Scope& scope) {
-  TokenStream& tokens = parser.tokens();
-  switch (tokens.peekWord()) {
-    case Word::Parameter:
-    case Word::Localparam:
-      readParameters(parser, scope);
-      if (!parser.failed()) parser.expectSymbol(";");
-      return true;
-    case Word::Typedef:
-      tokens.take();
-      readTypedef(parser, scope);
-      return true;
-    case Word::Import:
-      tokens.take();
-      readImports(parser, scope);
-      return true;
-    case Word::Function:
-      if (std::shared_ptr<Function> function = parser.function())
-        scope.functions.emplace(function->name, function);
-      return true;
-    default:
-      return false;
-  }
-}
-
 void readAnsiPorts(Parser& parser, UnitModel& model) {
   TokenStream& tokens = parser.tokens();
   const PortDeclaration* previous = nullptr;
@@ -307,7 +139,7 @@ void readAnsiPorts(Parser& parser, UnitModel& model) {
     std::vector<Dimension> unpacked;
     parser.dimensions(unpacked);
     port.unpacked = !unpacked.empty();
-    if (tokens.acceptSymbol("=") && !parser.expression()) return;
+    if (tokens.acceptSymbol("=") && parser.expression() == kNoExpr) return;
     // A header cut short keeps no half-read name such as `outpu`.
     if (!tokens.peek().isSymbol(",") && !tokens.peek().isSymbol(")")) {
       parser.expectSymbol(")");
@@ -342,12 +174,12 @@ bool readPortMember(Parser& parser, PortReference::Member& member) {
   member.signal.assign(tokens.take().text);
   if (!tokens.acceptSymbol("[")) return true;
   member.left = parser.expression();
-  if (!member.left) return false;
+  if (member.left == kNoExpr) return false;
   const Token& sep = tokens.peek();
   if (sep.isSymbol(":") || sep.isSymbol("+:") || sep.isSymbol("-:")) {
     member.op = operatorOf(tokens.take().text);
     member.right = parser.expression();
-    if (!member.right) return false;
+    if (member.right == kNoExpr) return false;
   }
   return parser.expectSymbol("]");
 }
@@ -510,7 +342,7 @@ UnitReader::UnitReader(Diagnostics& diagnostics, const MacroTable& macros, Sourc
 void UnitReader::readUnit(const UnitRecord& unit, UnitModel& model) {
   Session session(*this);
   bool headerRead = false;
-  session.readAt(unit.start, [&](Parser& parser) {
+  session.readAt(unit.start, model.scope.arena, [&](Parser& parser) {
     if (headerRead) return;
     headerRead = true;
     readHeader(parser, model);
@@ -521,7 +353,7 @@ void UnitReader::readUnit(const UnitRecord& unit, UnitModel& model) {
   for (const PortReference& ref : model.headerList)
     for (const PortReference::Member& member : ref.members) listed.insert(member.signal);
   for (const Place& place : unit.declarations)
-    session.readAt(place, [&](Parser& parser) {
+    session.readAt(place, model.scope.arena, [&](Parser& parser) {
       size_t before = session.errors();
       if (!readBodyItem(parser, model, listed)) return;
       session.report(parser);
@@ -532,7 +364,7 @@ void UnitReader::readUnit(const UnitRecord& unit, UnitModel& model) {
 void UnitReader::readScope(const std::vector<Place>& places, Scope& scope) {
   Session session(*this);
   for (const Place& place : places)
-    session.readAt(place, [&](Parser& parser) {
+    session.readAt(place, scope.arena, [&](Parser& parser) {
       if (!readScopeItem(parser, scope)) parser.skipStatement();
     });
 }
@@ -542,7 +374,7 @@ std::vector<std::string> UnitReader::readImports(const std::vector<Place>& place
   std::vector<std::string> imports;
   Scope ignored;
   for (size_t i = 0; i < count && i < places.size(); ++i)
-    session.readAt(places[i], [&](Parser& parser) {
+    session.readAt(places[i], ignored.arena, [&](Parser& parser) {
       if (parser.tokens().acceptWord(Word::Import))
         verilog::readImports(parser, ignored, &imports);
       else
@@ -551,14 +383,14 @@ std::vector<std::string> UnitReader::readImports(const std::vector<Place>& place
   return imports;
 }
 
-bool UnitReader::readValue(const SourceBuffer& buffer, bool isType, ExprPtr& value,
+bool UnitReader::readValue(const SourceBuffer& buffer, bool isType, ExprArena& arena, ExprId& value,
                            std::shared_ptr<TypeSpec>& type) {
   size_t errors = m_Diagnostics.errorCount();
   MacroTable macros = m_Macros.replay(m_Macros.logSize());
   Preprocessor pre(&m_Diagnostics, macros, m_Sources);
   pre.start(buffer, 0, 0);
   TokenStream tokens(pre);
-  Parser parser(tokens);
+  Parser parser(tokens, arena);
   if (isType) {
     type = std::make_shared<TypeSpec>();
     if (!typeValue(parser, *type) && !parser.failed()) parser.fail("expected a data type");

@@ -36,9 +36,9 @@ struct PortDeclaration {
 struct PortReference {
   struct Member {
     std::string signal;
-    ExprPtr left;      ///< select, when written
-    ExprPtr right;     ///< second bound of a part select
-    Op op = Op::None;  ///< the kind of part select
+    ExprId left = kNoExpr;   ///< select, when written
+    ExprId right = kNoExpr;  ///< second bound of a part select
+    Op op = Op::None;        ///< the kind of part select
   };
   std::string name;  ///< empty for an unnamed concatenation
   std::vector<Member> members;
@@ -92,9 +92,10 @@ class UnitReader {
   /// The package imports among the first `count` of `places`, one "import p::*;" each.
   std::vector<std::string> readImports(const std::vector<Place>& places, size_t count);
 
-  /// Reads `text` (held by `buffer`) as one constant expression, or as a data type when
-  /// `isType`; the whole text must be used. On failure reports the error and returns false.
-  bool readValue(const SourceBuffer& buffer, bool isType, ExprPtr& value,
+  /// Reads `text` (held by `buffer`) as one constant expression into `arena`, or as a data
+  /// type when `isType`; the whole text must be used. On failure reports the error and
+  /// returns false.
+  bool readValue(const SourceBuffer& buffer, bool isType, ExprArena& arena, ExprId& value,
                  std::shared_ptr<TypeSpec>& type);
 
  private:
