@@ -3,7 +3,6 @@
 #include "template_search.h"
 
 #include <algorithm>
-#include <cstdlib>
 #include <filesystem>
 #include <system_error>
 
@@ -12,12 +11,6 @@
 namespace {
 
 namespace fs = std::filesystem;
-
-#ifdef _WIN32
-constexpr char kPathSeparator = ';';
-#else
-constexpr char kPathSeparator = ':';
-#endif
 
 bool isRegularFile(const fs::path& path) {
   std::error_code error;
@@ -38,16 +31,7 @@ bool isInside(const fs::path& inner, const fs::path& outer) {
 }  // namespace
 
 std::vector<std::string> templateFolders() {
-  std::vector<std::string> folders;
-  if (const char* path = std::getenv("PINFORGE_TEMPLATE_PATH")) {
-    std::string_view rest = path;
-    while (true) {
-      const size_t separator = rest.find(kPathSeparator);
-      if (separator != 0 && !rest.empty()) folders.emplace_back(rest.substr(0, separator));
-      if (separator == std::string_view::npos) break;
-      rest.remove_prefix(separator + 1);
-    }
-  }
+  std::vector<std::string> folders = Host::Process::environmentList("PINFORGE_TEMPLATE_PATH");
   const std::string executable = Host::File::executableDirectory();
   if (!executable.empty()) {
     folders.push_back((fs::path(executable) / ".." / "share" / "pinforge" / "templates")

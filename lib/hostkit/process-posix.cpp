@@ -199,25 +199,28 @@ int spawnAndCollect(const std::vector<std::string>& words, Host::ChildOutput* re
 
 namespace Host {
 
+std::vector<std::string> Process::environmentList(const char* name) {
+  std::vector<std::string> entries;
+  const char* value = std::getenv(name);
+  std::string_view rest = value != nullptr ? value : "";
+  while (!rest.empty()) {
+    const size_t colon = rest.find(':');
+    if (colon != 0) entries.emplace_back(rest.substr(0, colon));
+    if (colon == std::string_view::npos) break;
+    rest.remove_prefix(colon + 1);
+  }
+  return entries;
+}
+
 std::string Process::findProgram(std::string_view name) {
   if (name.empty() || name.find('/') != std::string_view::npos) return std::string();
   const std::string exeDir = File::executableDirectory();
   if (!exeDir.empty() && isExecutableFile(exeDir + '/' + std::string(name)))
     return exeDir + '/' + std::string(name);
-  const char* path = std::getenv("PATH");
-  std::string_view rest = path != nullptr ? path : "";
-  while (!rest.empty()) {
-    const size_t colon = rest.find(':');
-    const std::string_view dir = rest.substr(0, colon);
-    // An empty or relative entry means the current folder; a program is never taken from there.
-    if (dir.starts_with('/')) {
-      std::string candidate(dir);
-      candidate += '/';
-      candidate += name;
-      if (isExecutableFile(candidate)) return candidate;
-    }
-    if (colon == std::string_view::npos) break;
-    rest.remove_prefix(colon + 1);
+  for (const std::string& dir : environmentList("PATH")) {
+    // A relative entry means the current folder; a program is never taken from there.
+    if (dir.starts_with('/') && isExecutableFile(dir + '/' + std::string(name)))
+      return dir + '/' + std::string(name);
   }
   return std::string();
 }

@@ -258,6 +258,10 @@ int spawnAndCollect(const std::vector<std::string>& argv, Host::ChildOutput* rec
 
 namespace Host {
 
+std::vector<std::string> Process::environmentList(const char* name) {
+  return splitList(environmentValue(widen(name).c_str()));
+}
+
 std::string Process::findProgram(std::string_view name) {
   if (name.empty() || name.find_first_of(std::string_view("/\\:\0", 4)) != std::string_view::npos)
     return std::string();
@@ -268,7 +272,7 @@ std::string Process::findProgram(std::string_view name) {
     std::string found = programIn(exeDir, name, extensions);
     if (!found.empty()) return found;
   }
-  for (const std::string& folder : splitList(environmentValue(L"PATH"))) {
+  for (const std::string& folder : environmentList("PATH")) {
     // A relative entry depends on the current folder; a program is never taken from there.
     if (!isAbsoluteFolder(folder)) continue;
     std::string found = programIn(folder, name, extensions);

@@ -179,6 +179,10 @@ class Process {
   /// return added; elsewhere it returns `argv` as given.
   static std::vector<std::string> startup(int argc, char** argv);
 
+  /// The entries of the list in environment variable `name` (such as PATH), in order, split
+  /// at the host's list separator (':', or ';' on Windows); empty entries are left out.
+  static std::vector<std::string> environmentList(const char* name);
+
   /// The path of the program `name` (a bare file name): the one in the folder of this
   /// executable when there is one, else the first in a PATH folder. Empty and relative PATH
   /// entries are skipped, so nothing is ever taken from the current folder. Empty when none
