@@ -1,14 +1,20 @@
 // Runs one template through a processor over an in-memory design and captures what it wrote,
 // and the table every template suite fills: one row per template, its whole output and either a
-// clean finish or the exact message with its line.
+// clean finish or the exact message with its line; and the loader of the case files that hold
+// most rows (template_language_cases.txt, design_words_cases.txt).
 #pragma once
 
 #include <gtest/gtest.h>
 
+#include <algorithm>
+#include <charconv>
 #include <cstdint>
 #include <cstdio>
+#include <cstdlib>
+#include <map>
 #include <memory>
 #include <optional>
+#include <ostream>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -118,7 +124,7 @@ inline const std::string kDepth =
     errorAt(1, "Maximum number of nested @IFHAS or @IFNHAS directives exceeded.");
 
 struct Row {
-  const char* name;
+  std::string name;
   Design design;
   std::string templateText;
   std::string output;
@@ -129,5 +135,72 @@ struct Row {
 class TemplateTest : public ::testing::TestWithParam<Row> {};
 
 inline std::string rowName(const ::testing::TestParamInfo<Row>& param) { return param.param.name; }
+
+/// Names a row in failure reports instead of dumping its bytes.
+inline void PrintTo(const Row& row, std::ostream* out) { *out << row.name; }
+
+/// The ports of `list`, "I a, O d[1:0]": a direction letter and a name with a bus's bounds.
+inline bool parsePorts(const std::string& list, std::vector<Port>& ports) {
+  for (size_t at = 0, end = 0; at < list.size(); at = end + 2) {
+    end = std::min(list.find(", ", at), list.size());
+    const std::string item = list.substr(at, end - at);
+    const size_t open = std::min(item.find('['), item.size());
+    if (item.size() < 3 || std::string_view("IOBN").find(item[0]) == std::string::npos ||
+        item[1] != ' ')
+      return false;
+    Port& port = ports.emplace_back(Port{item.substr(2, open - 2), -1, -1, item[0]});
+    if (open == item.size()) continue;
+    const char* const last = item.data() + item.size() - 1;
+    const auto left = std::from_chars(item.data() + open + 1, last, port.left);
+    if (left.ec != std::errc() || left.ptr == last || *left.ptr != ':' || *last != ']')
+      return false;
+    const auto right = std::from_chars(left.ptr + 1, last, port.right);
+    if (right.ec != std::errc() || right.ptr != last) return false;
+  }
+  return true;
+}
+
+/// The rows of `name` in tests/engine, a file whose first lines describe its format, over plain
+/// ports or `designs` by name. A file or line that cannot be read gives a row that fails.
+inline std::vector<Row> rowsFromFile(const std::string& name,
+                                     const std::map<std::string, Design>& designs = {}) {
+  const char* root = std::getenv("PINFORGE_SOURCE_DIR");
+  std::string data;
+  if (!pinforge_test::readFile(std::string(root ? root : ".") + "/tests/engine/" + name, data))
+    return {{"CaseFileUnreadable", {}, "", name + " cannot be read"}};
+  std::vector<Row> rows;
+  std::vector<Row> faults;
+  std::string* into = nullptr;
+  for (size_t at = 0, end = 0, number = 1; at < data.size(); at = end + 1, ++number) {
+    end = std::min(data.find('\n', at), data.size());
+    const std::string line = data.substr(at, end - at);
+    const bool isOption = line.rfind("--- ", 0) == 0;
+    const std::string word = isOption ? line.substr(4, line.find(' ', 4) - 4) : "";
+    const std::string value = isOption ? line.substr(std::min(5 + word.size(), line.size())) : "";
+    if (line.rfind("=== ", 0) == 0) {
+      into = &rows.emplace_back(Row{line.substr(4), {}, "", ""}).templateText;
+    } else if (into == nullptr) {
+      continue;
+    } else if (line == "--- output" || line == "--- message") {
+      into = line == "--- output" ? &rows.back().output : &rows.back().message;
+    } else if (word == "warning" || word == "note") {
+      if (word == "warning") rows.back().warning = value;
+    } else if (word == "design" && designs.count(value) != 0) {
+      rows.back().design = designs.at(value);
+    } else if (word == "ports" && parsePorts(value, rows.back().design.ports)) {
+      continue;
+    } else if (isOption) {
+      faults.push_back(
+          {"CaseFileLine" + std::to_string(number), {}, "", line + ": not understood"});
+    } else if (line == "\\ No newline at end of file") {
+      if (!into->empty()) into->pop_back();
+    } else {
+      *into += line + "\n";
+    }
+  }
+  if (rows.empty()) faults.push_back({"CaseFileEmpty", {}, "", name + " holds no case"});
+  rows.insert(rows.end(), faults.begin(), faults.end());
+  return rows;
+}
 
 }  // namespace handlers_test
