@@ -89,4 +89,24 @@ Word classify(std::string_view word);
 /// The closing keyword of a block keyword (Module -> Endmodule), or None.
 Word closingWord(Word opening);
 
+/// True for a word that starts a data type or net kind (`wire`, `logic`, `int`, `signed`,
+/// `struct`, ...).
+inline bool isTypeWord(Word word) {
+  switch (word) {
+    case Word::NetKind:
+    case Word::Var:
+    case Word::VariableType:
+    case Word::AtomType:
+    case Word::RealType:
+    case Word::Signed:
+    case Word::Unsigned:
+    case Word::Struct:
+    case Word::Union:
+    case Word::Enum:
+      return true;
+    default:
+      return false;
+  }
+}
+
 }  // namespace scan::verilog

@@ -86,19 +86,9 @@ bool startsAnsiPort(Parser& parser) {
     case Word::Inout:
     case Word::Ref:
     case Word::Interface:
-    case Word::NetKind:
-    case Word::Var:
-    case Word::VariableType:
-    case Word::AtomType:
-    case Word::RealType:
-    case Word::Signed:
-    case Word::Unsigned:
-    case Word::Struct:
-    case Word::Union:
-    case Word::Enum:
       return true;
     default:
-      return tokens.peek().isSymbol("[") || parser.userTypeAt(0);
+      return isTypeWord(tokens.peekWord()) || tokens.peek().isSymbol("[") || parser.userTypeAt(0);
   }
 }
 
