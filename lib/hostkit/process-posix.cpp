@@ -17,7 +17,8 @@
 
 #include "platform/hostkit.h"
 
-extern char** environ;
+// POSIX has the program declare it; some C libraries declare it too.
+extern char** environ;  // NOLINT(readability-redundant-declaration)
 
 namespace {
 

@@ -15,14 +15,15 @@ enum : uint8_t { kSpace = 1, kIdStart = 2, kIdChar = 4, kDigit = 8, kBasedDigit 
 
 constexpr std::array<uint8_t, 256> makeClasses() {
   std::array<uint8_t, 256> t{};
-  for (int c : {' ', '\t', '\n', '\r', '\v', '\f'}) t[c] = kSpace;
+  for (unsigned char c : {' ', '\t', '\n', '\r', '\v', '\f'}) t[c] = kSpace;
   t[0] = kEnd;
   for (int c = 'a'; c <= 'z'; ++c) t[c] = kIdStart | kIdChar;
   for (int c = 'A'; c <= 'Z'; ++c) t[c] = kIdStart | kIdChar;
   t['_'] = kIdStart | kIdChar | kBasedDigit;
   t['$'] = kIdChar;
   for (int c = '0'; c <= '9'; ++c) t[c] = kIdChar | kDigit | kBasedDigit;
-  for (int c : {'a', 'b', 'c', 'd', 'e', 'f', 'A', 'B', 'C', 'D', 'E', 'F', 'x', 'X', 'z', 'Z'})
+  for (unsigned char c :
+       {'a', 'b', 'c', 'd', 'e', 'f', 'A', 'B', 'C', 'D', 'E', 'F', 'x', 'X', 'z', 'Z'})
     t[c] |= kBasedDigit;
   t['?'] = kBasedDigit;
   return t;

@@ -33,7 +33,7 @@ void Parser::dimensions(std::vector<Dimension>& dims) {
       if (dim.right == kNoExpr) return;
     }
     if (!expectSymbol("]")) return;
-    dims.push_back(std::move(dim));
+    dims.push_back(dim);
   }
 }
 
