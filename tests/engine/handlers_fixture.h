@@ -10,7 +10,6 @@
 #include <charconv>
 #include <cstdint>
 #include <cstdio>
-#include <cstdlib>
 #include <map>
 #include <memory>
 #include <optional>
@@ -20,6 +19,7 @@
 #include <vector>
 
 #include "engine/forge.h"
+#include "support/case_file.h"
 #include "support/scratch_dir.h"
 
 namespace handlers_test {
@@ -164,38 +164,33 @@ inline bool parsePorts(const std::string& list, std::vector<Port>& ports) {
 /// ports or `designs` by name. A file or line that cannot be read gives a row that fails.
 inline std::vector<Row> rowsFromFile(const std::string& name,
                                      const std::map<std::string, Design>& designs = {}) {
-  const char* root = std::getenv("PINFORGE_SOURCE_DIR");
-  std::string data;
-  if (!pinforge_test::readFile(std::string(root ? root : ".") + "/tests/engine/" + name, data))
+  std::vector<pinforge_test::CaseBlock> blocks;
+  if (!pinforge_test::readCaseFile("tests/engine/" + name, blocks))
     return {{"CaseFileUnreadable", {}, "", name + " cannot be read"}};
   std::vector<Row> rows;
   std::vector<Row> faults;
-  std::string* into = nullptr;
-  for (size_t at = 0, end = 0, number = 1; at < data.size(); at = end + 1, ++number) {
-    end = std::min(data.find('\n', at), data.size());
-    const std::string line = data.substr(at, end - at);
-    const bool isOption = line.rfind("--- ", 0) == 0;
-    const std::string word = isOption ? line.substr(4, line.find(' ', 4) - 4) : "";
-    const std::string value = isOption ? line.substr(std::min(5 + word.size(), line.size())) : "";
-    if (line.rfind("=== ", 0) == 0) {
-      into = &rows.emplace_back(Row{line.substr(4), {}, "", ""}).templateText;
-    } else if (into == nullptr) {
-      continue;
-    } else if (line == "--- output" || line == "--- message") {
-      into = line == "--- output" ? &rows.back().output : &rows.back().message;
-    } else if (word == "warning" || word == "note") {
-      if (word == "warning") rows.back().warning = value;
-    } else if (word == "design" && designs.count(value) != 0) {
-      rows.back().design = designs.at(value);
-    } else if (word == "ports" && parsePorts(value, rows.back().design.ports)) {
-      continue;
-    } else if (isOption) {
-      faults.push_back(
-          {"CaseFileLine" + std::to_string(number), {}, "", line + ": not understood"});
-    } else if (line == "\\ No newline at end of file") {
-      if (!into->empty()) into->pop_back();
-    } else {
-      *into += line + "\n";
+  for (const pinforge_test::CaseBlock& block : blocks) {
+    Row& row = rows.emplace_back(Row{block.label, {}, "", ""});
+    std::string* into = &row.templateText;
+    for (const pinforge_test::CaseSection& section : block.sections) {
+      const std::string& directive = section.directive;
+      const std::string word = directive.substr(0, directive.find(' '));
+      const std::string value = directive.substr(std::min(word.size() + 1, directive.size()));
+      if (directive == "output" || directive == "message") {
+        into = directive == "output" ? &row.output : &row.message;
+      } else if (word == "warning") {
+        row.warning = value;
+      } else if (word == "design" && designs.count(value) != 0) {
+        row.design = designs.at(value);
+      } else if (!directive.empty() && word != "note" &&
+                 !(word == "ports" && parsePorts(value, row.design.ports))) {
+        faults.push_back({"CaseFileLine" + std::to_string(section.line),
+                          {},
+                          "",
+                          "--- " + directive + ": not understood"});
+      }
+      // Option lines come before the text they qualify, which goes on where it was.
+      *into += section.text;
     }
   }
   if (rows.empty()) faults.push_back({"CaseFileEmpty", {}, "", name + " holds no case"});

@@ -9,12 +9,14 @@
 #include <cstdio>
 #include <cstdlib>
 #include <optional>
+#include <ostream>
 #include <string>
 #include <utility>
 #include <vector>
 
 #include "scan/common/diagnostics.h"
 #include "scan/verilog/verilog_reader.h"
+#include "support/case_file.h"
 #include "support/scratch_dir.h"
 
 namespace verilog_test {
@@ -57,6 +59,10 @@ struct Read {
 inline Read read(const Input& input) {
   Read result;
   pinforge_test::FilePtr sink(std::tmpfile());
+  if (!sink) {
+    ADD_FAILURE() << "no temporary file for the reader's messages";
+    return result;
+  }
   {
     scan::Diagnostics diagnostics(sink.get(), 1000);
     scan::verilog::VerilogReader reader(diagnostics, input.settings);
@@ -114,50 +120,52 @@ struct Case {
   Input input() const { return {texts, unit.c_str(), settings, files}; }
 };
 
+/// A failing case is named by its label, not dumped byte by byte.
+inline void PrintTo(const Case& c, std::ostream* out) { *out << c.label; }
+
 /// The cases of `name` in this folder, a file whose first lines describe its format; one
 /// failing case when the file cannot be read.
 inline std::vector<Case> casesFromFile(const std::string& name) {
-  std::string data;
-  if (!pinforge_test::readFile(sourcePath("tests/lib/scan/verilog/" + name), data))
+  std::vector<pinforge_test::CaseBlock> blocks;
+  if (!pinforge_test::readCaseFile("tests/lib/scan/verilog/" + name, blocks))
     return {{"CaseFile", {}, name + " cannot be read"}};
   std::vector<Case> cases;
-  std::string* into = nullptr;
-  for (size_t at = 0, end = 0; at < data.size(); at = end + 1) {
-    end = std::min(data.find('\n', at), data.size());
-    const std::string line = data.substr(at, end - at);
-    const std::string option = line.rfind("--- ", 0) == 0 ? line.substr(4) : "";
-    const size_t equals = option.find('=');
-    if (line.rfind("=== ", 0) == 0) {
-      cases.push_back({line.substr(4), {""}, ""});
-      into = &cases.back().texts.back();
-    } else if (into == nullptr) {
-      continue;
-    } else if (option == "next file") {
-      into = &cases.back().texts.emplace_back();
-    } else if (option == "outcome") {
-      into = &cases.back().outcome;
-    } else if (option.rfind("unit ", 0) == 0) {
-      cases.back().unit = option.substr(5);
-    } else if (option.rfind("fixture ", 0) == 0) {
-      cases.back().files.push_back(fixture(option.substr(8)));
-    } else if (option.rfind("-g ", 0) == 0) {
-      cases.back().settings.genericOverrides.emplace_back(option.substr(3, equals - 3),
-                                                          option.substr(equals + 1));
-    } else if (option.rfind("-D ", 0) == 0) {
-      cases.back().settings.macros.emplace_back(
-          option.substr(3, equals - 3),
-          equals == std::string::npos ? std::nullopt
-                                      : std::optional<std::string>(option.substr(equals + 1)));
-    } else if (line == "\\ No newline at end of file") {
-      into->pop_back();
-    } else if (into == &cases.back().outcome) {
-      *into += (into->empty() ? "" : "\n") + line;
-    } else {
-      *into += line + "\n";
+  std::vector<Case> faults;
+  for (const pinforge_test::CaseBlock& block : blocks) {
+    Case& c = cases.emplace_back(Case{block.label, {""}, ""});
+    std::string* into = &c.texts.back();
+    for (const pinforge_test::CaseSection& section : block.sections) {
+      const std::string& option = section.directive;
+      const size_t equals = option.find('=');
+      if (option == "next file") {
+        into = &c.texts.emplace_back();
+      } else if (option == "outcome") {
+        into = &c.outcome;
+      } else if (option.rfind("unit ", 0) == 0) {
+        c.unit = option.substr(5);
+      } else if (option.rfind("fixture ", 0) == 0) {
+        c.files.push_back(fixture(option.substr(8)));
+      } else if (option.rfind("-g ", 0) == 0) {
+        c.settings.genericOverrides.emplace_back(option.substr(3, equals - 3),
+                                                 option.substr(equals + 1));
+      } else if (option.rfind("-D ", 0) == 0) {
+        c.settings.macros.emplace_back(option.substr(3, equals - 3),
+                                       equals == std::string::npos
+                                           ? std::nullopt
+                                           : std::optional<std::string>(option.substr(equals + 1)));
+      } else if (!option.empty()) {
+        faults.push_back({"CaseFileLine" + std::to_string(section.line),
+                          {},
+                          "--- " + option + ": not understood"});
+      }
+      // Option lines come before the text they qualify, which goes on where it was.
+      *into += section.text;
     }
-  }
-  for (Case& c : cases)
+    // The outcome's lines are joined, not ended, by line breaks.
+    if (!c.outcome.empty() && c.outcome.back() == '\n') c.outcome.pop_back();
     if (c.texts == std::vector<std::string>{""}) c.texts.clear();
+  }
+  cases.insert(cases.end(), faults.begin(), faults.end());
   return cases;
 }
 
