@@ -128,13 +128,7 @@ bool checkDistinctFiles(const UT_CMDARGS& parser, std::FILE* messageStream) {
 /// "FATAL ERROR: Unable to open <what> <name>: <why>" on the message stream.
 void writeOpenFailure(std::FILE* messageStream, std::string_view what, const char* name,
                       std::string_view why) {
-  std::string text = "Unable to open ";
-  text += what;
-  text += ' ';
-  text += name;
-  text += ": ";
-  text += why;
-  writeFatalError(messageStream, text);
+  writeFatalError(messageStream, fileFailureText("open", what, name, why));
 }
 
 /// The line after a -template that is neither a file nor a template name.

@@ -18,3 +18,16 @@ void writeFatalError(std::FILE* stream, std::string_view text) {
   line += text;
   writeLine(stream, line);
 }
+
+std::string fileFailureText(std::string_view action, std::string_view what, std::string_view name,
+                            std::string_view why) {
+  std::string text = "Unable to ";
+  text += action;
+  text += ' ';
+  text += what;
+  text += ' ';
+  text += name;
+  text += ": ";
+  text += why;
+  return text;
+}

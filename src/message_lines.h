@@ -4,6 +4,7 @@
 #pragma once
 
 #include <cstdio>
+#include <string>
 #include <string_view>
 
 /// Writes `text` to `stream` byte for byte, NUL included.
@@ -12,3 +13,6 @@ void writeText(std::FILE* stream, std::string_view text);
 void writeLine(std::FILE* stream, std::string_view text);
 /// "FATAL ERROR: <text>" and a newline: a failure that ends the run before the design flow.
 void writeFatalError(std::FILE* stream, std::string_view text);
+/// "Unable to <action> <what> <name>: <why>", the wording of every file failure of a run.
+std::string fileFailureText(std::string_view action, std::string_view what, std::string_view name,
+                            std::string_view why);

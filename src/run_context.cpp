@@ -92,15 +92,7 @@ void RunContext::closeTraceFile() {
 
 void RunContext::reportFileFailure(std::string_view action, std::string_view what,
                                    std::string_view name, std::string_view why) {
-  std::string text = "Unable to ";
-  text += action;
-  text += ' ';
-  text += what;
-  text += ' ';
-  text += name;
-  text += ": ";
-  text += why;
-  reportMessage(text, Severity::Error);
+  reportMessage(fileFailureText(action, what, name, why), Severity::Error);
 }
 
 bool RunContext::registerDesignFile(const char* name) {

@@ -15,6 +15,7 @@
 #include <string_view>
 #include <vector>
 
+#include "hostkit/path_list.h"
 #include "platform/hostkit.h"
 
 // POSIX has the program declare it; some C libraries declare it too.
@@ -201,16 +202,8 @@ int spawnAndCollect(const std::vector<std::string>& words, Host::ChildOutput* re
 namespace Host {
 
 std::vector<std::string> Process::environmentList(const char* name) {
-  std::vector<std::string> entries;
   const char* value = std::getenv(name);
-  std::string_view rest = value != nullptr ? value : "";
-  while (!rest.empty()) {
-    const size_t colon = rest.find(':');
-    if (colon != 0) entries.emplace_back(rest.substr(0, colon));
-    if (colon == std::string_view::npos) break;
-    rest.remove_prefix(colon + 1);
-  }
-  return entries;
+  return splitPathList(value != nullptr ? value : "", ':');
 }
 
 std::string Process::findProgram(std::string_view name) {

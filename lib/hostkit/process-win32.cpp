@@ -11,6 +11,7 @@
 #include <thread>
 #include <vector>
 
+#include "hostkit/path_list.h"
 #include "hostkit/wide_text-win32.h"
 #include "platform/hostkit.h"
 
@@ -28,17 +29,6 @@ std::string environmentValue(const wchar_t* name) {
   const DWORD length = ::GetEnvironmentVariableW(name, value.data(), needed);
   value.resize(length < needed ? length : 0);
   return narrow(value);
-}
-
-std::vector<std::string> splitList(std::string_view list) {
-  std::vector<std::string> items;
-  while (!list.empty()) {
-    const size_t semicolon = list.find(';');
-    if (semicolon != 0) items.emplace_back(list.substr(0, semicolon));
-    if (semicolon == std::string_view::npos) break;
-    list.remove_prefix(semicolon + 1);
-  }
-  return items;
 }
 
 bool endsWithIgnoringCase(std::string_view text, std::string_view tail) {
@@ -259,13 +249,13 @@ int spawnAndCollect(const std::vector<std::string>& argv, Host::ChildOutput* rec
 namespace Host {
 
 std::vector<std::string> Process::environmentList(const char* name) {
-  return splitList(environmentValue(widen(name).c_str()));
+  return splitPathList(environmentValue(widen(name).c_str()), ';');
 }
 
 std::string Process::findProgram(std::string_view name) {
   if (name.empty() || name.find_first_of(std::string_view("/\\:\0", 4)) != std::string_view::npos)
     return std::string();
-  std::vector<std::string> extensions = splitList(environmentValue(L"PATHEXT"));
+  std::vector<std::string> extensions = Host::splitPathList(environmentValue(L"PATHEXT"), ';');
   if (extensions.empty()) extensions = {".COM", ".EXE", ".BAT", ".CMD"};
   const std::string exeDir = File::executableDirectory();
   if (!exeDir.empty()) {
